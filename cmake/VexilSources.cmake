@@ -1,0 +1,25 @@
+# Source collection by subsystem directory. Platform backends are chosen by file name:
+# *_win32.cpp on Windows, *_posix.cpp elsewhere, *_linux.cpp on Linux only.
+
+function(vexil_platform_filter out)
+  set(kept)
+  foreach(file IN LISTS ARGN)
+    get_filename_component(stem "${file}" NAME_WE)
+    if(stem MATCHES "_win32$" AND NOT WIN32)
+      continue()
+    elseif(stem MATCHES "_posix$" AND WIN32)
+      continue()
+    elseif(stem MATCHES "_linux$" AND NOT CMAKE_SYSTEM_NAME STREQUAL "Linux")
+      continue()
+    endif()
+    list(APPEND kept "${file}")
+  endforeach()
+  set(${out} ${kept} PARENT_SCOPE)
+endfunction()
+
+function(vexil_collect_sources out dir)
+  file(GLOB_RECURSE found CONFIGURE_DEPENDS "${dir}/*.cpp")
+  list(SORT found)
+  vexil_platform_filter(kept ${found})
+  set(${out} ${kept} PARENT_SCOPE)
+endfunction()

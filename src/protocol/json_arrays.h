@@ -1,0 +1,47 @@
+// Reading and writing arrays of model objects, shared by every structure and result
+// that holds a list: one rule for a missing member, a non-array and a bad element.
+#pragma once
+
+#include <vector>
+
+#include "json/json_errors.h"
+#include "json/rapidjson.h"
+
+namespace LSP {
+
+// Appends every element of `array` read as a T. An element that cannot be read is
+// reported with the caught text and the array's type number.
+template <typename T>
+void ReadArrayElements(const JsonValue& array, std::vector<T>& items) {
+  for (const JsonValue& element : array.GetArray()) {
+    T item;
+    try {
+      item.Read(xObject(element));
+    } catch (const std::exception& e) {
+      ThrowFormatted("Error:%s\n\nExpecting a %s JSON object but found %d JSON object.", e.what(), "array",
+                     static_cast<int>(array.GetType()));
+    }
+    items.push_back(std::move(item));
+  }
+}
+
+// Reads the array member `name`: a missing member leaves `items` as it is, a member of
+// another type throws.
+template <typename T>
+void ReadArray(const xObject& value, const char* name, std::vector<T>& items) {
+  if (!value.HasObject(name)) return;
+  const JsonValue& member = value.Value()[name];
+  if (!member.IsArray())
+    ThrowFormatted("Expecting a %s JSON object but found %d JSON object .", "array", static_cast<int>(member.GetType()));
+  ReadArrayElements(member, items);
+}
+
+// Writes `items` as the array member `name`, each element as a bare object.
+template <typename T>
+void WriteArray(xWriter& writer, const char* name, std::vector<T>& items) {
+  writer.StartArray(name);
+  for (T& item : items) writer.Object(item, false);
+  writer.EndArray();
+}
+
+}  // namespace LSP

@@ -1,0 +1,202 @@
+// Reading and writing of the core document structures. Edits and diagnostics write
+// their range flattened; change events write the protocol's "range" object.
+#include "vexil/protocol/structures.h"
+
+#include "protocol/json_arrays.h"
+
+namespace LSP {
+namespace {
+
+// Writes a range's "start" and "end" straight into the enclosing object.
+void WriteRangeMembers(xWriter& writer, Range& range) {
+  writer.Object(range.start, true);
+  writer.Object(range.end, true);
+}
+
+}  // namespace
+
+void Position::Read(const xObject& value) {
+  line = value.Int("line");
+  character = value.Int("character");
+}
+
+void Position::Write(xWriter& writer) {
+  writer.Int("line", line);
+  writer.Int("character", character);
+}
+
+void Range::Read(const xObject& value) {
+  start.Read(value.Object("start"));
+  end.Read(value.Object("end"));
+}
+
+void Range::Write(xWriter& writer) {
+  writer.Object("start", start);
+  writer.Object("end", end);
+}
+
+void Location::Read(const xObject& value) {
+  uri = value.String("uri");
+  range.Read(value.Object("range"));
+}
+
+void Location::Write(xWriter& writer) {
+  writer.String("uri", uri);
+  writer.Object(range, true);
+}
+
+void TextDocumentIdentifier::Read(const xObject& value) { uri = value.String("uri"); }
+void TextDocumentIdentifier::Write(xWriter& writer) { writer.String("uri", uri); }
+
+void VersionedTextDocumentIdentifier::Read(const xObject& value) {
+  TextDocumentIdentifier::Read(value);
+  version = value.Int("version");
+}
+
+void VersionedTextDocumentIdentifier::Write(xWriter& writer) {
+  TextDocumentIdentifier::Write(writer);
+  writer.Int("version", version);
+}
+
+void TextDocumentItem::Read(const xObject& value) {
+  TextDocumentIdentifier::Read(value);
+  languageId = value.String("languageId");
+  version = value.Int("version");
+  text = value.String("text");
+}
+
+void TextDocumentItem::Write(xWriter& writer) {
+  TextDocumentIdentifier::Write(writer);
+  writer.String("languageId", languageId);
+  writer.Int("version", version);
+  writer.RequiredString("text", text);
+}
+
+void TextEdit::Read(const xObject& value) {
+  range.Read(value.Object("range"));
+  newText = value.String("newText");
+}
+
+void TextEdit::Write(xWriter& writer) {
+  WriteRangeMembers(writer, range);
+  writer.String("newText", newText);
+}
+
+void TextDocumentEdit::Read(const xObject& value) {
+  textDocument.Read(value.Object("textDocument"));
+  ReadArray(value, "edits", edits);
+}
+
+void TextDocumentEdit::Write(xWriter& writer) {
+  writer.Object(textDocument, true);
+  WriteArray(writer, "edits", edits);
+}
+
+void WorkspaceEdit::Read(const xObject& value) { ReadArray(value, "documentChanges", documentChanges); }
+void WorkspaceEdit::Write(xWriter& writer) { WriteArray(writer, "documentChanges", documentChanges); }
+
+TextDocumentContentChangeEvent::TextDocumentContentChangeEvent(const TextDocumentContentChangeEvent& other)
+    : Params(other),
+      range(other.range ? new Range(*other.range) : nullptr),
+      rangeLength(other.rangeLength ? new int(*other.rangeLength) : nullptr),
+      text(other.text) {}
+
+TextDocumentContentChangeEvent& TextDocumentContentChangeEvent::operator=(
+    const TextDocumentContentChangeEvent& other) {
+  if (this != &other) *this = TextDocumentContentChangeEvent(other);
+  return *this;
+}
+
+void TextDocumentContentChangeEvent::Write(xWriter& writer) {
+  if (range) writer.Object(*range, true);
+  if (rangeLength) writer.Int("rangeLength", *rangeLength);
+  writer.RequiredString("text", text);
+}
+
+void SymbolInformation::Read(const xObject& value) {
+  name = value.String("name");
+  kind = value.Int("kind");
+  deprecated = value.Bool("deprecated");
+  containerName = value.String("containerName");
+  location.Read(value.Object("location"));
+  // Children are read leniently: document-symbol trees nest to any depth, and
+  // anything that is not an object is passed over.
+  xObject list = value.Object("children");
+  if (!list.IsArray()) return;
+  for (const JsonValue& element : list.Value().GetArray()) {
+    if (!element.IsObject()) continue;
+    children.emplace_back();
+    children.back().Read(xObject(element));
+  }
+}
+
+void SymbolInformation::Write(xWriter& writer) {
+  writer.String("name", name);
+  writer.Int("kind", kind);
+  writer.Bool("deprecated", deprecated);
+  writer.Object(location, true);
+}
+
+void Diagnostic::Read(const xObject& value) {
+  range.Read(value.Object("range"));
+  code = value.Int("code");
+  source = value.String("source");
+  message = value.String("message");
+}
+
+void Diagnostic::Write(xWriter& writer) {
+  WriteRangeMembers(writer, range);
+  writer.Int("code", code);
+  writer.String("source", source);
+  writer.String("message", message);
+}
+
+void MarkedString::Read(const xObject& value) {
+  language = value.String("language");
+  this->value = value.String("value");
+}
+
+void MarkedString::Write(xWriter& writer) {
+  writer.String("language", language);
+  writer.String("value", value);
+}
+
+void MarkupContent::Read(const xObject& content) {
+  kind.clear();
+  if (content.IsNull()) {
+    value.clear();
+  } else if (content.IsArray()) {
+    value.clear();
+    for (const JsonValue& element : content.Value().GetArray()) {
+      xObject item(element);
+      if (item.IsObject()) {
+        items.emplace_back();
+        items.back().Read(item);
+      } else if (value.empty()) {
+        value = item.GetString();
+      }
+    }
+  } else if (content.IsString()) {
+    value = content.GetString();
+  } else {
+    kind = content.String("kind");
+    value = content.String("value");
+  }
+}
+
+void MarkupContent::Write(xWriter& writer) {
+  writer.String("kind", kind);
+  writer.String("value", value);
+}
+
+void WorkspaceFolder::Read(const xObject& value) {
+  uri = value.String("uri");
+  name = value.String("name");
+}
+
+void WorkspaceFolder::Write(xWriter& writer) {
+  writer.String("uri", uri);
+  writer.String("name", name);
+}
+
+}  // namespace LSP
