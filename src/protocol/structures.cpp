@@ -5,16 +5,6 @@
 #include "protocol/json_arrays.h"
 
 namespace LSP {
-namespace {
-
-// Writes a range's "start" and "end" straight into the enclosing object.
-void WriteRangeMembers(xWriter& writer, Range& range) {
-  writer.Object(range.start, true);
-  writer.Object(range.end, true);
-}
-
-}  // namespace
-
 void Position::Read(const xObject& value) {
   line = value.Int("line");
   character = value.Int("character");
@@ -78,7 +68,7 @@ void TextEdit::Read(const xObject& value) {
 }
 
 void TextEdit::Write(xWriter& writer) {
-  WriteRangeMembers(writer, range);
+  range.Write(writer);  // "start" and "end" straight into the edit, without a "range" key
   writer.String("newText", newText);
 }
 
@@ -145,7 +135,7 @@ void Diagnostic::Read(const xObject& value) {
 }
 
 void Diagnostic::Write(xWriter& writer) {
-  WriteRangeMembers(writer, range);
+  range.Write(writer);  // flattened like TextEdit
   writer.Int("code", code);
   writer.String("source", source);
   writer.String("message", message);

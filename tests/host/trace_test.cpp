@@ -1,0 +1,127 @@
+// Trace records, the process-wide queue under concurrent writers, and the level rules
+// and bounded formatting every subsystem reports through.
+#include <gtest/gtest.h>
+
+#include <string>
+#include <thread>
+#include <vector>
+
+#include "host/trace_line.h"
+#include "vexil/host/trace.h"
+
+namespace {
+
+struct Line {
+  TraceType type;
+  std::string title;
+  std::string text;
+};
+
+std::vector<Line> lines;
+
+void Record(TraceType type, const char* title, const char* text) { lines.push_back({type, title, text}); }
+
+void DrainQueue() {
+  xTraceEvent event;
+  while (xTraceEvent::queue().TryPop(event)) {
+  }
+}
+
+}  // namespace
+
+TEST(TraceEvent, DetailFollowsMessageAfterOneLineFeedOnlyWhenNotEmpty) {
+  EXPECT_EQ(xTraceEvent(TraceType::Line, "Error", "boom", nullptr).text, "boom");
+  EXPECT_EQ(xTraceEvent(TraceType::Line, "Error", "boom", "").text, "boom");
+  xTraceEvent full(TraceType::Notice, "task", "boom", "why");
+  EXPECT_EQ(full.text, "boom\nwhy");
+  EXPECT_EQ(full.title, "task");
+  EXPECT_EQ(full.type, TraceType::Notice);
+  EXPECT_TRUE(full.context.empty());
+}
+
+TEST(TraceEvent, LevelNamesAreTheProtocolTraceValues) {
+  EXPECT_EQ(TraceToString(LSP::TraceLevel::Off), "off");
+  EXPECT_EQ(TraceToString(LSP::TraceLevel::Messages), "messages");
+  EXPECT_EQ(TraceToString(LSP::TraceLevel::Verbose), "verbose");
+  EXPECT_EQ(TraceToString(static_cast<LSP::TraceLevel>(3)), "");
+  EXPECT_EQ(TraceToString(static_cast<LSP::TraceLevel>(-1)), "");
+}
+
+TEST(TraceQueue, KeepsEveryWritersOrderUnderConcurrentWriters) {
+  DrainQueue();
+  constexpr int kWriters = 4;
+  constexpr int kLinesEach = 2000;
+  std::vector<std::thread> writers;
+  for (int w = 0; w < kWriters; ++w) {
+    writers.emplace_back([w] {
+      for (int i = 0; i < kLinesEach; ++i)
+        xTraceEvent::Write(TraceType::Line, std::to_string(w).c_str(), std::to_string(i).c_str(), nullptr);
+    });
+  }
+  // The host drains while the writers are still busy, waiting when the queue runs dry.
+  std::vector<int> next(kWriters, 0);
+  for (int taken = 0; taken < kWriters * kLinesEach; ++taken) {
+    xTraceEvent event;
+    ASSERT_TRUE(xTraceEvent::queue().WaitPop(event, std::chrono::seconds(30)));
+    int writer = std::stoi(event.title);
+    EXPECT_EQ(std::stoi(event.text), next[writer]) << "writer " << writer << " out of order";
+    ++next[writer];
+  }
+  for (std::thread& writer : writers) writer.join();
+  EXPECT_TRUE(xTraceEvent::queue().Empty());
+}
+
+TEST(TraceQueue, WaitingPopWakesForALateWriterAndTimesOutOnSilence) {
+  DrainQueue();
+  xTraceEvent event;
+  EXPECT_FALSE(xTraceEvent::queue().WaitPop(event, std::chrono::milliseconds(1)));
+  std::thread writer([] { xTraceEvent::Write(TraceType::Line, "Message", "late", nullptr); });
+  event = xTraceEvent::queue().WaitPop();
+  EXPECT_EQ(event.text, "late");
+  writer.join();
+}
+
+TEST(Tracer, TitlesFollowTheLevelRules) {
+  struct Case {
+    LSP::TraceLevel level;
+    std::vector<std::string> titles;
+  } cases[] = {
+      {LSP::TraceLevel::Off, {"Error"}},
+      {LSP::TraceLevel::Messages, {"Message", "Error"}},
+      {LSP::TraceLevel::Verbose, {"Verbose", "Message", "Error"}},
+  };
+  for (const Case& c : cases) {
+    lines.clear();
+    vexil::Tracer tracer(Record, c.level);
+    tracer.Verbose("v %d\n", 1);
+    tracer.Message("m %s\n", "x");
+    tracer.Error("e\n\n");
+    std::vector<std::string> titles;
+    for (const Line& line : lines) {
+      titles.push_back(line.title);
+      EXPECT_EQ(line.type, TraceType::Line);
+    }
+    EXPECT_EQ(titles, c.titles) << "level " << static_cast<int>(c.level);
+  }
+  lines.clear();
+  vexil::Tracer silent(nullptr, LSP::TraceLevel::Verbose);
+  silent.Error("nothing\n");
+  silent.Text(TraceType::Notice, "task", "nothing");
+  EXPECT_FALSE(silent.Verbose());
+  EXPECT_TRUE(lines.empty());
+}
+
+TEST(Tracer, LinesAreCutToTheBufferButTextPassesWhole) {
+  lines.clear();
+  std::string longText(10000, 'x');
+  vexil::Tracer tracer(Record, LSP::TraceLevel::Off);
+  tracer.Error("%s\n", longText.c_str());
+  tracer.Text(TraceType::Line, "Message", longText.c_str());
+  vexil::TraceFormatted(Record, TraceType::Line, "Error", 512, "Watcher: %lld no longer operating.\n%s",
+                        static_cast<long long>(7), longText.c_str());
+  ASSERT_EQ(lines.size(), 3u);
+  EXPECT_EQ(lines[0].text, std::string(4095, 'x'));
+  EXPECT_EQ(lines[1].text, longText);
+  EXPECT_EQ(lines[2].text.size(), 511u);
+  EXPECT_EQ(lines[2].text.rfind("Watcher: 7 no longer operating.\n", 0), 0u);
+}

@@ -1,0 +1,125 @@
+// Typed member access: defaults for missing and null members, the exact texts of type
+// mismatches, and the JSON library's assertions surfacing as AssertException.
+#include <gtest/gtest.h>
+
+#include <stdexcept>
+#include <string>
+
+#include "vexil/json/json.h"
+
+namespace {
+
+// Parses `json` and keeps the document alive for the views the test takes.
+struct Parsed {
+  explicit Parsed(const std::string& json) { EXPECT_TRUE(reader.Parse(json)) << reader.Error(); }
+  LSP::xObject Root() { return reader.Root(); }
+  LSP::xReader reader;
+};
+
+template <typename Call>
+std::string ErrorText(Call call) {
+  try {
+    call();
+  } catch (const AssertException& e) {
+    return std::string("assert: ") + e.what();
+  } catch (const std::exception& e) {
+    return e.what();
+  }
+  return "no exception";
+}
+
+std::string Mismatch(const char* expected, const char* found) {
+  return std::string("Expecting a '") + expected + "' JSON object but found '" + found + "' JSON object.";
+}
+
+}  // namespace
+
+TEST(xObject, MissingAndNullMembersYieldTheFixedDefaults) {
+  for (const char* json : {R"({})", R"({"v":null})", "null"}) {
+    Parsed doc(json);
+    LSP::xObject o = doc.Root();
+    EXPECT_EQ(o.Int("v"), -1) << json;
+    EXPECT_EQ(o.Int64("v"), -1) << json;
+    EXPECT_EQ(o.UInt("v"), 0u) << json;
+    EXPECT_EQ(o.UInt64("v"), 0u) << json;
+    EXPECT_EQ(o.Double("v"), 0.0) << json;
+    EXPECT_FALSE(o.Bool("v")) << json;
+    EXPECT_EQ(o.String("v"), "") << json;
+    EXPECT_TRUE(o.Integers("v").empty()) << json;
+    EXPECT_TRUE(o.Strings("v").empty()) << json;
+    EXPECT_TRUE(o.Object("v").IsNull()) << json;
+    EXPECT_EQ(o.Object("v").Object("w").Int("x"), -1) << json;
+  }
+  Parsed doc(R"({"a":null})");
+  EXPECT_TRUE(doc.Root().HasObject("a"));
+  EXPECT_FALSE(doc.Root().HasObject("b"));
+  LSP::xObject empty;
+  EXPECT_TRUE(empty.IsNull());
+  EXPECT_FALSE(empty.HasObject("a"));
+  EXPECT_EQ(empty.Int("a"), -1);
+}
+
+TEST(xObject, MembersOfTheRightTypeAreReturned) {
+  Parsed doc(R"({"i":-3,"big":5000000000,"u":7,"d":2.5,"b":true,"s":"t\u00e9xt","v":[1,2,3],"w":["a","b"]})");
+  LSP::xObject o = doc.Root();
+  EXPECT_EQ(o.Int("i"), -3);
+  EXPECT_EQ(o.Int64("big"), 5000000000LL);
+  EXPECT_EQ(o.UInt("u"), 7u);
+  EXPECT_EQ(o.UInt64("big"), 5000000000ULL);
+  EXPECT_EQ(o.Double("d"), 2.5);
+  EXPECT_TRUE(o.Bool("b"));
+  EXPECT_EQ(o.String("s"), "t\xc3\xa9xt");
+  EXPECT_EQ(o.Integers("v"), (std::vector<int>{1, 2, 3}));
+  EXPECT_EQ(o.Strings("w"), (std::vector<std::string>{"a", "b"}));
+  EXPECT_TRUE(o.Object("v").IsArray());
+  EXPECT_TRUE(o.Object("i").IsInt());
+  EXPECT_EQ(o.Object("s").GetString(), "t\xc3\xa9xt");
+  EXPECT_EQ(o.Object("i").GetString(), "");
+}
+
+TEST(xObject, MembersOfAnotherTypeNameExpectedAndFoundTypes) {
+  Parsed doc(R"({"n":2,"f":1.0,"s":"3","a":[],"o":{},"t":true,"neg":-1,"big":5000000000})");
+  LSP::xObject o = doc.Root();
+  EXPECT_EQ(ErrorText([&] { o.Int("s"); }), Mismatch("int", "string"));
+  EXPECT_EQ(ErrorText([&] { o.Int("f"); }), Mismatch("int", "number"));
+  EXPECT_EQ(ErrorText([&] { o.Int("big"); }), Mismatch("int", "number"));
+  EXPECT_EQ(ErrorText([&] { o.Int64("t"); }), Mismatch("int64", "true"));
+  EXPECT_EQ(ErrorText([&] { o.UInt("neg"); }), Mismatch("uint", "number"));
+  EXPECT_EQ(ErrorText([&] { o.UInt64("o"); }), Mismatch("uint64", "object"));
+  EXPECT_EQ(ErrorText([&] { o.Double("n"); }), Mismatch("double", "number"));
+  EXPECT_EQ(ErrorText([&] { o.String("a"); }), Mismatch("string", "array "));
+  EXPECT_EQ(ErrorText([&] { o.Integers("o"); }), Mismatch("array", "object"));
+  EXPECT_EQ(ErrorText([&] { o.Strings("s"); }), Mismatch("array", "string"));
+  EXPECT_EQ(ErrorText([&] { o.Bool("n"); }), "n\nFailed to read JSON bool: " + Mismatch("bool", "number"));
+  Parsed falsy(R"({"x":false})");
+  EXPECT_EQ(ErrorText([&] { falsy.Root().String("x"); }), Mismatch("string", "false"));
+}
+
+TEST(xObject, LibraryAssertionsBecomeAssertExceptions) {
+  Parsed doc(R"({"v":[1,2.5],"w":["a",1],"arr":[1]})");
+  LSP::xObject o = doc.Root();
+  EXPECT_EQ(ErrorText([&] { o.Integers("v"); }), "assert: data_.f.flags & kIntFlag");
+  EXPECT_EQ(ErrorText([&] { o.Strings("w"); }), "assert: IsString()");
+  LSP::xObject array = o.Object("arr");
+  EXPECT_EQ(ErrorText([&] { array.Int("x"); }), "assert: IsObject()");
+  EXPECT_EQ(ErrorText([&] { array.Bool("x"); }), "x\nFailed to read JSON bool: IsObject()");
+  EXPECT_EQ(ErrorText([&] { array.Object("x"); }), "x\nFailed to read JSON object: IsObject()");
+  EXPECT_EQ(ErrorText([&] { o.String(nullptr); }), "assert: str != 0");
+  EXPECT_EQ(ErrorText([&] { o.HasObject(nullptr); }), "assert: str != 0");
+}
+
+TEST(xObject, AsIntTakesNumbersAndDecimalStrings) {
+  Parsed doc(R"({"n":42,"s":"42abc","bad":"abc","huge":"99999999999","neg":" -7","t":true,"f":1.5})");
+  LSP::xObject o = doc.Root();
+  EXPECT_EQ(o.Object("n").AsInt(), 42);
+  EXPECT_EQ(o.Object("s").AsInt(), 42);
+  EXPECT_EQ(o.Object("neg").AsInt(), -7);
+  EXPECT_EQ(ErrorText([&] { o.Object("bad").AsInt(); }), "invalid stoi argument");
+  EXPECT_EQ(ErrorText([&] { o.Object("huge").AsInt(); }), "stoi argument out of range");
+  EXPECT_EQ(ErrorText([&] { o.Object("t").AsInt(); }), Mismatch("int", "true"));
+  EXPECT_EQ(ErrorText([&] { o.Object("f").AsInt(); }), Mismatch("int", "number"));
+  EXPECT_EQ(o.Object("t").AsInt(7), 7);
+  EXPECT_EQ(o.Object("missing").AsInt(7), 7);
+  EXPECT_EQ(o.Object("s").AsInt(7), 42);
+  EXPECT_THROW(o.Object("bad").AsInt(7), std::invalid_argument);
+}
