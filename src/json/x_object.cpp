@@ -76,10 +76,7 @@ bool xObject::HasObject(const char* name) const {
   return value_->HasMember(name);
 }
 
-bool xObject::CheckValue(const char* name) const {
-  if (value_->IsNull() || !HasObject(name)) return false;
-  return !(*value_)[name].IsNull();
-}
+bool xObject::CheckValue(const char* name) const { return Present(name) != nullptr; }
 
 xObject xObject::Object(const char* name) const {
   try {
@@ -99,8 +96,13 @@ bool xObject::Bool(const char* name) const {
   }
 }
 
+// One member search serves the presence test and the access.
 const JsonValue* xObject::Present(const char* name) const {
-  return CheckValue(name) ? &(*value_)[name] : nullptr;
+  RequireName(name);
+  if (value_->IsNull()) return nullptr;
+  JsonValue::ConstMemberIterator member = value_->FindMember(name);
+  if (member == value_->MemberEnd() || member->value.IsNull()) return nullptr;
+  return &member->value;
 }
 
 double xObject::Double(const char* name) const {

@@ -75,7 +75,7 @@ class VEXIL_API xObject {
   bool CheckValue(const char* name) const;
 
  private:
-  const JsonValue* Present(const char* name) const;  // null unless CheckValue(name)
+  const JsonValue* Present(const char* name) const;  // the non-null member, or null
 
   const JsonValue* value_;
 };
