@@ -86,7 +86,8 @@ TEST(Structures, DocumentsAndIdentifiers) {
   EXPECT_EQ(LSP::ToJsonText(versioned), R"({"uri":"file:///a.c","version":3})");
   EXPECT_EQ(ReadJson<LSP::VersionedTextDocumentIdentifier>(R"({"uri":"u","version":null})").version, -1);
   EXPECT_STREQ(versioned.Name(), "textDocument");
-  EXPECT_EQ(LSP::ToJsonText(*new LSP::TextDocumentIdentifier()), "{}");
+  LSP::TextDocumentIdentifier unnamed;
+  EXPECT_EQ(LSP::ToJsonText(unnamed), "{}");
 
   auto position = ReadJson<LSP::Position>("{}");
   EXPECT_EQ(position.line, -1);
