@@ -7,7 +7,11 @@ BUILD_TYPE ?= RelWithDebInfo
 JOBS       ?= $(shell nproc 2>/dev/null || echo 2)
 CTEST      = ctest --output-on-failure --timeout 300 -j $(JOBS)
 
-.PHONY: all deps configure build test bench asan tsan clean
+WINDOWS_BUILD   ?= build-windows
+WINDOWS_SYSROOT  = $(abspath $(WINDOWS_BUILD))/sysroot
+WINE_ENV         = WINEPREFIX=$(abspath $(WINDOWS_BUILD))/wineprefix WINEARCH=win32 WINEDEBUG=-all
+
+.PHONY: all deps configure build test bench asan tsan clean windows-deps windows test-windows
 
 all: build
 
@@ -37,5 +41,24 @@ tsan: deps
 	cmake --build build-tsan
 	TSAN_OPTIONS=halt_on_error=1:second_deadlock_stack=1 $(CTEST) --test-dir build-tsan
 
+# The 32-bit Windows DLL, cross-built with mingw-w64; its tests run under wine.
+windows-deps:
+	scripts/install-windows-deps.sh $(WINDOWS_SYSROOT)
+
+windows: windows-deps
+	cmake -S . -B $(WINDOWS_BUILD) -G $(GENERATOR) -DCMAKE_BUILD_TYPE=Release \
+	  -DCMAKE_TOOLCHAIN_FILE=$(CURDIR)/cmake/toolchain-mingw32.cmake \
+	  -DVEXIL_WINDOWS_SYSROOT=$(WINDOWS_SYSROOT) -DCMAKE_PREFIX_PATH=$(WINDOWS_SYSROOT)
+	cmake --build $(WINDOWS_BUILD)
+	scripts/check-windows-exports.sh $(WINDOWS_BUILD)/bin/vexil.dll
+
+# A persistent wineserver saves every test the server's start-up, and wine's own services,
+# started once here, do not inherit (and hold open) the output pipes of the tests.
+test-windows: windows
+	$(WINE_ENV) wineserver -k >/dev/null 2>&1 || true
+	$(WINE_ENV) wineserver -p
+	$(WINE_ENV) wineboot -i >/dev/null 2>&1 || true
+	$(WINE_ENV) $(CTEST) --test-dir $(WINDOWS_BUILD); status=$$?; $(WINE_ENV) wineserver -k; exit $$status
+
 clean:
-	rm -rf $(BUILD) build-asan build-tsan
+	rm -rf $(BUILD) build-asan build-tsan $(WINDOWS_BUILD)
