@@ -26,6 +26,20 @@ std::string Frame(const std::string& body) {
 
 void Send(const Poco::Pipe& pipe, const std::string& bytes) { vexil::WriteAll(pipe, bytes.data(), bytes.size()); }
 
+// A reader over a fresh pipe, running on its own thread; stopped and joined at the end.
+template <typename Reader>
+struct RunningReader {
+  template <typename... Name>
+  explicit RunningReader(Name... name) : reader(name..., pipe) {
+    thread.Start(reader);
+  }
+  ~RunningReader() { reader.Stop(); }
+
+  Poco::Pipe pipe;
+  Reader reader;
+  vexil::ReaderThread thread;
+};
+
 std::string Pop(vexil::xPipeReader& reader) {
   std::string item;
   EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Taken);
@@ -33,10 +47,9 @@ std::string Pop(vexil::xPipeReader& reader) {
 }
 
 TEST(PipeReader, QueuesBodiesInOrderAndFinishesAtEndOfFile) {
-  Poco::Pipe pipe;
-  vexil::xPipeReader reader("stdout", pipe);
-  vexil::ReaderThread thread;
-  thread.Start(reader);
+  RunningReader<vexil::xPipeReader> running("stdout");
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeReader& reader = running.reader;
   Send(pipe, "banner\n" + Frame(R"({"id":1})") + Frame(R"({"id":2})"));
   EXPECT_EQ(Pop(reader), R"({"id":1})");
   EXPECT_EQ(Pop(reader), R"({"id":2})");
@@ -45,20 +58,20 @@ TEST(PipeReader, QueuesBodiesInOrderAndFinishesAtEndOfFile) {
   pipe.close(Poco::Pipe::CLOSE_WRITE);
   std::string item;
   EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);  // half a body is dropped
-  thread.Join();
+  running.thread.Join();
   EXPECT_EQ(reader.TakeOutput(), "stray Content-Length: ");
   EXPECT_EQ(reader.Errors(), "");
 }
 
 TEST(PipeReader, StopEndsAReaderWhoseWriterStaysOpenAndSilent) {
-  Poco::Pipe pipe;
-  vexil::xPipeReader reader("stdout", pipe);
-  vexil::ReaderThread thread;
-  thread.Start(reader);
-  std::this_thread::sleep_for(std::chrono::milliseconds(vexil::xPipeReader::kStopPollMs));
+  RunningReader<vexil::xPipeReader> running("stdout");
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeReader& reader = running.reader;
+  Send(pipe, "ready");  // once it is taken, the reader is in its loop
+  ASSERT_TRUE(transport_test::WaitFor([&] { return reader.TakeOutput() == "ready"; }));
   auto stopped = std::chrono::steady_clock::now();
   reader.Stop();
-  thread.Join();  // a blocking read would hang here for good
+  running.thread.Join();  // a blocking read would hang here for good
   EXPECT_LT(std::chrono::steady_clock::now() - stopped, 2s);
   std::string item;
   EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);
@@ -69,7 +82,7 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
   vexil::xPipeReader reader("stdout", pipe);
   std::vector<std::string> seen;  // written on the reader's thread, read after the join
   reader.SetDispatch([&](LSP::xReader& message) { seen.push_back(message.Root().String("method")); });
-  vexil::ReaderThread thread;
+  vexil::ReaderThread thread;  // the hook must be set before the thread starts
   thread.Start(reader);
   const std::vector<std::string> bodies = {
       R"({"jsonrpc":"2.0","method":"window/logMessage","params":{}})",
@@ -85,31 +98,28 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
 }
 
 TEST(PipeReader, ErrorReaderQueuesLinesAndKeepsNoOutput) {
-  Poco::Pipe pipe;
-  vexil::xPipeErrReader reader(pipe);
+  RunningReader<vexil::xPipeErrReader> running;
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeErrReader& reader = running.reader;
   EXPECT_EQ(reader.Name(), "strderr");
-  vexil::ReaderThread thread;
-  thread.Start(reader);
   Send(pipe, "w\r\nx\ny\rz\nlast");
   pipe.close(Poco::Pipe::CLOSE_WRITE);
-  thread.Join();
+  running.thread.Join();
   for (const char* line : {"w", "x", "y", "z"}) EXPECT_EQ(Pop(reader), line);
   EXPECT_EQ(reader.Messages().Size(), 0u);  // the unfinished line is dropped
   EXPECT_EQ(reader.TakeOutput(), "");
 }
 
 TEST(PipeReader, SixteenMebibyteBodyThroughAPipe) {
-  Poco::Pipe pipe;
-  vexil::xPipeReader reader("stdout", pipe);
-  vexil::ReaderThread thread;
-  thread.Start(reader);
+  RunningReader<vexil::xPipeReader> running("stdout");
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeReader& reader = running.reader;
   std::string body = "\"" + std::string(16u << 20, 'y') + "\"";
   std::thread writer([&] { Send(pipe, Frame(body) + Frame("{}")); });
   std::string first = Pop(reader);
   EXPECT_TRUE(first == body) << "got " << first.size() << " bytes";
   EXPECT_EQ(Pop(reader), "{}");
   writer.join();
-  reader.Stop();
 }
 
 TEST(PipeIo, WritingToAPipeNobodyReadsFailsWithoutSignallingTheProcess) {
