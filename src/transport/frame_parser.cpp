@@ -1,0 +1,126 @@
+// The byte-level state machines behind the two pipe readers. Malformed input is never
+// reported here: unmatched bytes stay in the stray output for the trace to show.
+#include "transport/frame_parser.h"
+
+#include <algorithm>
+#include <cctype>
+#include <cstring>
+
+namespace vexil {
+namespace {
+
+constexpr char kHeader[] = "Content-Length: ";
+constexpr std::size_t kHeaderSize = sizeof kHeader - 1;
+constexpr char kSeparator[] = "\r\n\r\n";
+constexpr std::size_t kSeparatorSize = sizeof kSeparator - 1;
+
+char Lower(char byte) { return static_cast<char>(std::tolower(static_cast<unsigned char>(byte))); }
+
+}  // namespace
+
+void FrameParser::Feed(const char* data, std::size_t size, std::vector<std::string>& bodies) {
+  const char* end = data + size;
+  while (data < end) {
+    if (*data == kDroppedByte) {
+      ++data;
+    } else if (state_ == State::Body) {
+      data = FeedBody(data, end, bodies);
+    } else {
+      Step(*data++, bodies);
+    }
+  }
+}
+
+std::string FrameParser::TakeOutput() {
+  std::string taken;
+  taken.swap(output_);
+  return taken;
+}
+
+void FrameParser::Step(char byte, std::vector<std::string>& bodies) {
+  switch (state_) {
+    case State::Header: StepHeader(byte); break;
+    case State::Length: StepLength(byte); break;
+    case State::Separator: StepSeparator(byte); break;
+    case State::Body: break;  // bodies are taken in runs by FeedBody
+  }
+}
+
+void FrameParser::StepHeader(char byte) {
+  output_ += byte;
+  // The byte that breaks a match is not tried as the start of a new one, so a
+  // doubled first letter ("CContent-Length") hides the frame behind it.
+  if (Lower(byte) != Lower(kHeader[match_])) {
+    match_ = 0;
+    return;
+  }
+  if (++match_ < kHeaderSize) return;
+  state_ = State::Length;
+  match_ = 0;
+  remaining_ = 0;
+  body_.clear();
+}
+
+void FrameParser::StepLength(char byte) {
+  if (std::isdigit(static_cast<unsigned char>(byte))) {
+    // The count wraps like the 32-bit number it is; no bound is applied.
+    remaining_ = static_cast<std::int32_t>(static_cast<std::uint32_t>(remaining_) * 10u +
+                                           static_cast<std::uint32_t>(byte - '0'));
+    return;
+  }
+  state_ = State::Separator;
+  match_ = 0;
+  StepSeparator(byte);
+}
+
+void FrameParser::StepSeparator(char byte) {
+  // Further header lines pass by here: only the blank line ends the search.
+  if (byte != kSeparator[match_]) {
+    match_ = 0;
+    return;
+  }
+  if (++match_ == kSeparatorSize) state_ = State::Body;
+}
+
+const char* FrameParser::FeedBody(const char* begin, const char* end, std::vector<std::string>& bodies) {
+  // A length of 0 (or one that wrapped below) can never count down to the end of the
+  // frame: the rest of the stream is swallowed, so there is no point keeping it.
+  if (remaining_ <= 0) return end;
+  std::size_t run = std::min(static_cast<std::size_t>(end - begin), static_cast<std::size_t>(remaining_));
+  if (const void* dropped = std::memchr(begin, kDroppedByte, run)) {
+    run = static_cast<std::size_t>(static_cast<const char*>(dropped) - begin);
+  }
+  body_.append(begin, run);
+  remaining_ -= static_cast<std::int32_t>(run);
+  if (remaining_ == 0) Complete(bodies);
+  return begin + run;
+}
+
+void FrameParser::Complete(std::vector<std::string>& bodies) {
+  bodies.push_back(std::move(body_));
+  body_.clear();
+  output_.clear();
+  state_ = State::Header;
+  match_ = 0;
+  remaining_ = 0;
+}
+
+void LineSplitter::Feed(const char* data, std::size_t size, std::vector<std::string>& lines) {
+  for (const char* end = data + size; data < end; ++data) {
+    char byte = *data;
+    if (byte == kDroppedByte) continue;
+    if (byte == '\r') {
+      carriageReturn_ = true;
+      continue;
+    }
+    if (carriageReturn_ || byte == '\n') {
+      lines.push_back(std::move(line_));
+      line_.clear();
+      carriageReturn_ = false;
+      if (byte == '\n') continue;
+    }
+    line_ += byte;
+  }
+}
+
+}  // namespace vexil

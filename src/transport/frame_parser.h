@@ -1,0 +1,51 @@
+// Cuts a server's standard output into message bodies: finds "Content-Length: " in any
+// case, reads the digits, skips to the blank line and takes that many bytes as one body.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace vexil {
+
+class FrameParser {
+ public:
+  // Consumes `size` bytes and appends every body they complete to `bodies`, in order.
+  void Feed(const char* data, std::size_t size, std::vector<std::string>& bodies);
+  // Bytes seen while looking for a header since the last completed message; emptied.
+  std::string TakeOutput();
+
+ private:
+  enum class State { Header, Length, Separator, Body };
+
+  void Step(char byte, std::vector<std::string>& bodies);
+  void StepHeader(char byte);
+  void StepLength(char byte);
+  void StepSeparator(char byte);
+  const char* FeedBody(const char* begin, const char* end, std::vector<std::string>& bodies);
+  void Complete(std::vector<std::string>& bodies);
+
+  State state_ = State::Header;
+  std::size_t match_ = 0;
+  std::int32_t remaining_ = 0;
+  std::string body_;
+  std::string output_;
+};
+
+// Cuts a server's standard error into lines ended by CR, LF or CR LF (a lone CR ends
+// a line too, and the byte after it starts the next one).
+class LineSplitter {
+ public:
+  void Feed(const char* data, std::size_t size, std::vector<std::string>& lines);
+
+ private:
+  std::string line_;
+  bool carriageReturn_ = false;
+};
+
+// A byte 0xFF is dropped without a trace by both splitters: it is neither stored nor
+// counted, so a body holding one waits for one byte more than its length says.
+constexpr char kDroppedByte = static_cast<char>(0xFF);
+
+}  // namespace vexil

@@ -1,0 +1,43 @@
+// A mutex-guarded deque with one condition variable, signalled on every push and once
+// more when the producer ends.
+#include "transport/message_queue.h"
+
+namespace vexil {
+
+void MessageQueue::Push(std::string item) {
+  std::lock_guard<std::mutex> lock(mutex_);
+  items_.push_back(std::move(item));
+  ready_.notify_one();
+}
+
+void MessageQueue::Finish() {
+  std::lock_guard<std::mutex> lock(mutex_);
+  finished_ = true;
+  ready_.notify_all();
+}
+
+std::size_t MessageQueue::Size() const {
+  std::lock_guard<std::mutex> lock(mutex_);
+  return items_.size();
+}
+
+bool MessageQueue::TryPop(std::string& item) {
+  std::lock_guard<std::mutex> lock(mutex_);
+  return TakeFront(item);
+}
+
+MessageQueue::Wait MessageQueue::WaitPop(std::string& item, std::chrono::milliseconds limit) {
+  std::unique_lock<std::mutex> lock(mutex_);
+  ready_.wait_for(lock, limit, [this] { return !items_.empty() || finished_; });
+  if (TakeFront(item)) return Wait::Taken;
+  return finished_ ? Wait::Finished : Wait::TimedOut;
+}
+
+bool MessageQueue::TakeFront(std::string& item) {
+  if (items_.empty()) return false;
+  item = std::move(items_.front());
+  items_.pop_front();
+  return true;
+}
+
+}  // namespace vexil

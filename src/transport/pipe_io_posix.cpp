@@ -1,0 +1,85 @@
+// Pipe traffic on POSIX: poll() gives readers a wake-up to check their stop flag, and
+// writes block SIGPIPE for the writing thread so a dead server cannot kill the host.
+#include "transport/pipe_io.h"
+
+#include <poll.h>
+#include <signal.h>
+#include <time.h>
+#include <unistd.h>
+
+#include <cerrno>
+
+#include <Poco/Exception.h>
+
+namespace vexil {
+namespace {
+
+// Blocks SIGPIPE on this thread for its lifetime. A SIGPIPE raised meanwhile by our own
+// write stays pending; it is consumed before the old mask returns, unless one was
+// already pending for someone else.
+class SigpipeBlock {
+ public:
+  SigpipeBlock() {
+    sigemptyset(&pipeOnly_);
+    sigaddset(&pipeOnly_, SIGPIPE);
+    sigset_t pending;
+    sigpending(&pending);
+    wasPending_ = sigismember(&pending, SIGPIPE) == 1;
+    pthread_sigmask(SIG_BLOCK, &pipeOnly_, &previous_);
+  }
+
+  ~SigpipeBlock() {
+    if (!wasPending_) ConsumePending();
+    pthread_sigmask(SIG_SETMASK, &previous_, nullptr);
+  }
+
+  SigpipeBlock(const SigpipeBlock&) = delete;
+  SigpipeBlock& operator=(const SigpipeBlock&) = delete;
+
+ private:
+  void ConsumePending() {
+    sigset_t pending;
+    sigpending(&pending);
+    if (sigismember(&pending, SIGPIPE) != 1) return;
+    const timespec now{0, 0};
+    int saved = errno;
+    while (sigtimedwait(&pipeOnly_, nullptr, &now) == -1 && errno == EINTR) {
+    }
+    errno = saved;
+  }
+
+  sigset_t pipeOnly_;
+  sigset_t previous_;
+  bool wasPending_ = false;
+};
+
+}  // namespace
+
+PipeWait WaitReadable(const Poco::Pipe& pipe, int milliseconds) {
+  pollfd watched{pipe.readHandle(), POLLIN, 0};
+  int ready = poll(&watched, 1, milliseconds);
+  if (ready == 0 || (ready < 0 && errno == EINTR)) return PipeWait::Quiet;
+  if (ready < 0 || (watched.revents & POLLNVAL)) return PipeWait::Closed;
+  return PipeWait::Readable;
+}
+
+std::size_t ReadSome(const Poco::Pipe& pipe, char* buffer, std::size_t size) {
+  for (;;) {
+    ssize_t count = read(pipe.readHandle(), buffer, size);
+    if (count >= 0) return static_cast<std::size_t>(count);
+    if (errno != EINTR) throw Poco::ReadFileException("anonymous pipe");
+  }
+}
+
+void WriteAll(const Poco::Pipe& pipe, const char* data, std::size_t size) {
+  SigpipeBlock block;
+  while (size > 0) {
+    ssize_t count = write(pipe.writeHandle(), data, size);
+    if (count < 0 && errno == EINTR) continue;
+    if (count < 0) throw Poco::WriteFileException("anonymous pipe");
+    data += count;
+    size -= static_cast<std::size_t>(count);
+  }
+}
+
+}  // namespace vexil

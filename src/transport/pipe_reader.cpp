@@ -1,0 +1,90 @@
+// The read loop shared by both readers: bounded waits so the stop flag is seen, chunked
+// reads fed to the splitter, and read failures recorded without ending the loop.
+#include "transport/pipe_reader.h"
+
+#include <vector>
+
+#include <Poco/Exception.h>
+
+#include "transport/pipe_io.h"
+
+namespace vexil {
+namespace {
+
+constexpr std::size_t kChunkSize = 64 * 1024;
+
+// A cheap look that spares replies (most of the traffic) a parse on this thread.
+bool MayNameMethod(const std::string& body) { return body.find("\"method\"") != std::string::npos; }
+
+}  // namespace
+
+xPipeReader::xPipeReader(const char* name, Poco::Pipe pipe) : name_(name), pipe_(std::move(pipe)) {}
+
+void xPipeReader::run() {
+  std::vector<char> buffer(kChunkSize);
+  while (!stop_) {
+    try {
+      PipeWait wait = WaitReadable(pipe_, kStopPollMs);
+      if (wait == PipeWait::Quiet) continue;
+      if (wait == PipeWait::Closed) break;
+      std::size_t count = ReadSome(pipe_, buffer.data(), buffer.size());
+      if (count == 0) break;
+      Consume(buffer.data(), count);
+    } catch (const Poco::Exception& e) {
+      RecordException(e.displayText());
+    } catch (const std::exception& e) {
+      RecordException(e.what());
+    }
+  }
+  messages_.Finish();
+}
+
+std::string xPipeReader::TakeOutput() {
+  std::lock_guard<std::mutex> lock(textMutex_);
+  return parser_.TakeOutput();
+}
+
+std::string xPipeReader::Errors() const {
+  std::lock_guard<std::mutex> lock(textMutex_);
+  return errors_;
+}
+
+void xPipeReader::Consume(const char* data, std::size_t size) {
+  std::vector<std::string> bodies;
+  {
+    std::lock_guard<std::mutex> lock(textMutex_);
+    parser_.Feed(data, size, bodies);
+  }
+  for (std::string& body : bodies) {
+    if (dispatch_ && MayNameMethod(body)) DispatchMessage(body);
+    Deliver(std::move(body));
+  }
+}
+
+void xPipeReader::Deliver(std::string unit) { messages_.Push(std::move(unit)); }
+
+void xPipeReader::RecordException(const std::string& text) {
+  std::lock_guard<std::mutex> lock(textMutex_);
+  errors_ += "Exception: " + (text.empty() ? std::string("Unknown exception") : text) + "\n";
+}
+
+void xPipeReader::DispatchMessage(const std::string& body) {
+  // A failing hook must neither end the loop nor keep the message from the queue.
+  try {
+    LSP::xReader message;
+    if (!message.Parse(body) || !message.Root().IsObject() || !message.Root().HasObject("method")) return;
+    dispatch_(message);
+  } catch (const std::exception& e) {
+    RecordException(e.what());
+  }
+}
+
+xPipeErrReader::xPipeErrReader(Poco::Pipe pipe) : xPipeReader("strderr", std::move(pipe)) {}
+
+void xPipeErrReader::Consume(const char* data, std::size_t size) {
+  std::vector<std::string> lines;
+  splitter_.Feed(data, size, lines);
+  for (std::string& line : lines) Deliver(std::move(line));
+}
+
+}  // namespace vexil

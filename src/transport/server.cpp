@@ -1,0 +1,174 @@
+// The server's life: built from the host's record, launched with its two readers,
+// reported on when the launch fails, and closed without ever killing the process.
+#include "transport/server.h"
+
+#include <sstream>
+
+#include <Poco/Thread.h>
+
+namespace vexil {
+
+const char* const kTraceLevelHint =
+    "For extra debug information, edit the Document Type and in the Language Server panel set the Trace Level to "
+    "Verbose.\n";
+
+namespace {
+
+constexpr int kDefaultTimeoutMs = 200;
+// A server still running this long after its launch counts as started.
+constexpr long kStartupGraceMs = 150;
+
+}  // namespace
+
+xServer::xServer(const xServerStart& start)
+    : tracer_(start.trace, start.level),
+      outReader_("stdout", outPipe_),
+      errReader_(errPipe_),
+      timeout_(start.timeout < 1 ? kDefaultTimeoutMs : start.timeout),
+      useCommand_(start.useCommand),
+      directory_(start.directory) {
+  if (useCommand_) {
+    CommandInterpreter interpreter = SystemCommandInterpreter();
+    executable_ = interpreter.program;
+    AddArgument(interpreter.runSwitch);
+    AddArgument(start.executable);
+  } else {
+    executable_ = start.executable;
+  }
+  for (const std::string* argument : {&start.argument1, &start.argument2, &start.argument3, &start.argument4,
+                                      &start.argument5, &start.argument6, &start.argument7}) {
+    AddArgument(*argument);
+  }
+  outReader_.SetDispatch([this](LSP::xReader& message) { Dispatch(message); });
+}
+
+xServer::~xServer() {
+  tracer_.Verbose("Closing language server.....\n");
+  Cancel();
+  tracer_.Verbose("Closing pipes.....\n");
+  CloseInput();
+  tracer_.Verbose("Waiting for threads to end....\n");
+  JoinReaders();
+  tracer_.Verbose("Language server close complete.\n\n");
+}
+
+bool xServer::Start() {
+  std::string reason;
+  bool hint = true;
+  if (IsRunning()) return true;
+  TraceLaunchDetails();
+  bool running = false;
+  try {
+    running = Launch();
+  } catch (const Poco::Exception& e) {
+    hint = false;
+    reason = LastSystemErrorText();
+    Exception(e);
+  } catch (const std::exception& e) {
+    hint = false;
+    reason = LastSystemErrorText();
+    Exception(e);
+  }
+  if (!running) ReportFailedStart(reason, hint);
+  return running;
+}
+
+void xServer::Cancel() {
+  outReader_.Stop();
+  errReader_.Stop();
+}
+
+void xServer::Exception(const Poco::Exception& e) { RecordException(e.message()); }
+
+void xServer::Exception(const std::exception& e) { RecordException(e.what()); }
+
+void xServer::AddArgument(const std::string& argument) {
+  if (!argument.empty()) arguments_.push_back(argument);
+}
+
+const char* xServer::Join(const std::vector<std::string>& list, const char* separator) {
+  std::ostringstream text;
+  for (const std::string& element : list) text << element << separator;
+  joined_ = text.str();
+  return joined_.c_str();
+}
+
+void xServer::CloseInput() {
+  // The reader's thread may be answering a server request through this pipe.
+  std::lock_guard<std::mutex> lock(writeMutex_);
+  inPipe_.close(Poco::Pipe::CLOSE_WRITE);
+}
+
+void xServer::JoinReaders() {
+  // The readers poll, so they end on their stop flags even when a process that
+  // inherited the pipes keeps them open; only then are the reading ends closed.
+  outThread_.Join();
+  errThread_.Join();
+  outPipe_.close(Poco::Pipe::CLOSE_READ);
+  errPipe_.close(Poco::Pipe::CLOSE_READ);
+}
+
+bool xServer::Launch() {
+  process_.Launch(executable_, arguments_, directory_, &inPipe_, &outPipe_, &errPipe_);
+  errThread_.Start(errReader_);
+  outThread_.Start(outReader_);
+  if (tracer_.Messages()) TraceStrayOutput();
+  Poco::Thread::sleep(kStartupGraceMs);
+  bool running = IsRunning();
+  if (tracer_.Messages()) TraceStrayOutput();
+  return running;
+}
+
+void xServer::ReportFailedStart(const std::string& reason, bool hint) {
+  if (tracer_.Messages()) {
+    TraceEarlyErrorLines();
+    TraceStrayOutput();
+  }
+  Cancel();
+  CloseInput();
+  JoinReaders();
+  if (!reason.empty()) tracer_.Error("\nError Reason: %s%s", reason.c_str(), reason.back() == '\n' ? "" : "\n");
+  tracer_.Error(
+      "The language server failed to start. Make sure the langauge server has been correctly installed.\n\n");
+  tracer_.Error(
+      "Make sure the executable and directory details are correct and if required the system PATH is also "
+      "correct.\n");
+  if (hint) tracer_.Error("%s", kTraceLevelHint);
+}
+
+void xServer::TraceLaunchDetails() {
+  if (!tracer_.Verbose()) return;
+  tracer_.Verbose(" Executable: %s\n", executable_.c_str());
+  tracer_.Verbose("  Directory: %s\n", directory_.c_str());
+  tracer_.Verbose("  Arguments: %s\n", Join(arguments_, " "));
+  tracer_.Verbose("Use Command: %s\n", useCommand_ ? "Yes" : "No");
+  tracer_.Verbose("     Timout: %d (milliseconds)\n\n", timeout_);
+}
+
+void xServer::TraceStrayOutput() {
+  xPipeReader* readers[] = {&errReader_, &outReader_};
+  for (xPipeReader* reader : readers) {
+    std::string output = reader->TakeOutput();
+    if (!output.empty()) tracer_.Text(TraceType::Line, "Message", output.c_str());
+  }
+}
+
+void xServer::TraceEarlyErrorLines() {
+  // Nobody will read a dead server's error queue, yet its last words (an interpreter's
+  // "not found") tell why it did not start.
+  std::string lines;
+  std::string line;
+  while (errReader_.Messages().TryPop(line)) lines += line + "\n";
+  if (!lines.empty()) tracer_.Text(TraceType::Line, "Message", lines.c_str());
+}
+
+void xServer::RecordException(const std::string& text) {
+  haveErrors_ = true;
+  errorMessage_ = text;
+  if (!tracer_.Callback()) return;
+  tracer_.Error("Error: %s\n\n", text.c_str());
+  TraceStrayOutput();
+  tracer_.Error("%s", kTraceLevelHint);
+}
+
+}  // namespace vexil

@@ -1,0 +1,174 @@
+// The server's traffic: framing and writing messages (one write path, under one lock),
+// waiting for a reply by its id, and reading it into the caller's response.
+#include <chrono>
+#include <climits>
+#include <stdexcept>
+
+#include "transport/pipe_io.h"
+#include "transport/server.h"
+#include "transport/server_requests.h"
+
+namespace vexil {
+namespace {
+
+constexpr std::chrono::milliseconds kTick{100};
+
+// Adds a line feed to a traced text that lacks one.
+const char* LineEnd(const std::string& text) { return !text.empty() && text.back() == '\n' ? "" : "\n"; }
+
+// An ignored message adds half of what is left, up to the largest count there is.
+int Extend(int countdown) { return countdown > INT_MAX - countdown / 2 ? INT_MAX : countdown + countdown / 2; }
+
+bool HasNullOrNoId(const LSP::xObject& message) {
+  return !message.HasObject("id") || message.Object("id").IsNull();
+}
+
+}  // namespace
+
+void xServer::Write(LSP::RequestMessage& message) { WriteMessage(message); }
+
+void xServer::Write(LSP::NotificationMessage& message) { WriteMessage(message); }
+
+void xServer::WriteMessage(LSP::MessageBase& message) {
+  // Nothing of a failed write reaches the host: a dead server shows on the next read.
+  try {
+    if (!IsRunning()) throw std::runtime_error("A write to the server was requested but the server is not running.");
+    std::string body = message.ToJSON();
+    Write(body.c_str(), static_cast<int>(body.size()), message.IsRequest());
+  } catch (const std::exception&) {
+  }
+}
+
+void xServer::Write(const char* text, int length, bool isRequest) {
+  haveErrors_ = false;
+  errorMessage_.clear();
+  Transmit(std::string(text, static_cast<std::size_t>(length)), true);
+}
+
+void xServer::Transmit(const std::string& body, bool reportReaderErrors) {
+  std::string framed = "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
+  std::lock_guard<std::mutex> lock(writeMutex_);
+  tracer_.Message("\nSent: %s\n", framed.c_str());
+  if (reportReaderErrors) ReportReaderErrors();
+  WriteAll(inPipe_, framed.data(), framed.size());
+}
+
+void xServer::ReportReaderErrors() const {
+  // Never cleared: once a reader has failed, every later write says so again.
+  const xPipeReader* readers[] = {&outReader_, &errReader_};
+  for (const xPipeReader* reader : readers) {
+    std::string errors = reader->Errors();
+    if (!errors.empty()) tracer_.Error("\nWrite Error: %s\n", errors.c_str());
+  }
+}
+
+std::string xServer::Reply(int id) {
+  lastWaitTicks_ = 0;
+  if (!IsRunning()) return "";
+  int countdown = timeout_ / 100 + 1;
+  std::string text;
+  while (countdown >= 1) {
+    DrainErrorLines();
+    MessageQueue::Wait wait;
+    // Only a wait in which nothing arrived uses a tick; the reader's end (the server
+    // closed its output) ends the wait at once, since no reply can come any more.
+    while ((wait = outReader_.Messages().WaitPop(text, kTick)) == MessageQueue::Wait::TimedOut) {
+      ++lastWaitTicks_;
+      if (--countdown == 0) break;
+    }
+    if (wait != MessageQueue::Wait::Taken) {
+      ReportTimeOut();
+      CancelRequest(id);
+      return "";
+    }
+    if (HaveId(id, text)) {
+      tracer_.Message("Reply: %s%s", text.c_str(), LineEnd(text));
+      return text;
+    }
+    countdown = Extend(countdown);
+    tracer_.Message("Ignoring Reply: %s%s", text.c_str(), LineEnd(text));
+  }
+  return "";
+}
+
+void xServer::DrainErrorLines() {
+  std::string line;
+  while (errReader_.Messages().TryPop(line)) {
+    tracer_.Verbose("Reply: %s%s", line.c_str(), LineEnd(line));
+  }
+}
+
+void xServer::ReportTimeOut() {
+  if (!tracer_.Callback()) return;
+  tracer_.Error("Reply: Timed out waiting for reply......\n");
+  tracer_.Error("Output: %s\n", outReader_.TakeOutput().c_str());
+  tracer_.Error("%s", kTraceLevelHint);
+}
+
+void xServer::CancelRequest(int id) {
+  // Only numbered requests can be cancelled, and only a running server can hear it.
+  if (id < 1 || !IsRunning()) return;
+  try {
+    LSP::CancelParams params(id);
+    LSP::NotificationMessage cancel("$/cancelRequest", &params);
+    Transmit(cancel.ToJSON(), false);
+  } catch (const std::exception&) {
+  }
+}
+
+bool xServer::HaveId(int id, const std::string& text) {
+  try {
+    LSP::xReader reader;
+    if (!reader.Parse(text)) {
+      tracer_.Message("JSON Parse Failed:\n%s\n", text.c_str());
+      return true;
+    }
+    LSP::xObject message = reader.Root();
+    // Server requests number their own ids, so only a notification can match, and only -1.
+    if (message.HasObject("method")) return !IsServerRequest(message) && id == -1;
+    // An error without an id answers a request the server could not read; one with
+    // another id is a late answer to an earlier request.
+    if (message.HasObject("error") && HasNullOrNoId(message)) return true;
+    return message.Int("id") == id;
+  } catch (const Poco::Exception& e) {
+    tracer_.Message("Reply Exception: %s\n", text.c_str());
+    Exception(e);
+    return true;
+  } catch (const std::exception& e) {
+    tracer_.Message("Reply Exception: %s\n", text.c_str());
+    Exception(e);
+    return true;
+  } catch (...) {
+    return false;
+  }
+}
+
+void xServer::Read(int id, LSP::ResponseMessage& response) {
+  try {
+    if (!IsRunning()) throw std::runtime_error("A server read was requested but the server is not running.");
+    std::string text = Reply(id);
+    LSP::xReader reader;
+    if (reader.Parse(text)) response.Read(reader);
+    if (!response.HaveError()) return;
+    errorMessage_ = response.ErrorMessage();
+    if (response.MethodNotFound()) {
+      haveErrors_ = false;
+      tracer_.Message("Warning: %s\n\n", response.ErrorMessage());
+    } else {
+      haveErrors_ = true;
+      tracer_.Error("Read Error: %s\n\n", response.ErrorMessage());
+      tracer_.Error("%s", kTraceLevelHint);
+    }
+  } catch (const Poco::Exception& e) {
+    Exception(e);
+  } catch (const std::exception& e) {
+    Exception(e);
+  }
+}
+
+void xServer::Dispatch(LSP::xReader& message) {
+  LSP::xObject root = message.Root();
+  if (IsServerRequest(root)) Transmit(AnswerServerRequest(root), false);
+}
+
+}  // namespace vexil

@@ -1,0 +1,59 @@
+// What the client answers to server requests: null for progress and registration,
+// one null setting per configuration item, and -32601 for anything it does not know.
+#include "transport/server_requests.h"
+
+
+#include "json/rapidjson.h"
+#include "vexil/protocol/message.h"
+
+namespace vexil {
+namespace {
+
+constexpr int kMethodNotFound = -32601;
+
+// Requests whose answer carries nothing: the client accepts and has nothing to add.
+bool AnsweredWithNull(const std::string& method) {
+  static const char* const methods[] = {"window/workDoneProgress/create", "client/registerCapability",
+                                        "client/unregisterCapability", "workspace/workspaceFolders"};
+  for (const char* known : methods) {
+    if (method == known) return true;
+  }
+  return false;
+}
+
+// The client has no settings of its own: null for each item asked for.
+void WriteNullSettings(LSP::xWriter& writer, const LSP::xObject& request) {
+  LSP::xObject items = request.Object("params").Object("items");
+  rapidjson::SizeType count = items.IsArray() ? items.Value().Size() : 0;
+  writer.StartArray("result");
+  for (rapidjson::SizeType i = 0; i < count; ++i) writer.RawValue("null", LSP::JsonType::Null);
+  writer.EndArray();
+}
+
+}  // namespace
+
+bool IsServerRequest(const LSP::xObject& message) {
+  return message.HasObject("id") && !message.Object("id").IsNull();
+}
+
+std::string AnswerServerRequest(const LSP::xObject& request) {
+  std::string method = request.Object("method").GetString();
+  LSP::xWriter writer;
+  writer.StartObject();
+  writer.String("jsonrpc", "2.0");
+  writer.Raw("id", request.Object("id").Value());
+  if (AnsweredWithNull(method)) {
+    writer.Null("result");
+  } else if (method == "workspace/configuration") {
+    WriteNullSettings(writer, request);
+  } else {
+    LSP::ResponseError error;
+    error.code = kMethodNotFound;
+    error.message = "Method not found";
+    writer.Object(error.Name(), error);
+  }
+  writer.EndObject();
+  return writer.GetString();
+}
+
+}  // namespace vexil

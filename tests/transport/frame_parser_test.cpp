@@ -1,0 +1,121 @@
+// The two splitters on their own: frames cut at every byte, odd headers, the kept
+// quirks (doubled first letter, length 0, byte 0xFF), and error-stream line endings.
+#include <gtest/gtest.h>
+
+#include <string>
+#include <vector>
+
+#include "transport/frame_parser.h"
+
+namespace {
+
+using Bodies = std::vector<std::string>;
+
+std::string Frame(const std::string& body) {
+  return "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
+}
+
+Bodies FeedAll(vexil::FrameParser& parser, const std::string& bytes, std::size_t chunk) {
+  Bodies bodies;
+  for (std::size_t at = 0; at < bytes.size(); at += chunk) {
+    parser.Feed(bytes.data() + at, std::min(chunk, bytes.size() - at), bodies);
+  }
+  return bodies;
+}
+
+Bodies Parse(const std::string& bytes) {
+  vexil::FrameParser parser;
+  return FeedAll(parser, bytes, bytes.size());
+}
+
+std::vector<std::string> Lines(const std::string& bytes) {
+  vexil::LineSplitter splitter;
+  std::vector<std::string> lines;
+  splitter.Feed(bytes.data(), bytes.size(), lines);
+  return lines;
+}
+
+TEST(FrameParser, FramesSplitAtEveryBytePositionComeOutWhole) {
+  const std::string stream = Frame(R"({"id":1})") + Frame(R"({"id":22,"result":"Content-Length: 3"})");
+  const Bodies expected = {R"({"id":1})", R"({"id":22,"result":"Content-Length: 3"})"};
+  for (std::size_t cut = 1; cut < stream.size(); ++cut) {
+    vexil::FrameParser parser;
+    Bodies bodies;
+    parser.Feed(stream.data(), cut, bodies);
+    parser.Feed(stream.data() + cut, stream.size() - cut, bodies);
+    EXPECT_EQ(bodies, expected) << "cut at " << cut;
+  }
+  vexil::FrameParser parser;
+  EXPECT_EQ(FeedAll(parser, stream, 1), expected);
+}
+
+TEST(FrameParser, HeadersInAnyCaseWithExtraLinesAndBanners) {
+  EXPECT_EQ(Parse("content-LENGTH: 2\r\n\r\nab"), Bodies{"ab"});
+  EXPECT_EQ(Parse("Content-Length: 5\r\nContent-Type: application/vscode-jsonrpc; charset=utf-8\r\n\r\nhello"),
+            Bodies{"hello"});
+
+  vexil::FrameParser parser;
+  Bodies bodies;
+  std::string banner = "server 1.0 ready\n";
+  parser.Feed(banner.data(), banner.size(), bodies);
+  EXPECT_TRUE(bodies.empty());
+  EXPECT_EQ(parser.TakeOutput(), banner);
+  EXPECT_EQ(parser.TakeOutput(), "");
+
+  // Stray bytes are kept until a message completes, then forgotten.
+  std::string framed = "noise " + Frame("{}");
+  parser.Feed(framed.data(), framed.size(), bodies);
+  EXPECT_EQ(bodies, Bodies{"{}"});
+  EXPECT_EQ(parser.TakeOutput(), "");
+}
+
+TEST(FrameParser, MalformedHeadersAreLeftInTheOutput) {
+  // No blank after the colon: not a header at all.
+  vexil::FrameParser noBlank;
+  Bodies bodies;
+  std::string bytes = "Content-Length:2\r\n\r\nab";
+  noBlank.Feed(bytes.data(), bytes.size(), bodies);
+  EXPECT_TRUE(bodies.empty());
+  EXPECT_EQ(noBlank.TakeOutput(), bytes);
+
+  // A doubled first letter hides the frame behind it; the next good header is found.
+  EXPECT_EQ(Parse("CContent-Length: 2\r\n\r\nab" + Frame("cd")), Bodies{"cd"});
+}
+
+TEST(FrameParser, LengthZeroSwallowsTheRestOfTheStream) {
+  EXPECT_TRUE(Parse("Content-Length: 0\r\n\r\n" + Frame("{}") + Frame("{}")).empty());
+  EXPECT_TRUE(Parse("Content-Length: \r\n\r\n" + Frame("{}")).empty());
+}
+
+TEST(FrameParser, ByteFFIsDroppedAndNotCounted) {
+  std::string body = "a\xFF" "bc";
+  // The frame says 4 but only 3 bytes count: it completes with the next byte.
+  EXPECT_EQ(Parse("Content-Length: 4\r\n\r\n" + body + "d"), Bodies{"abcd"});
+  EXPECT_TRUE(Parse("Content-Length: 4\r\n\r\n" + body).empty());
+}
+
+TEST(FrameParser, SixteenMebibyteBodyInPipeSizedChunks) {
+  std::string body(16u << 20, 'x');
+  body.front() = '{';
+  body.back() = '}';
+  vexil::FrameParser parser;
+  Bodies bodies = FeedAll(parser, Frame(body) + Frame("{}"), 65536);
+  ASSERT_EQ(bodies.size(), 2u);
+  EXPECT_TRUE(bodies[0] == body);
+  EXPECT_EQ(bodies[1], "{}");
+}
+
+TEST(LineSplitter, CarriageReturnLineFeedAndBoth) {
+  EXPECT_EQ(Lines("w\r\nx\ny\rz\n"), (std::vector<std::string>{"w", "x", "y", "z"}));
+  EXPECT_EQ(Lines("\n\r\n"), (std::vector<std::string>{"", ""}));
+  EXPECT_EQ(Lines("a\xFF" "b\nunfinished"), std::vector<std::string>{"ab"});
+
+  // A CR LF pair split across two reads is still one line end.
+  vexil::LineSplitter splitter;
+  std::vector<std::string> lines;
+  splitter.Feed("one\r", 4, lines);
+  splitter.Feed("\ntwo\n", 5, lines);
+  EXPECT_EQ(lines, (std::vector<std::string>{"one", "two"}));
+}
+
+}  // namespace

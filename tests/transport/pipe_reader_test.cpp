@@ -1,0 +1,132 @@
+// The readers over real pipes: queueing, end of file, stopping while the writer stays
+// silent, the dispatch hook, the error reader's lines, and one big body.
+#include <gtest/gtest.h>
+
+#include <atomic>
+#include <chrono>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include <Poco/Exception.h>
+
+#include "transport/pipe_io.h"
+#include "transport/pipe_reader.h"
+#include "transport/reader_thread.h"
+#include "transport_test_support.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+using vexil::MessageQueue;
+
+std::string Frame(const std::string& body) {
+  return "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
+}
+
+void Send(const Poco::Pipe& pipe, const std::string& bytes) { vexil::WriteAll(pipe, bytes.data(), bytes.size()); }
+
+// A reader over a fresh pipe, running on its own thread; stopped and joined at the end.
+template <typename Reader>
+struct RunningReader {
+  template <typename... Name>
+  explicit RunningReader(Name... name) : reader(name..., pipe) {
+    thread.Start(reader);
+  }
+  ~RunningReader() { reader.Stop(); }
+
+  Poco::Pipe pipe;
+  Reader reader;
+  vexil::ReaderThread thread;
+};
+
+std::string Pop(vexil::xPipeReader& reader) {
+  std::string item;
+  EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Taken);
+  return item;
+}
+
+TEST(PipeReader, QueuesBodiesInOrderAndFinishesAtEndOfFile) {
+  RunningReader<vexil::xPipeReader> running("stdout");
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeReader& reader = running.reader;
+  Send(pipe, "banner\n" + Frame(R"({"id":1})") + Frame(R"({"id":2})"));
+  EXPECT_EQ(Pop(reader), R"({"id":1})");
+  EXPECT_EQ(Pop(reader), R"({"id":2})");
+
+  Send(pipe, "stray " + std::string("Content-Length: 10\r\n\r\n{\"id\""));
+  pipe.close(Poco::Pipe::CLOSE_WRITE);
+  std::string item;
+  EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);  // half a body is dropped
+  running.thread.Join();
+  EXPECT_EQ(reader.TakeOutput(), "stray Content-Length: ");
+  EXPECT_EQ(reader.Errors(), "");
+}
+
+TEST(PipeReader, StopEndsAReaderWhoseWriterStaysOpenAndSilent) {
+  RunningReader<vexil::xPipeReader> running("stdout");
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeReader& reader = running.reader;
+  Send(pipe, "ready");  // once it is taken, the reader is in its loop
+  ASSERT_TRUE(transport_test::WaitFor([&] { return reader.TakeOutput() == "ready"; }));
+  auto stopped = std::chrono::steady_clock::now();
+  reader.Stop();
+  running.thread.Join();  // a blocking read would hang here for good
+  EXPECT_LT(std::chrono::steady_clock::now() - stopped, 2s);
+  std::string item;
+  EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);
+}
+
+TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
+  Poco::Pipe pipe;
+  vexil::xPipeReader reader("stdout", pipe);
+  std::vector<std::string> seen;  // written on the reader's thread, read after the join
+  reader.SetDispatch([&](LSP::xReader& message) { seen.push_back(message.Root().String("method")); });
+  vexil::ReaderThread thread;  // the hook must be set before the thread starts
+  thread.Start(reader);
+  const std::vector<std::string> bodies = {
+      R"({"jsonrpc":"2.0","method":"window/logMessage","params":{}})",
+      R"({"jsonrpc":"2.0","id":0,"method":"workspace/configuration","params":{}})",
+      R"({"jsonrpc":"2.0","id":3,"result":{"text":"\"method\""}})",
+      R"(not json "method")",
+  };
+  for (const std::string& body : bodies) Send(pipe, Frame(body));
+  for (const std::string& body : bodies) EXPECT_EQ(Pop(reader), body);
+  pipe.close(Poco::Pipe::CLOSE_WRITE);
+  thread.Join();
+  EXPECT_EQ(seen, (std::vector<std::string>{"window/logMessage", "workspace/configuration"}));
+}
+
+TEST(PipeReader, ErrorReaderQueuesLinesAndKeepsNoOutput) {
+  RunningReader<vexil::xPipeErrReader> running;
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeErrReader& reader = running.reader;
+  EXPECT_EQ(reader.Name(), "strderr");
+  Send(pipe, "w\r\nx\ny\rz\nlast");
+  pipe.close(Poco::Pipe::CLOSE_WRITE);
+  running.thread.Join();
+  for (const char* line : {"w", "x", "y", "z"}) EXPECT_EQ(Pop(reader), line);
+  EXPECT_EQ(reader.Messages().Size(), 0u);  // the unfinished line is dropped
+  EXPECT_EQ(reader.TakeOutput(), "");
+}
+
+TEST(PipeReader, SixteenMebibyteBodyThroughAPipe) {
+  RunningReader<vexil::xPipeReader> running("stdout");
+  Poco::Pipe& pipe = running.pipe;
+  vexil::xPipeReader& reader = running.reader;
+  std::string body = "\"" + std::string(16u << 20, 'y') + "\"";
+  std::thread writer([&] { Send(pipe, Frame(body) + Frame("{}")); });
+  std::string first = Pop(reader);
+  EXPECT_TRUE(first == body) << "got " << first.size() << " bytes";
+  EXPECT_EQ(Pop(reader), "{}");
+  writer.join();
+}
+
+TEST(PipeIo, WritingToAPipeNobodyReadsFailsWithoutSignallingTheProcess) {
+  Poco::Pipe pipe;
+  pipe.close(Poco::Pipe::CLOSE_READ);
+  EXPECT_THROW(Send(pipe, "Content-Length: 2\r\n\r\n{}"), Poco::WriteFileException);
+  EXPECT_THROW(Send(pipe, "again"), Poco::WriteFileException);  // still alive to try twice
+}
+
+}  // namespace

@@ -1,0 +1,161 @@
+// Launching and closing the server against the fake: the launch details, every launch
+// failure with its trace order, early exits, working directory, and prompt destruction.
+#include <gtest/gtest.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <memory>
+#include <string>
+
+#include "transport_test_support.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+using namespace transport_test;
+using Texts = std::vector<std::string>;
+
+class ServerStart : public ::testing::Test {
+ protected:
+  void SetUp() override { TraceLog::Clear(); }
+};
+
+std::string CurrentDirectory() {
+  char buffer[4096];
+  return getcwd(buffer, sizeof buffer) ? buffer : "";
+}
+
+TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheTimeout) {
+  xServerStart start = FakeStart({"", "ignored-by-sh"}, 0);
+  start.useCommand = true;
+  start.executable = std::string("'") + VEXIL_FAKE_SERVER + "' 'stderr=hello world\\n'";
+  vexil::xServer server(start);
+  EXPECT_EQ(server.Id(), -1);
+  ASSERT_TRUE(server.Start());
+  EXPECT_EQ(TraceLog::Texts("Verbose"),
+            (Texts{" Executable: /bin/sh\n", "  Directory: \n", "  Arguments: -c " + start.executable + " ignored-by-sh \n",
+                   "Use Command: Yes\n", "     Timout: 200 (milliseconds)\n\n"}));
+  EXPECT_GT(server.Id(), 0);
+
+  TraceLog::Clear();
+  EXPECT_TRUE(server.Start());  // already running: nothing happens
+  EXPECT_TRUE(TraceLog::Lines().empty());
+
+  TextResult result;
+  Ask(server, "fake/echo", "", result);
+  EXPECT_EQ(TraceLog::Count("Reply: hello world\n"), 1);  // standard error, at verbose level
+
+  xServerStart quiet = FakeStart();
+  quiet.timeout = -5;
+  quiet.argument1 = "";
+  vexil::xServer defaults(quiet);
+  TraceLog::Clear();
+  ASSERT_TRUE(defaults.Start());
+  EXPECT_EQ(TraceLog::Texts("Verbose")[2], "  Arguments: \n");
+  EXPECT_EQ(TraceLog::Texts("Verbose")[4], "     Timout: 200 (milliseconds)\n\n");
+}
+
+TEST_F(ServerStart, MissingExecutableOrDirectoryReportsInOrderWithTheHintOnce) {
+  struct Case {
+    std::string executable, directory, error;
+  } cases[] = {
+      {"/nonexistent/server", "", "Error: Cannot find executable: /nonexistent/server\n\n"},
+      {"no-such-language-server-here", "", "Error: Cannot find executable: no-such-language-server-here\n\n"},
+      {VEXIL_FAKE_SERVER, "/nonexistent/dir", "Error: Cannot change to directory: /nonexistent/dir\n\n"},
+  };
+  for (const Case& c : cases) {
+    TraceLog::Clear();
+    xServerStart start = FakeStart({}, 200, LSP::TraceLevel::Messages);
+    start.executable = c.executable;
+    start.directory = c.directory;
+    vexil::xServer server(start);
+    EXPECT_FALSE(server.Start());
+    EXPECT_EQ(TraceLog::Texts(), (Texts{c.error, kHint, "\nError Reason: No such file or directory\n", kFailedStart,
+                                        kCheckDetails}));
+    EXPECT_TRUE(server.HaveErrors());
+    EXPECT_EQ(server.ErrorMessage(), c.error.substr(7, c.error.size() - 9));
+  }
+}
+
+TEST_F(ServerStart, ProcessThatExitsAtOnceIsAFailedStartWithItsOutput) {
+  xServerStart start = FakeStart({"stdout=banner\\n;exit=0"}, 200, LSP::TraceLevel::Messages);
+  vexil::xServer server(start);
+  EXPECT_FALSE(server.Start());
+  EXPECT_EQ(TraceLog::Texts(), (Texts{"banner\n", kFailedStart, kCheckDetails, kHint}));
+  EXPECT_FALSE(server.HaveErrors());
+
+  TraceLog::Clear();
+  xServerStart truth = FakeStart({}, 200, LSP::TraceLevel::Off);
+  truth.executable = "true";
+  vexil::xServer exitsAtOnce(truth);
+  EXPECT_FALSE(exitsAtOnce.Start());
+  EXPECT_EQ(TraceLog::Texts(), (Texts{kFailedStart, kCheckDetails, kHint}));
+
+  // Through the interpreter a missing program is the interpreter's to report.
+  TraceLog::Clear();
+  xServerStart command = FakeStart({}, 200, LSP::TraceLevel::Messages);
+  command.useCommand = true;
+  command.executable = "no-such-language-server-here --stdio";
+  vexil::xServer missing(command);
+  EXPECT_FALSE(missing.Start());
+  Texts texts = TraceLog::Texts();
+  ASSERT_EQ(texts.size(), 4u);
+  EXPECT_NE(texts[0].find("not found"), std::string::npos) << texts[0];
+  EXPECT_EQ(Texts(texts.begin() + 1, texts.end()), (Texts{kFailedStart, kCheckDetails, kHint}));
+}
+
+TEST_F(ServerStart, WorkingDirectoryIsTheServersAndNotTheHosts) {
+  std::string before = CurrentDirectory();
+  xServerStart start = FakeStart();
+  start.directory = "/tmp";
+  {
+    vexil::xServer server(start);
+    ASSERT_TRUE(server.Start());
+    EXPECT_EQ(CurrentDirectory(), before);
+    TextResult result;
+    Ask(server, "fake/cwd", "", result);
+    EXPECT_EQ(result.cwd, "/tmp");
+  }
+  EXPECT_EQ(CurrentDirectory(), before);
+}
+
+TEST_F(ServerStart, CloseSequenceIsTracedAndLeavesAWellBehavedServerToEnd) {
+  int id;
+  {
+    vexil::xServer server(FakeStart());
+    ASSERT_TRUE(server.Start());
+    id = server.Id();
+    TraceLog::Clear();
+  }
+  EXPECT_EQ(TraceLog::Texts(), (Texts{"Closing language server.....\n", "Closing pipes.....\n",
+                                      "Waiting for threads to end....\n", "Language server close complete.\n\n"}));
+  // Its input closed, the fake ends by itself: nobody killed it. If it ended before the
+  // destructor's last look, the destructor has reaped it already.
+  int status = 0;
+  pid_t ended = 0;
+  EXPECT_TRUE(WaitFor([&] { return (ended = waitpid(id, &status, WNOHANG)) != 0; }));
+  EXPECT_TRUE(ended == -1 || (WIFEXITED(status) && WEXITSTATUS(status) == 0));
+}
+
+TEST_F(ServerStart, DestructorReturnsPromptlyWhileServerAndGrandchildHoldThePipes) {
+  auto server = std::make_unique<vexil::xServer>(FakeStart({"grandchild=0;hang"}));
+  ASSERT_TRUE(server->Start());
+  int id = server->Id();
+  auto closing = std::chrono::steady_clock::now();
+  server.reset();
+  EXPECT_LT(std::chrono::steady_clock::now() - closing, 2s);
+  EXPECT_EQ(kill(id, 0), 0);  // the destructor never kills
+  kill(id, SIGKILL);
+  waitpid(id, nullptr, 0);
+
+  // The server is gone but what it left behind keeps the pipes: the failed start and
+  // the destructor must not wait for it.
+  auto orphaned = std::make_unique<vexil::xServer>(FakeStart({"grandchild=5000;exit=0"}));
+  closing = std::chrono::steady_clock::now();
+  EXPECT_FALSE(orphaned->Start());
+  orphaned.reset();
+  EXPECT_LT(std::chrono::steady_clock::now() - closing, 2s);
+}
+
+}  // namespace

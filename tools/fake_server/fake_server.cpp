@@ -1,0 +1,211 @@
+// A scripted language server for the transport tests. Start-up directives come as
+// arguments; what it does for each request is chosen by the request's method and params.
+//
+// Arguments (each may hold several, separated by ';'):
+//   stdout=TEXT, stderr=TEXT  write TEXT (with \r \n \t \\ \xHH escapes) at start-up
+//   exit=N                    exit with code N right after start-up
+//   hang                      never read; keep every pipe open until killed
+//   ignore-exit               stay alive after "exit" and after stdin closes
+//   grandchild=MS             fork a child that holds the pipes while we live, then MS longer
+// Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/crash" (half a
+// frame, then killed), "fake/cwd", "fake/received" (the notifications seen so far),
+// "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
+// params: delay (ms), stderr, garbage (raw stdout text), notifications (count), stale
+// (ids answered first), ask (methods sent to the client, each answer awaited),
+// askSameId, error {code, message, id: "same"|"null"|"none"|number}, unparsable,
+// size (bytes of "data" in the result), split (write the answer in pieces of this size).
+#include <signal.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <sstream>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include <rapidjson/document.h>
+#include <rapidjson/stringbuffer.h>
+#include <rapidjson/writer.h>
+
+#include "fake_wire.h"
+
+namespace {
+
+using Json = rapidjson::Document;
+
+constexpr unsigned kSafetyLifetimeSeconds = 120;  // never outlive a forgotten test by long
+
+struct Options {
+  bool ignoreExit = false;
+};
+
+std::vector<std::string> received;  // notifications from the client, as sent
+
+void Pause(int milliseconds) { std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds)); }
+
+[[noreturn]] void SleepUntilKilled() {
+  for (;;) pause();
+}
+
+std::string Text(const rapidjson::Value& value) {
+  rapidjson::StringBuffer buffer;
+  rapidjson::Writer<rapidjson::StringBuffer> writer(buffer);
+  value.Accept(writer);
+  return buffer.GetString();
+}
+
+std::string Quote(const std::string& text) { return Text(rapidjson::Value(text.c_str(), static_cast<rapidjson::SizeType>(text.size()))); }
+
+int IntParam(const rapidjson::Value& params, const char* name) {
+  return params.HasMember(name) && params[name].IsInt() ? params[name].GetInt() : 0;
+}
+
+std::string StringParam(const rapidjson::Value& params, const char* name) {
+  return params.HasMember(name) && params[name].IsString() ? params[name].GetString() : "";
+}
+
+void Send(const std::string& body) { fake::WriteRaw(STDOUT_FILENO, fake::Frame(body)); }
+
+// Holds the inherited pipes while the server lives, and `linger` ms after it is gone.
+void ForkGrandchild(int linger) {
+  pid_t parent = getpid();
+  if (fork() != 0) return;
+  while (getppid() == parent) Pause(20);
+  Pause(linger);
+  std::_Exit(0);
+}
+
+void StartUp(const std::string& directive, Options& options) {
+  std::string key = directive.substr(0, directive.find('='));
+  std::string value = directive.find('=') == std::string::npos ? "" : directive.substr(directive.find('=') + 1);
+  if (key == "stdout") fake::WriteRaw(STDOUT_FILENO, fake::Unescape(value));
+  else if (key == "stderr") fake::WriteRaw(STDERR_FILENO, fake::Unescape(value));
+  else if (key == "exit") std::_Exit(std::atoi(value.c_str()));
+  else if (key == "hang") SleepUntilKilled();
+  else if (key == "ignore-exit") options.ignoreExit = true;
+  else if (key == "grandchild") ForkGrandchild(std::atoi(value.c_str()));
+}
+
+// Sends each method of params.ask as a request to the client and waits for its answer.
+std::vector<std::string> AskClient(const rapidjson::Value& params, const std::string& requestId) {
+  std::vector<std::string> answers;
+  if (!params.HasMember("ask") || !params["ask"].IsArray()) return answers;
+  bool sameId = params.HasMember("askSameId") && params["askSameId"].IsTrue();
+  int next = 0;
+  for (const rapidjson::Value& method : params["ask"].GetArray()) {
+    std::string id = sameId ? requestId : std::to_string(next++);
+    Send("{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"method\":" + Text(method) +
+         ",\"params\":{\"items\":[{\"section\":\"a\"},{\"section\":\"b\"}]}}");
+    std::string answer;
+    if (!fake::ReadMessage(answer)) std::_Exit(0);
+    answers.push_back(answer);
+  }
+  return answers;
+}
+
+std::string ErrorId(const rapidjson::Value& error, const std::string& requestId) {
+  if (!error.HasMember("id") || (error["id"].IsString() && std::string(error["id"].GetString()) == "same")) {
+    return "\"id\":" + requestId + ",";
+  }
+  if (error["id"].IsString() && std::string(error["id"].GetString()) == "none") return "";
+  if (error["id"].IsString() && std::string(error["id"].GetString()) == "null") return "\"id\":null,";
+  return "\"id\":" + Text(error["id"]) + ",";
+}
+
+std::string Result(const std::string& method, const rapidjson::Value& params, const std::vector<std::string>& answers) {
+  if (method == "shutdown") return "null";
+  std::ostringstream result;
+  result << "{\"method\":" << Quote(method);
+  if (method == "fake/cwd") {
+    char directory[4096];
+    result << ",\"cwd\":" << Quote(getcwd(directory, sizeof directory) ? directory : "");
+  }
+  result << ",\"answers\":[";
+  for (std::size_t i = 0; i < answers.size(); ++i) result << (i ? "," : "") << answers[i];
+  result << "],\"received\":[";
+  for (std::size_t i = 0; i < received.size(); ++i) result << (i ? "," : "") << Quote(received[i]);
+  result << "]";
+  if (int size = IntParam(params, "size")) result << ",\"data\":\"" << std::string(static_cast<std::size_t>(size), 'x') << "\"";
+  result << "}";
+  return result.str();
+}
+
+std::string Answer(const std::string& method, const rapidjson::Value& params, const std::string& id,
+                   const std::vector<std::string>& answers) {
+  if (params.HasMember("unparsable")) return "this is not json";
+  if (params.HasMember("error") && params["error"].IsObject()) {
+    const rapidjson::Value& error = params["error"];
+    return "{\"jsonrpc\":\"2.0\"," + ErrorId(error, id) + "\"error\":{\"code\":" + std::to_string(IntParam(error, "code")) +
+           ",\"message\":" + Quote(StringParam(error, "message")) + "}}";
+  }
+  return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"result\":" + Result(method, params, answers) + "}";
+}
+
+void WriteAnswer(const std::string& body, int split) {
+  std::string framed = fake::Frame(body);
+  if (split <= 0) return fake::WriteRaw(STDOUT_FILENO, framed);
+  for (std::size_t at = 0; at < framed.size(); at += static_cast<std::size_t>(split)) {
+    fake::WriteRaw(STDOUT_FILENO, framed.substr(at, static_cast<std::size_t>(split)));
+    Pause(1);
+  }
+}
+
+void Prelude(const rapidjson::Value& params) {
+  Pause(IntParam(params, "delay"));
+  if (params.HasMember("stderr")) fake::WriteRaw(STDERR_FILENO, fake::Unescape(StringParam(params, "stderr")));
+  if (params.HasMember("garbage")) fake::WriteRaw(STDOUT_FILENO, fake::Unescape(StringParam(params, "garbage")));
+  for (int i = IntParam(params, "notifications"); i > 0; --i) {
+    Send("{\"jsonrpc\":\"2.0\",\"method\":\"fake/progress\",\"params\":{\"left\":" + std::to_string(i) + "}}");
+  }
+  if (params.HasMember("stale") && params["stale"].IsArray()) {
+    for (const rapidjson::Value& stale : params["stale"].GetArray()) {
+      Send("{\"jsonrpc\":\"2.0\",\"id\":" + Text(stale) + ",\"result\":null}");
+    }
+  }
+}
+
+void HandleRequest(const std::string& method, const rapidjson::Value& params, const std::string& id) {
+  if (method == "fake/exit") std::_Exit(IntParam(params, "code"));
+  if (method == "fake/crash") {
+    fake::WriteRaw(STDOUT_FILENO, "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
+    kill(getpid(), SIGKILL);
+  }
+  Prelude(params);
+  if (method == "fake/silent") return;
+  std::vector<std::string> answers = AskClient(params, id);
+  WriteAnswer(Answer(method, params, id, answers), IntParam(params, "split"));
+}
+
+void Serve(const Options& options) {
+  static const rapidjson::Value noParams(rapidjson::kObjectType);
+  std::string body;
+  while (fake::ReadMessage(body)) {
+    Json message;
+    if (message.Parse(body.c_str()).HasParseError() || !message.IsObject()) continue;
+    std::string method = message.HasMember("method") && message["method"].IsString() ? message["method"].GetString() : "";
+    const rapidjson::Value& params = message.HasMember("params") && message["params"].IsObject() ? message["params"] : noParams;
+    if (message.HasMember("id")) {
+      HandleRequest(method, params, Text(message["id"]));
+    } else if (method == "exit" && !options.ignoreExit) {
+      std::_Exit(0);
+    } else {
+      received.push_back(body);
+    }
+  }
+  if (options.ignoreExit) SleepUntilKilled();
+}
+
+}  // namespace
+
+int main(int argc, char** argv) {
+  signal(SIGPIPE, SIG_IGN);
+  alarm(kSafetyLifetimeSeconds);
+  Options options;
+  for (int i = 1; i < argc; ++i) {
+    std::istringstream directives(argv[i]);
+    std::string directive;
+    while (std::getline(directives, directive, ';')) StartUp(directive, options);
+  }
+  Serve(options);
+  return 0;
+}
