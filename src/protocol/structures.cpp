@@ -9,8 +9,8 @@ namespace {
 
 // Writes a range's "start" and "end" straight into the enclosing object.
 void WriteRangeMembers(xWriter& writer, Range& range) {
-  writer.Object(range.start, true);
-  writer.Object(range.end, true);
+  writer.Object("start", range.start);
+  writer.Object("end", range.end);
 }
 
 }  // namespace
