@@ -1,5 +1,5 @@
 // The client capability tree: the openings servers see first, the nodes that must stay
-// unwritten, and the keys of the nodes that only refuse dynamic registration.
+// unwritten, and value lists that are left out only when emptied.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
@@ -32,20 +32,6 @@ TEST(ClientCapabilities, WorkspaceAndTextDocumentOpenAsServersExpect) {
     EXPECT_THAT(json, testing::Not(HasSubstr(unwritten)));
 }
 
-TEST(ClientCapabilities, HeldNodesWriteTheirOwnMembersWhenAskedDirectly) {
-  LSP::FileOperations operations;
-  EXPECT_EQ(Written(operations), R"("fileOperations":{"dynamicRegistration":false,"didCreate":false,"willCreate":false,)"
-                                 R"("didRename":false,"willRename":false,"didDelete":false,"willDelete":false})");
-  LSP::DiagnosticWorkspaceClientCapabilities diagnostics;
-  EXPECT_EQ(Written(diagnostics), R"("diagnostics":{"refreshSupport":false})");
-  LSP::SemanticTokensWorkspaceClientCapabilities tokens;
-  EXPECT_EQ(Written(tokens), R"("semanticTokens":{"refreshSupport":false})");
-  LSP::SignatureHelpClientCapabilities signatureHelp;
-  EXPECT_EQ(Written(signatureHelp), R"("signatureHelp":{"dynamicRegistration":false})");
-  EXPECT_EQ(Written(signatureHelp.signatureInformation),
-            R"("signatureInformation":{"documentationFormat":["plaintext"]})");
-}
-
 TEST(ClientCapabilities, ValueListsAreLeftOutOnlyWhenEmptied) {
   LSP::CompletionItemKindCapabilities kinds;
   EXPECT_EQ(kinds.valueSet.size(), 25u);
@@ -58,23 +44,6 @@ TEST(ClientCapabilities, ValueListsAreLeftOutOnlyWhenEmptied) {
   LSP::HoverClientCapabilities hover;
   hover.contentFormat.clear();
   EXPECT_EQ(Written(hover), R"("hover":{"dynamicRegistration":false,"contentFormat":[]})");
-}
-
-TEST(ClientCapabilities, EachRegistrationOnlyNodeCarriesItsOwnKey) {
-  LSP::DefinitionClientCapabilities definition;
-  LSP::DocumentFormattingClientCapabilities formatting;
-  LSP::DocumentLinkCapabilities documentLink;
-  LSP::ColorProviderCapabilities colorProvider;
-  LSP::DiagnosticClientCapabilities diagnostic;
-  LSP::CodeLensWorkspaceClientCapabilities codeLensRefresh;
-  EXPECT_EQ(Written(definition), R"("definition":{"dynamicRegistration":false})");
-  EXPECT_STREQ(formatting.Name(), "formatting");
-  EXPECT_STREQ(documentLink.Name(), "documentLink");
-  EXPECT_STREQ(colorProvider.Name(), "colorProvider");
-  EXPECT_STREQ(diagnostic.Name(), "diagnostic");
-  EXPECT_EQ(Written(codeLensRefresh), R"("codeLens":{"refreshSupport":false})");
-  LSP::DynamicRegistrationCapabilities dynamic(true);
-  EXPECT_EQ(LSP::ToJsonText(dynamic), R"({"dynamicRegistration":true})");
 }
 
 }  // namespace

@@ -1,5 +1,4 @@
-// The params of every feature request and notification, as the exact texts servers parse,
-// and the requests that read them back.
+// The params of every feature request and notification, as the exact texts servers parse.
 #include <gtest/gtest.h>
 
 #include "reply_helpers.h"
@@ -92,33 +91,6 @@ TEST(FeatureParams, WorkspaceSymbolQueryIsWrittenEvenWhenEmpty) {
   LSP::RequestMessage request("workspace/symbol", &params);
   request.id = 5;
   EXPECT_EQ(request.ToJSON(), R"({"jsonrpc":"2.0","id":5,"method":"workspace/symbol","params":{"query":"Rect"}})");
-}
-
-TEST(FeatureParams, RequestsReadBackWhatTheyWriteNotificationsReadNothing) {
-  LSP::xReader reader;
-  ASSERT_TRUE(reader.Parse(R"({"params":{"textDocument":{"uri":"file:///b.c"},"position":{"line":8,"character":9},)"
-                           R"("context":{"triggerKind":3,"triggerCharacter":">"},"newName":"n",)"
-                           R"("options":{"tabSize":8,"insertSpaces":false},"query":"q"}})"));
-  LSP::CompletionParams completion;
-  completion.Read(reader);
-  EXPECT_EQ(completion.textDocument.uri, "file:///b.c");
-  EXPECT_EQ(completion.position.character, 9);
-  EXPECT_EQ(completion.context.triggerKind, 3);
-  EXPECT_EQ(completion.context.triggerCharacter, ">");
-  LSP::RenameParams rename;
-  rename.Read(reader);
-  EXPECT_EQ(rename.newName, "n");
-  EXPECT_EQ(rename.position.line, 8);
-  LSP::DocumentFormattingParams formatting;
-  formatting.Read(reader);
-  EXPECT_EQ(formatting.options.tabSize, 8);
-  EXPECT_FALSE(formatting.options.insertSpaces);
-  LSP::WorkspaceSymbolParams symbols;
-  symbols.Read(reader);
-  EXPECT_EQ(symbols.query, "q");
-  LSP::DidSaveTextDocumentParams save;
-  save.Read(reader);
-  EXPECT_EQ(save.textDocument.uri, "");
 }
 
 }  // namespace
