@@ -25,15 +25,19 @@ void ReadArrayElements(const JsonValue& array, std::vector<T>& items) {
   }
 }
 
+// Reads `value` as an array of T; a value of another type throws.
+template <typename T>
+void ReadArrayValue(const JsonValue& value, std::vector<T>& items) {
+  if (!value.IsArray())
+    ThrowFormatted("Expecting a %s JSON object but found %d JSON object .", "array", static_cast<int>(value.GetType()));
+  ReadArrayElements(value, items);
+}
+
 // Reads the array member `name`: a missing member leaves `items` as it is, a member of
 // another type throws.
 template <typename T>
 void ReadArray(const xObject& value, const char* name, std::vector<T>& items) {
-  if (!value.HasObject(name)) return;
-  const JsonValue& member = value.Value()[name];
-  if (!member.IsArray())
-    ThrowFormatted("Expecting a %s JSON object but found %d JSON object .", "array", static_cast<int>(member.GetType()));
-  ReadArrayElements(member, items);
+  if (value.HasObject(name)) ReadArrayValue(value.Value()[name], items);
 }
 
 // Writes `items` as the array member `name`, each element as a bare object.

@@ -82,7 +82,26 @@ void TextDocumentEdit::Write(xWriter& writer) {
   WriteArray(writer, "edits", edits);
 }
 
-void WorkspaceEdit::Read(const xObject& value) { ReadArray(value, "documentChanges", documentChanges); }
+// Most servers answer a rename with the "changes" map, since the client announces no
+// support for "documentChanges": each entry becomes one edit of an unversioned document.
+void WorkspaceEdit::Read(const xObject& value) {
+  if (value.HasObject("documentChanges")) {
+    ReadArray(value, "documentChanges", documentChanges);
+    return;
+  }
+  xObject changes = value.Object("changes");
+  if (changes.IsNull()) return;
+  if (!changes.IsObject())
+    ThrowFormatted("Expecting a %s JSON object but found %d JSON object .", "object",
+                   static_cast<int>(changes.Value().GetType()));
+  for (const auto& entry : changes.Value().GetObject()) {
+    TextDocumentEdit edit;
+    edit.textDocument.uri.assign(entry.name.GetString(), entry.name.GetStringLength());
+    ReadArrayValue(entry.value, edit.edits);
+    documentChanges.push_back(std::move(edit));
+  }
+}
+
 void WorkspaceEdit::Write(xWriter& writer) { WriteArray(writer, "documentChanges", documentChanges); }
 
 TextDocumentContentChangeEvent::TextDocumentContentChangeEvent(const TextDocumentContentChangeEvent& other)
@@ -109,6 +128,9 @@ void SymbolInformation::Read(const xObject& value) {
   deprecated = value.Bool("deprecated");
   containerName = value.String("containerName");
   location.Read(value.Object("location"));
+  // The hierarchical document-symbol form has "range" instead of a location; its
+  // document is the requested one, which the enclosing list fills in.
+  if (!value.HasObject("location") && value.HasObject("range")) location.range.Read(value.Object("range"));
   // Children are read leniently: document-symbol trees nest to any depth, and
   // anything that is not an object is passed over.
   xObject list = value.Object("children");

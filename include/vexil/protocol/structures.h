@@ -107,6 +107,8 @@ class VEXIL_API TextDocumentEdit : public JsonObject {
   std::vector<TextEdit> edits;
 };
 
+// Read from "documentChanges", or else from the "changes" map (one edit per document,
+// version -1, in the map's order); written as "documentChanges".
 class VEXIL_API WorkspaceEdit : public Result {
  public:
   const char* Name() const override { return "workspaceEdit"; }
@@ -135,6 +137,8 @@ class VEXIL_API TextDocumentContentChangeEvent : public Params {
   std::string text;
 };
 
+// A flat symbol with its location, or a hierarchical document symbol whose "range" is
+// read into the location (its uri is left for the enclosing list to fill).
 class VEXIL_API SymbolInformation : public JsonObject {
  public:
   const char* Name() const override { return "content"; }

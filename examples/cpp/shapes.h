@@ -1,0 +1,23 @@
+// A small shape library: the demo and the recorded server replies open these files.
+#pragma once
+
+namespace shapes {
+
+// An axis-aligned rectangle.
+class Rectangle {
+ public:
+  Rectangle(int width, int height);
+
+  int Area() const;
+  int Perimeter() const;
+  void Scale(int factor);
+
+ private:
+  int width_;
+  int height_;
+};
+
+// Limits value to the range from low to high.
+int Clamp(int value, int low, int high);
+
+}  // namespace shapes

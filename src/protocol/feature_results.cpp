@@ -1,0 +1,88 @@
+// Reading of the feature results. Lists accept the shapes servers really send: a bare
+// array, a list object, a single location, null.
+#include "vexil/protocol/feature_results.h"
+
+#include "protocol/json_arrays.h"
+
+namespace LSP {
+namespace {
+
+// Hierarchical document symbols have no location of their own: they belong to the
+// requested document, and so do their children.
+void AssignDocument(std::vector<SymbolInformation>& symbols, const std::string& uri) {
+  for (SymbolInformation& symbol : symbols) {
+    if (symbol.location.uri.empty()) symbol.location.uri = uri;
+    AssignDocument(symbol.children, uri);
+  }
+}
+
+}  // namespace
+
+void Hover::Read(const xObject& value) {
+  contents.Read(value.Object("contents"));
+  range.Read(value.Object("range"));
+}
+
+void ParameterInformation::Read(const xObject& value) {
+  label = value.String("label");
+  documentation.Read(value.Object("documentation"));
+}
+
+void SignatureInformation::Read(const xObject& value) {
+  label = value.String("label");
+  documentation.Read(value.Object("documentation"));
+  ReadArray(value, "parameters", parameters);
+}
+
+void SignatureHelp::Read(const xObject& value) {
+  ReadArray(value, "signatures", signatures);
+  activeSignature = value.Int("activeSignature");
+  activeParameter = value.Int("activeParameter");
+}
+
+void CompletionItemLabelDetails::Read(const xObject& value) {
+  detail = value.String("detail");
+  description = value.String("description");
+}
+
+void CompletionItem::Read(const xObject& value) {
+  label = value.String("label");
+  labelDetails.Read(value.Object("labelDetails"));
+  kind = value.Int("kind");
+  detail = value.String("detail");
+  documentation.Read(value.Object("documentation"));
+  deprecated = value.Bool("deprecated");
+  sortText = value.String("sortText");
+  filterText = value.String("filterText");
+  insertText = value.String("insertText");
+  insertTextFormat = value.Int("insertTextFormat");
+  textEdit.Read(value.Object("textEdit"));
+}
+
+void CompletionList::Read(const xObject& value) {
+  if (value.IsObject()) {
+    isIncomplete = value.Bool("isIncomplete");
+    ReadArray(value, "items", items);
+  } else if (value.IsArray()) {
+    ReadArrayElements(value.Value(), items);
+  }
+}
+
+void LocationsList::Read(const xObject& value) {
+  if (value.IsNull()) return;
+  if (value.IsArray()) {
+    ReadArrayElements(value.Value(), items);
+    return;
+  }
+  items.emplace_back();
+  items.back().Read(value);
+}
+
+void SymbolInformationList::Read(const xObject& value) {
+  ReadArrayValue(value.Value(), items);
+  AssignDocument(items, documentUri);
+}
+
+void DocumentFormattingList::Read(const xObject& value) { ReadArrayValue(value.Value(), items); }
+
+}  // namespace LSP

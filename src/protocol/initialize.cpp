@@ -1,0 +1,40 @@
+// Writing of the initialize params, with the host's options embedded as JSON, and reading
+// of the initialize result. Member order is fixed; empty texts and lists are left out.
+#include "vexil/protocol/initialize.h"
+
+#include "json/rapidjson.h"
+#include "protocol/json_arrays.h"
+
+namespace LSP {
+
+void InitializationOptions::Write(xWriter& writer) {
+  if (text.empty()) return;
+  JsonDocument document;
+  document.Parse(text.c_str(), text.size());
+  // A host's faulty configuration must not keep the server from starting: it is dropped.
+  if (document.HasParseError() || !document.IsObject()) return;
+  auto member = document.FindMember(Name());
+  if (member != document.MemberEnd()) writer.Raw(Name(), member->value);
+}
+
+void ClientInfo::Write(xWriter& writer) {
+  writer.String("name", name);
+  writer.String("version", version);
+}
+
+InitializeParams::InitializeParams(int processId, const std::string& rootUri, TraceLevel trace,
+                                   const InitializationOptions& options)
+    : processId(processId), rootUri(rootUri), initializationOptions(options), trace(TraceToString(trace)) {}
+
+void InitializeParams::Write(xWriter& writer) {
+  writer.Int("processId", processId);
+  writer.String("rootUri", rootUri);
+  initializationOptions.Write(writer);
+  writer.Object(capabilities, true);
+  writer.String("trace", trace);
+  if (!workspaceFolders.empty()) WriteArray(writer, "workspaceFolders", workspaceFolders);
+}
+
+void InitializeResult::Read(const xObject& value) { capabilities.Read(value.Object("capabilities")); }
+
+}  // namespace LSP

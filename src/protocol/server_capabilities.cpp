@@ -1,0 +1,93 @@
+// Reading of a server's capabilities and of the option objects of its providers.
+// Boolean providers are read leniently; option providers throw on a value of the wrong type.
+#include "vexil/protocol/server_capabilities.h"
+
+#include <exception>
+
+namespace LSP {
+namespace {
+
+// The protocol allows `boolean | Options` for every boolean provider, and some servers
+// (pyright) send options objects for all of them: an object counts as provided. Anything
+// else but `true` (missing, null, false, a number, a string) counts as not provided.
+bool ReadProvider(const xObject& capabilities, const char* key) {
+  try {
+    if (capabilities.Object(key).IsObject()) return true;
+    return capabilities.Bool(key);
+  } catch (const std::exception&) {
+    return false;
+  }
+}
+
+}  // namespace
+
+void SaveOptions::Read(const xObject& value) { includeText = value.Bool("includeText"); }
+void SaveOptions::Write(xWriter& writer) { writer.Bool("includeText", includeText); }
+
+void TextDocumentSyncOptions::Read(const xObject& value) {
+  openClose = value.Bool("openClose");
+  change = value.Int("change");
+  willSave = value.Bool("willSave");
+  willSaveWaitUntil = value.Bool("willSaveWaitUntil");
+  save.Read(value.Object("save"));
+}
+
+void TextDocumentSyncOptions::Write(xWriter& writer) {
+  writer.Bool("openClose", openClose);
+  writer.Int("change", change);
+  writer.Bool("willSave", willSave);
+  writer.Bool("willSaveWaitUntil", willSaveWaitUntil);
+  writer.Object("save", save);
+}
+
+void CompletionOptions::Read(const xObject& value) {
+  resolveProvider = value.Bool("resolveProvider");
+  triggerCharacters = value.Strings("triggerCharacters");
+}
+
+void CompletionOptions::Write(xWriter& writer) {
+  writer.Bool("resolveProvider", resolveProvider);
+  if (!triggerCharacters.empty()) writer.Strings("triggerCharacter", triggerCharacters);
+}
+
+void SignatureHelpOptions::Read(const xObject& value) { triggerCharacters = value.Strings("triggerCharacters"); }
+void SignatureHelpOptions::Write(xWriter& writer) { writer.Strings("triggerCharacters", triggerCharacters); }
+
+void ResolveOptions::Read(const xObject& value) { resolveProvider = value.Bool("resolveProvider"); }
+void ResolveOptions::Write(xWriter& writer) { writer.Bool("resolveProvider", resolveProvider); }
+
+void DocumentOnTypeFormattingOptions::Read(const xObject& value) {
+  firstTriggerCharacter = value.String("firstTriggerCharacter");
+}
+
+void DocumentOnTypeFormattingOptions::Write(xWriter& writer) {
+  writer.String("firstTriggerCharacter", firstTriggerCharacter);
+  writer.Strings("moreTriggerCharacter", moreTriggerCharacter);
+}
+
+void ExecuteCommandOptions::Read(const xObject& value) { commands = value.Strings("commands"); }
+void ExecuteCommandOptions::Write(xWriter& writer) { writer.Strings("commands", commands); }
+
+void ServerCapabilities::Read(const xObject& value) {
+  completionProvider.Read(value.Object("completionProvider"));
+  signatureHelpProvider.Read(value.Object("signatureHelpProvider"));
+  codeLensProvider.Read(value.Object("codeLensProvider"));
+  hoverProvider = ReadProvider(value, "hoverProvider");
+  definitionProvider = ReadProvider(value, "definitionProvider");
+  typeDefinitionProvider = ReadProvider(value, "typeDefinitionProvider");
+  implementationProvider = ReadProvider(value, "implementationProvider");
+  referencesProvider = ReadProvider(value, "referencesProvider");
+  documentHighlightProvider = ReadProvider(value, "documentHighlightProvider");
+  documentSymbolProvider = ReadProvider(value, "documentSymbolProvider");
+  workspaceSymbolProvider = ReadProvider(value, "workspaceSymbolProvider");
+  codeActionProvider = ReadProvider(value, "codeActionProvider");
+  documentFormattingProvider = ReadProvider(value, "documentFormattingProvider");
+  documentRangeFormattingProvider = ReadProvider(value, "documentRangeFormattingProvider");
+  renameProvider = ReadProvider(value, "renameProvider");
+  documentLinkProvider.Read(value.Object("documentLinkProvider"));
+  colorProvider.Read(value.Object("colorProvider"));
+  documentOnTypeFormattingProvider.Read(value.Object("documentOnTypeFormattingProvider"));
+  executeCommandProvider.Read(value.Object("executeCommandProvider"));
+}
+
+}  // namespace LSP

@@ -1,0 +1,45 @@
+// Uses the protocol model, the language table and the URI functions through the shared
+// library alone: writing an initialize request, reading a completion reply, looking up ids.
+#include <gtest/gtest.h>
+
+#include "vexil/client/languages.h"
+#include "vexil/client/uri.h"
+#include "vexil/protocol/feature_params.h"
+#include "vexil/protocol/feature_results.h"
+#include "vexil/protocol/initialize.h"
+
+TEST(ProtocolExports, InitializeRequestIsWrittenThroughTheLibrary) {
+  LSP::InitializeParams params(9, FileToUri("/srv/project"), LSP::TraceLevel::Off,
+                               LSP::InitializationOptions(R"({"initializationOptions":{"a":1}})"));
+  params.workspaceFolders.emplace_back(params.rootUri, "project");
+  const std::string json = LSP::ToJsonText(params);
+  EXPECT_EQ(json.rfind(R"({"processId":9,"rootUri":"file:///srv/project","initializationOptions":{"a":1},)", 0), 0u);
+  EXPECT_NE(json.find(R"("workspaceFolders":[{"uri":"file:///srv/project","name":"project"}])"), std::string::npos);
+
+  LSP::WorkspaceSymbolParams symbols;
+  LSP::RequestMessage request("workspace/symbol", &symbols);
+  EXPECT_NE(request.ToJSON().find(R"("params":{"query":""})"), std::string::npos);
+}
+
+TEST(ProtocolExports, CompletionReplyIsReadThroughTheLibrary) {
+  LSP::xReader reader;
+  ASSERT_TRUE(reader.Parse(R"({"jsonrpc":"2.0","id":4,"result":{"isIncomplete":true,"items":[{"label":"size","kind":2}]}})"));
+  LSP::CompletionList list;
+  LSP::ResponseMessage response(&list);
+  response.Read(reader);
+  EXPECT_EQ(response.id, 4);
+  ASSERT_EQ(list.items.size(), 1u);
+  EXPECT_EQ(list.items[0].label, "size");
+
+  LSP::InitializeResult result;
+  ASSERT_TRUE(reader.Parse(R"({"result":{"capabilities":{"renameProvider":{}}}})"));
+  result.Read(reader);
+  EXPECT_TRUE(result.capabilities.renameProvider);
+}
+
+TEST(ProtocolExports, LanguageTableAndUrisAreReachable) {
+  const xLanguages languages;
+  const xLanguages copy(languages);
+  EXPECT_STREQ(copy.LanguageId("hpp"), "cpp");
+  EXPECT_EQ(UriToFile(FileToUri("/srv/a b.c").c_str()), "/srv/a b.c");
+}

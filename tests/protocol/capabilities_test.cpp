@@ -1,0 +1,49 @@
+// The client capability tree: the openings servers see first, the nodes that must stay
+// unwritten, and value lists that are left out only when emptied.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "vexil/protocol/capabilities.h"
+
+namespace {
+
+// The node as a keyed member, without the object that encloses it.
+std::string Written(LSP::Params& node) {
+  LSP::xWriter writer;
+  writer.StartObject();
+  writer.Object(node, true);
+  writer.EndObject();
+  const std::string json = writer.GetString();
+  return json.substr(1, json.size() - 2);
+}
+
+TEST(ClientCapabilities, WorkspaceAndTextDocumentOpenAsServersExpect) {
+  LSP::ClientCapabilities capabilities;
+  const std::string json = LSP::ToJsonText(capabilities);
+  using testing::HasSubstr;
+  EXPECT_THAT(json, testing::StartsWith(R"({"workspace":{"applyEdit":false,"workspaceEdit":{"documentChanges":false,)"
+                                        R"("resourceChanges":false},"didChangeConfiguration":{"dynamicRegistration":false},)"));
+  EXPECT_THAT(json, HasSubstr(R"(,"executeCommand":{"dynamicRegistration":false},"workspaceFolders":true,)"
+                              R"("configuration":false},"textDocument":{"publishDiagnostics":{"relatedInformation":false},)"
+                              R"("synchronization":{"dynamicRegistration":false,"willSave":false,"willSaveWaitUntil":false,)"
+                              R"("didSave":true},)"));
+  EXPECT_THAT(json, testing::EndsWith(R"("inlayHint":{"dynamicRegistration":false},"diagnostic":{"dynamicRegistration":false}}})"));
+  for (const char* unwritten : {"fileOperations", "semanticTokens", "refreshSupport", "signatureInformation", "diagnostics"})
+    EXPECT_THAT(json, testing::Not(HasSubstr(unwritten)));
+}
+
+TEST(ClientCapabilities, ValueListsAreLeftOutOnlyWhenEmptied) {
+  LSP::CompletionItemKindCapabilities kinds;
+  EXPECT_EQ(kinds.valueSet.size(), 25u);
+  kinds.valueSet.clear();
+  EXPECT_EQ(Written(kinds), R"("completionItemKind":{})");
+  LSP::SymbolKindCapabilities symbols;
+  EXPECT_EQ(symbols.valueSet.front(), 1);
+  EXPECT_EQ(symbols.valueSet.back(), 26);
+  // String lists are written even when emptied.
+  LSP::HoverClientCapabilities hover;
+  hover.contentFormat.clear();
+  EXPECT_EQ(Written(hover), R"("hover":{"dynamicRegistration":false,"contentFormat":[]})");
+}
+
+}  // namespace

@@ -1,0 +1,66 @@
+// The initialize request as servers receive it: the whole body against a text derived by
+// hand, the host's options embedded as JSON, and the member order of sparse records.
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "reply_helpers.h"
+#include "vexil/protocol/initialize.h"
+
+namespace {
+
+using vexil_test::ReadDataFile;
+
+const char kOptions[] = R"({"initializationOptions":{"fallbackFlags":["-std=c++17"],"clangdFileStatus":true}})";
+
+std::string OptionsWritten(const std::string& text) {
+  LSP::InitializeParams params(1, "", LSP::TraceLevel::Off, LSP::InitializationOptions(text));
+  std::string json = LSP::ToJsonText(params);
+  const std::string head = R"({"processId":1,)";
+  const std::string::size_type end = json.find(R"("capabilities":)");
+  return json.substr(head.size(), end - head.size());
+}
+
+TEST(InitializeParams, WholeRequestMatchesTheExpectedTextByteForByte) {
+  LSP::InitializeParams params(4242, "file:///home/dev/project", LSP::TraceLevel::Messages,
+                               LSP::InitializationOptions(kOptions));
+  params.workspaceFolders.emplace_back("file:///home/dev/project", "project");
+  LSP::RequestMessage request("initialize", &params);
+  request.id = 1;
+  EXPECT_EQ(request.ToJSON(), ReadDataFile("initialize_request.json"));
+}
+
+TEST(InitializeParams, SparseRecordWritesProcessOptionsCapabilitiesTraceInOrder) {
+  LSP::InitializeParams params(77, "", LSP::TraceLevel::Verbose, LSP::InitializationOptions(R"({"initializationOptions":7})"));
+  const std::string json = LSP::ToJsonText(params);
+  EXPECT_THAT(json, testing::StartsWith(R"({"processId":77,"initializationOptions":7,"capabilities":{"workspace":)"));
+  EXPECT_THAT(json, testing::EndsWith(R"(}}},"trace":"verbose"})"));
+  for (const char* absent : {"rootUri", R"("workspaceFolders":[)", "clientInfo", "rootPath", "locale"})
+    EXPECT_THAT(json, testing::Not(testing::HasSubstr(absent)));
+  // A level without a protocol name leaves "trace" out.
+  LSP::InitializeParams unnamed(1, "", static_cast<LSP::TraceLevel>(9), LSP::InitializationOptions(""));
+  EXPECT_THAT(LSP::ToJsonText(unnamed), testing::Not(testing::HasSubstr("trace")));
+}
+
+TEST(InitializationOptions, OnlyTheWrappedMemberOfValidJsonReachesTheServer) {
+  EXPECT_EQ(OptionsWritten(""), "");
+  EXPECT_EQ(OptionsWritten(R"({"other":1})"), "");
+  EXPECT_EQ(OptionsWritten("not json"), "");
+  EXPECT_EQ(OptionsWritten(R"({"initializationOptions":)"), "");
+  EXPECT_EQ(OptionsWritten(R"([{"initializationOptions":1}])"), "");
+  EXPECT_EQ(OptionsWritten(R"("initializationOptions")"), "");
+  EXPECT_EQ(OptionsWritten(R"({"other":1,"initializationOptions":{"a":[1,"x",null]}})"),
+            R"("initializationOptions":{"a":[1,"x",null]},)");
+  EXPECT_EQ(OptionsWritten(R"({"initializationOptions":"text"})"), R"("initializationOptions":"text",)");
+  EXPECT_EQ(OptionsWritten(R"({"initializationOptions":null})"), R"("initializationOptions":null,)");
+  EXPECT_EQ(OptionsWritten(R"( { "initializationOptions" : { "b" : true } } )"), R"("initializationOptions":{"b":true},)");
+}
+
+TEST(ClientInfo, WritesNameAndVersionUnderItsKeyLeavingOutEmptyTexts) {
+  LSP::ClientInfo info;
+  EXPECT_STREQ(info.Name(), "clientInfo");
+  EXPECT_EQ(LSP::ToJsonText(info), R"({"name":"Tavra IDE - LSP Client","version":"2.9.1"})");
+  info.name.clear();
+  EXPECT_EQ(LSP::ToJsonText(info), R"({"version":"2.9.1"})");
+}
+
+}  // namespace

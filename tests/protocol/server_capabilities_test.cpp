@@ -1,0 +1,95 @@
+// Reading a server's capabilities: lenient boolean providers (an options object counts as
+// provided), option providers that fail on a value of the wrong type, and the odd write key.
+#include <gtest/gtest.h>
+
+#include "reply_helpers.h"
+#include "vexil/protocol/initialize.h"
+
+namespace {
+
+using vexil_test::ReadResult;
+using vexil_test::ThrownText;
+
+LSP::ServerCapabilities Read(const std::string& capabilities) {
+  LSP::InitializeResult result;
+  ReadResult(R"({"capabilities":)" + capabilities + "}", result);
+  return result.capabilities;
+}
+
+TEST(ServerCapabilities, BooleanProviderIsTrueForTrueAndForAnOptionsObjectOnly) {
+  const LSP::ServerCapabilities read = Read(
+      R"({"hoverProvider":true,"definitionProvider":{},"renameProvider":{"prepareProvider":true},)"
+      R"("referencesProvider":false,"typeDefinitionProvider":null,"implementationProvider":1,)"
+      R"("documentSymbolProvider":"yes","workspaceSymbolProvider":[true]})");
+  EXPECT_TRUE(read.hoverProvider);
+  EXPECT_TRUE(read.definitionProvider);
+  EXPECT_TRUE(read.renameProvider);
+  EXPECT_FALSE(read.referencesProvider);
+  EXPECT_FALSE(read.typeDefinitionProvider);
+  EXPECT_FALSE(read.implementationProvider);
+  EXPECT_FALSE(read.documentSymbolProvider);
+  EXPECT_FALSE(read.workspaceSymbolProvider);
+  EXPECT_FALSE(read.codeActionProvider);
+  EXPECT_FALSE(read.documentFormattingProvider);
+
+  // A server that sends options objects for all of them supports them all.
+  const LSP::ServerCapabilities objects = Read(
+      R"({"hoverProvider":{},"definitionProvider":{},"typeDefinitionProvider":{},"implementationProvider":{},)"
+      R"("referencesProvider":{},"documentHighlightProvider":{},"documentSymbolProvider":{},)"
+      R"("workspaceSymbolProvider":{},"codeActionProvider":{},"documentFormattingProvider":{},)"
+      R"("documentRangeFormattingProvider":{},"renameProvider":{}})");
+  for (bool provided : {objects.hoverProvider, objects.definitionProvider, objects.typeDefinitionProvider,
+                        objects.implementationProvider, objects.referencesProvider, objects.documentHighlightProvider,
+                        objects.documentSymbolProvider, objects.workspaceSymbolProvider, objects.codeActionProvider,
+                        objects.documentFormattingProvider, objects.documentRangeFormattingProvider,
+                        objects.renameProvider})
+    EXPECT_TRUE(provided);
+}
+
+TEST(ServerCapabilities, OptionProvidersFillTheirFieldsAndIgnoreTheSyncMember) {
+  const LSP::ServerCapabilities read = Read(
+      R"({"textDocumentSync":2,"completionProvider":{"triggerCharacters":[".",">"],"resolveProvider":true},)"
+      R"("signatureHelpProvider":{"triggerCharacters":["("]},"codeLensProvider":{"resolveProvider":true},)"
+      R"("documentOnTypeFormattingProvider":{"firstTriggerCharacter":"}","moreTriggerCharacter":[";"]},)"
+      R"("documentLinkProvider":{"resolveProvider":true},"colorProvider":true,)"
+      R"("executeCommandProvider":{"commands":["a","b"]}})");
+  EXPECT_EQ(read.textDocumentSync.change, 0);
+  EXPECT_FALSE(read.textDocumentSync.openClose);
+  EXPECT_TRUE(read.completionProvider.resolveProvider);
+  EXPECT_EQ(read.completionProvider.triggerCharacters, (std::vector<std::string>{".", ">"}));
+  EXPECT_EQ(read.signatureHelpProvider.triggerCharacters, std::vector<std::string>{"("});
+  EXPECT_TRUE(read.codeLensProvider.resolveProvider);
+  EXPECT_EQ(read.documentOnTypeFormattingProvider.firstTriggerCharacter, "}");
+  EXPECT_TRUE(read.documentOnTypeFormattingProvider.moreTriggerCharacter.empty());
+  EXPECT_TRUE(read.documentLinkProvider.resolveProvider);
+  EXPECT_EQ(read.executeCommandProvider.commands, (std::vector<std::string>{"a", "b"}));
+
+  LSP::CompletionOptions options = read.completionProvider;
+  EXPECT_EQ(LSP::ToJsonText(options), R"({"resolveProvider":true,"triggerCharacter":[".",">"]})");
+  options.triggerCharacters.clear();
+  EXPECT_EQ(LSP::ToJsonText(options), R"({"resolveProvider":true})");
+}
+
+TEST(ServerCapabilities, OptionProviderOfTheWrongTypeFailsTheWholeReading) {
+  EXPECT_EQ(ThrownText([] { Read(R"({"completionProvider":true})"); }),
+            "resolveProvider\nFailed to read JSON bool: IsObject()");
+  EXPECT_EQ(ThrownText([] { Read(R"({"codeLensProvider":false})"); }),
+            "resolveProvider\nFailed to read JSON bool: IsObject()");
+  EXPECT_EQ(ThrownText([] { Read(R"({"signatureHelpProvider":true})"); }), "IsObject()");
+  EXPECT_EQ(ThrownText([] { Read(R"({"executeCommandProvider":{"commands":"run"}})"); }),
+            "Expecting a 'array' JSON object but found 'string' JSON object.");
+  // Nothing to read, so nothing to fail.
+  EXPECT_EQ(ThrownText([] { Read(R"({"colorProvider":true})"); }), "");
+}
+
+TEST(ServerCapabilities, MissingOrNullCapabilitiesLeaveEveryDefault) {
+  for (const char* reply : {R"({})", R"({"capabilities":null})", R"({"capabilities":{}})"}) {
+    LSP::InitializeResult result;
+    vexil_test::ReadResult(reply, result);
+    EXPECT_FALSE(result.capabilities.hoverProvider) << reply;
+    EXPECT_FALSE(result.capabilities.completionProvider.resolveProvider) << reply;
+    EXPECT_TRUE(result.capabilities.completionProvider.triggerCharacters.empty()) << reply;
+  }
+}
+
+}  // namespace
