@@ -24,8 +24,9 @@ test: build
 	$(CTEST) --test-dir $(BUILD)
 
 bench: build
-	cmake --build $(BUILD) --target vexil_bench
+	cmake --build $(BUILD) --target vexil_bench vexil_watch_bench
 	$(BUILD)/bench/vexil_bench
+	$(BUILD)/bench/vexil_watch_bench
 
 asan: deps
 	cmake -S . -B build-asan -G $(GENERATOR) -DCMAKE_BUILD_TYPE=Debug -DVEXIL_SANITIZE=address,undefined

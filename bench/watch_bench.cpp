@@ -1,0 +1,185 @@
+// The change monitor against a bare inotify loop (the floor) in the same run: events per
+// second for a burst of file creations, and the delay from a rename() to its callback.
+#include <benchmark/benchmark.h>
+#include <sys/inotify.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <condition_variable>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <mutex>
+#include <string>
+#include <thread>
+
+#include "watch/change_monitor.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using Clock = std::chrono::steady_clock;
+
+class TempDir {
+ public:
+  TempDir() {
+    std::string pattern = (fs::temp_directory_path() / "vexil-bench-XXXXXX").string();
+    path_ = mkdtemp(pattern.data());
+  }
+  ~TempDir() { fs::remove_all(path_); }
+  std::string operator/(const std::string& name) const { return (path_ / name).string(); }
+  std::string Path() const { return path_.string(); }
+
+ private:
+  fs::path path_;
+};
+
+// Counts what a watcher reported; the measuring thread waits for a total.
+class Arrivals {
+ public:
+  void Add(std::size_t count) {
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      total_ += count;
+    }
+    changed_.notify_all();
+  }
+  void WaitFor(std::size_t total) {
+    std::unique_lock<std::mutex> lock(mutex_);
+    changed_.wait(lock, [&] { return total_ >= total; });
+  }
+
+ private:
+  std::mutex mutex_;
+  std::condition_variable changed_;
+  std::size_t total_ = 0;
+};
+
+// The floor: one watch, a reader thread and the same hand-over to the measuring thread as
+// the monitor's callback has, but no tree, no batches and no names.
+class BareLoop {
+ public:
+  BareLoop(const std::string& directory, Arrivals& arrivals, std::uint32_t counted)
+      : fd_(inotify_init1(IN_CLOEXEC)), stopName_(".stop"), directory_(directory) {
+    inotify_add_watch(fd_, directory.c_str(), IN_CREATE | IN_MOVED_TO);
+    reader_ = std::thread([this, &arrivals, counted] { Read(arrivals, counted); });
+  }
+  ~BareLoop() {
+    std::ofstream(directory_ + "/" + stopName_).put('x');
+    reader_.join();
+    close(fd_);
+  }
+
+ private:
+  void Read(Arrivals& arrivals, std::uint32_t counted) {
+    alignas(inotify_event) char buffer[65536];
+    for (;;) {
+      const ssize_t got = read(fd_, buffer, sizeof buffer);
+      if (got <= 0) return;
+      std::size_t count = 0;
+      for (ssize_t offset = 0; offset < got;) {
+        const auto* event = reinterpret_cast<const inotify_event*>(buffer + offset);
+        if (event->len && stopName_ == event->name) return;
+        if (event->mask & counted) ++count;
+        offset += static_cast<ssize_t>(sizeof(inotify_event) + event->len);
+      }
+      arrivals.Add(count);
+    }
+  }
+
+  int fd_;
+  std::string stopName_;
+  std::string directory_;
+  std::thread reader_;
+};
+
+vexil::MonitorHandlers Counting(Arrivals& arrivals) {
+  return {[&arrivals](std::int64_t, const vexil::ChangeBatch& batch) { arrivals.Add(batch.size()); },
+          [](std::int64_t) { std::abort(); }, [](const std::string&) {}};
+}
+
+double Seconds(Clock::duration duration) { return std::chrono::duration<double>(duration).count(); }
+
+constexpr std::size_t kBurst = 2000;
+
+double TimeBurst(const TempDir& dir, Arrivals& arrivals) {
+  const auto start = Clock::now();
+  for (std::size_t i = 0; i < kBurst; ++i) std::ofstream(dir / ("f" + std::to_string(i))).put('x');
+  arrivals.WaitFor(kBurst);
+  return Seconds(Clock::now() - start);
+}
+
+void BM_CreationBurst(benchmark::State& state) {
+  double monitorSeconds = 0, floorSeconds = 0;
+  for (auto _ : state) {
+    {
+      TempDir dir;
+      Arrivals arrivals;
+      vexil::ChangeMonitor monitor(Counting(arrivals));
+      monitor.AddWatch(dir.Path(), 1);
+      const double seconds = TimeBurst(dir, arrivals);
+      monitorSeconds += seconds;
+      state.SetIterationTime(seconds);
+    }
+    TempDir dir;
+    Arrivals arrivals;
+    BareLoop floor(dir.Path(), arrivals, IN_CREATE);
+    floorSeconds += TimeBurst(dir, arrivals);
+  }
+  const double events = static_cast<double>(kBurst * state.iterations());
+  state.counters["monitor_events_per_s"] = events / monitorSeconds;
+  state.counters["floor_events_per_s"] = events / floorSeconds;
+  state.counters["throughput_ratio"] = floorSeconds / monitorSeconds;
+}
+
+constexpr int kRenames = 200;
+
+// Mean seconds from a rename() to the watcher's report of it.
+double TimeRenames(const TempDir& dir, Arrivals& arrivals) {
+  std::ofstream(dir / "a").put('x');
+  arrivals.WaitFor(1);
+  Clock::duration total{};
+  for (int i = 0; i < kRenames; ++i) {
+    const bool even = i % 2 == 0;
+    const auto start = Clock::now();
+    fs::rename(dir / (even ? "a" : "b"), dir / (even ? "b" : "a"));
+    arrivals.WaitFor(static_cast<std::size_t>(i) + 2);
+    total += Clock::now() - start;
+  }
+  return Seconds(total) / kRenames;
+}
+
+// One arrival per rename from both: the monitor's pair comes as one batch.
+vexil::MonitorHandlers CountingBatches(Arrivals& arrivals) {
+  auto handlers = Counting(arrivals);
+  handlers.event = [&arrivals](std::int64_t, const vexil::ChangeBatch&) { arrivals.Add(1); };
+  return handlers;
+}
+
+void BM_RenameLatency(benchmark::State& state) {
+  double monitorSeconds = 0, floorSeconds = 0;
+  for (auto _ : state) {
+    {
+      TempDir dir;
+      Arrivals arrivals;
+      vexil::ChangeMonitor monitor(CountingBatches(arrivals));
+      monitor.AddWatch(dir.Path(), 1);
+      const double mean = TimeRenames(dir, arrivals);
+      monitorSeconds += mean;
+      state.SetIterationTime(mean);
+    }
+    TempDir dir;
+    Arrivals arrivals;
+    BareLoop floor(dir.Path(), arrivals, IN_CREATE | IN_MOVED_TO);
+    floorSeconds += TimeRenames(dir, arrivals);
+  }
+  const double iterations = static_cast<double>(state.iterations());
+  state.counters["monitor_latency_us"] = monitorSeconds / iterations * 1e6;
+  state.counters["floor_latency_us"] = floorSeconds / iterations * 1e6;
+  state.counters["latency_ratio"] = monitorSeconds / floorSeconds;
+}
+
+BENCHMARK(BM_CreationBurst)->UseManualTime()->Iterations(10)->Unit(benchmark::kMillisecond);
+BENCHMARK(BM_RenameLatency)->UseManualTime()->Iterations(10)->Unit(benchmark::kMicrosecond);
+
+}  // namespace
