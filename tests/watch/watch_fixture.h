@@ -24,8 +24,10 @@ constexpr std::chrono::seconds kDeadline{30};
 
 class TempDir {
  public:
+  // In memory where possible: fast file creation is what exposes the monitor's races.
   TempDir() {
-    std::string pattern = (fs::temp_directory_path() / "vexil-watch-XXXXXX").string();
+    const fs::path base = fs::is_directory("/dev/shm") ? fs::path("/dev/shm") : fs::temp_directory_path();
+    std::string pattern = (base / "vexil-watch-XXXXXX").string();
     path_ = mkdtemp(pattern.data());
   }
   ~TempDir() {
