@@ -145,16 +145,4 @@ TEST_F(WatcherTreeTest, MissingCallbacksOrLowLevelsSilenceTheTree) {
   EXPECT_TRUE(Taken().empty());
 }
 
-TEST_F(WatcherTreeTest, FolderKnowsItsPathWithoutRegardToCase) {
-  LSP::WatcherFolder folder(a, RecordTrace, LSP::TraceLevel::Verbose);
-  Taken();
-  EXPECT_TRUE(folder.IsYou(Upper(a).c_str()));
-  EXPECT_FALSE(folder.IsYou(nullptr));
-  EXPECT_FALSE(folder.IsYou(b.c_str()));
-  EXPECT_EQ(folder.FindFolder(Upper(a).c_str()), &folder);
-  EXPECT_EQ(folder.FindFolder(b.c_str()), nullptr);
-  EXPECT_EQ(Taken(), (std::vector<TraceLine>{Verbose("WatcherFolder::FindFolder: " + Upper(a) + "\n"),
-                                             Verbose("WatcherFolder::FindFolder: " + b + "\n")}));
-}
-
 }  // namespace
