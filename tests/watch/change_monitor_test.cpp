@@ -264,16 +264,19 @@ TEST(ChangeMonitor, QueueOverflowSilencesTheWatchesAndSaysSo) {
   TempDir root, fence;
   Probe probe;
   Shared gate;
-  bool open = false;
+  bool held = false, open = false;
   auto handlers = probe.Handlers();
   auto record = handlers.event;
   // The first batch holds the worker while the kernel's queue fills up behind it.
   handlers.event = [&](std::int64_t id, const ChangeBatch& batch) {
+    gate.Update([&] { held = true; });
     gate.WaitUntil([&] { return open; });
     record(id, batch);
   };
   ChangeMonitor monitor(handlers);
   ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 1));
+  Touch(root / "first");
+  ASSERT_TRUE(gate.WaitUntil([&] { return held; }));
 
   for (std::size_t i = 0; i < limit + 500; ++i) Touch(root / ("f" + std::to_string(i)));
   gate.Update([&] { open = true; });
