@@ -1,0 +1,58 @@
+// Uses both watcher exports and the change record through the shared library alone.
+#include <gtest/gtest.h>
+#include <unistd.h>
+
+#include <chrono>
+#include <condition_variable>
+#include <filesystem>
+#include <fstream>
+#include <memory>
+#include <mutex>
+#include <string>
+
+#include "vexil/watch/watcher.h"
+#include "vexil/watch/watcher_ex.h"
+
+namespace {
+
+std::mutex mutex;
+std::condition_variable changed;
+std::string lastName;
+int traceLines = 0;
+
+void OnChange(xWatcherProjectEx*, xChangeEvent* event) {
+  {
+    std::lock_guard<std::mutex> lock(mutex);
+    lastName = event->name;
+  }
+  changed.notify_all();
+}
+
+void OnTrace(TraceType, const char*, const char*) {
+  std::lock_guard<std::mutex> lock(mutex);
+  ++traceLines;
+}
+
+}  // namespace
+
+TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
+  const xChangeEvent renamed("old.txt", 4);
+  EXPECT_EQ(renamed.type, 2);
+  EXPECT_EQ(xChangeEvent().action, 0xFFFFFFFFu);
+
+  std::string pattern = (std::filesystem::temp_directory_path() / "vexil-exports-XXXXXX").string();
+  const std::string root = mkdtemp(pattern.data());
+  {
+    std::unique_ptr<xWatcherWorkspaceEx> watcher(
+        xWatcher_WorkspaceEx(OnChange, OnTrace, LSP::TraceLevel::Verbose));
+    watcher->Start("project", root.c_str(), nullptr);
+    std::ofstream(root + "/created.txt").put('x');
+    std::unique_lock<std::mutex> lock(mutex);
+    EXPECT_TRUE(changed.wait_for(lock, std::chrono::seconds(30), [] { return lastName == "created.txt"; }));
+  }
+  std::unique_ptr<xWatcherWorkspace> tree(xWatcher_Workspace(OnChange, OnTrace, LSP::TraceLevel::Verbose));
+  const int before = traceLines;
+  tree->Start("project", root.c_str(), nullptr);
+  EXPECT_GT(traceLines, before);
+  std::filesystem::remove_all(root);
+}

@@ -1,0 +1,152 @@
+// The extended workspace watcher: ids, the exact trace lines at each level, how changes
+// become events (rename pairing included), and that destruction ends all callbacks.
+#include "watch/watcher_workspace_ex.h"
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <atomic>
+#include <memory>
+#include <thread>
+#include <tuple>
+
+#include "watch_callbacks.h"
+
+namespace {
+
+using namespace watchtest;
+
+class WatcherWorkspaceExTest : public ::testing::Test {
+ protected:
+  void SetUp() override { ResetRecording(); }
+
+  static std::unique_ptr<xWatcherWorkspaceEx> Make(LSP::TraceLevel level) {
+    return std::unique_ptr<xWatcherWorkspaceEx>(xWatcher_WorkspaceEx(RecordChange, RecordTrace, level));
+  }
+
+  static bool WaitForEvent(const std::string& name) {
+    return Recorded().shared.WaitUntil([&] {
+      const auto& events = Recorded().events;
+      return std::any_of(events.begin(), events.end(), [&](const Delivered& e) { return e.name == name; });
+    });
+  }
+
+  static bool WaitForTrace(const TraceLine& line) {
+    return Recorded().shared.WaitUntil([&] {
+      const auto& traces = Recorded().traces;
+      return std::find(traces.begin(), traces.end(), line) != traces.end();
+    });
+  }
+
+  static Delivered Only(const std::string& name) {
+    std::vector<Delivered> found;
+    for (const Delivered& event : Events())
+      if (event.name == name) found.push_back(event);
+    EXPECT_EQ(found.size(), 1u) << name;
+    return found.empty() ? Delivered{} : found.front();
+  }
+};
+
+TEST_F(WatcherWorkspaceExTest, NumbersStartsAndTracesFailuresExactly) {
+  TempDir first, second;
+  Touch(first / "plain.txt");
+  auto workspace = Make(LSP::TraceLevel::Verbose);
+  const std::string a = first.Path().string(), b = second.Path().string(), file = first / "plain.txt";
+
+  workspace->Start("one", a.c_str(), nullptr);
+  workspace->Start("two", file.c_str(), nullptr);
+  workspace->Start("three", b.c_str(), nullptr);
+  EXPECT_EQ(Traces(), (std::vector<TraceLine>{
+                          Verbose("WatcherWorkspace::Start - Project: one  Directory: " + a + "\n"),
+                          Verbose("Watcher started on ID: 1\n"),
+                          Verbose("WatcherWorkspace::Start - Project: two  Directory: " + file + "\n"),
+                          Error("Path provided is not a directory: " + file + "\n"),
+                          Verbose("Failed to start watcher.\n"),
+                          Verbose("WatcherWorkspace::Start - Project: three  Directory: " + b + "\n"),
+                          Verbose("Watcher started on ID: 3\n"),
+                      }));
+
+  // The failed start used up id 2: the third project's changes carry id 3.
+  Touch(second / "x");
+  ASSERT_TRUE(WaitForEvent("x"));
+  EXPECT_TRUE(WaitForTrace(Verbose("Id: 3  Project: three  Directory: x\n")));
+  EXPECT_EQ(Only("x").project, "three");
+}
+
+TEST_F(WatcherWorkspaceExTest, DeliversChangesAsEventsWithRenamesPaired) {
+  TempDir root;
+  int userData = 0;
+  auto workspace = Make(LSP::TraceLevel::Off);
+  workspace->Start("proj", root.Path().string().c_str(), &userData);
+
+  Touch(root / "a.txt");
+  ASSERT_TRUE(WaitForEvent("a.txt"));
+  const Delivered added = Only("a.txt");
+  EXPECT_EQ(added.project, "proj");
+  EXPECT_EQ(added.root, root.Path().string());
+  EXPECT_EQ(added.userData, &userData);
+  EXPECT_EQ(added.type, 0);
+  EXPECT_EQ(added.action, 1u);
+  EXPECT_EQ(added.newName, "");
+
+  fs::create_directory(root / "sub");
+  ASSERT_TRUE(WaitForEvent("sub/"));
+  EXPECT_EQ(Only("sub/").type, 0);
+
+  // The pair goes out once, with the action of whichever half sorts later.
+  fs::rename(root / "a.txt", root / "b.txt");
+  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 3; }));
+  fs::rename(root / "b.txt", root / "a.txt");
+  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 4; }));
+  fs::remove(root / "a.txt");
+  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 5; }));
+
+  const std::vector<Delivered> events = Events();
+  ASSERT_EQ(events.size(), 5u);
+  EXPECT_EQ(std::make_tuple(events[2].type, events[2].action, events[2].name, events[2].newName),
+            std::make_tuple(2, 5u, std::string("a.txt"), std::string("b.txt")));
+  EXPECT_EQ(std::make_tuple(events[3].type, events[3].action, events[3].name, events[3].newName),
+            std::make_tuple(2, 4u, std::string("b.txt"), std::string("a.txt")));
+  EXPECT_EQ(std::make_tuple(events[4].type, events[4].action, events[4].name),
+            std::make_tuple(1, 2u, std::string("a.txt")));
+  EXPECT_TRUE(Traces().empty());
+}
+
+TEST_F(WatcherWorkspaceExTest, BelowVerboseOnlyErrorLinesAreWritten) {
+  TempDir parent;
+  const std::string root = parent / "root", missing = parent / "missing";
+  fs::create_directory(root);
+  auto workspace = Make(LSP::TraceLevel::Messages);
+
+  workspace->Start("gone", missing.c_str(), nullptr);
+  workspace->Start("kept", root.c_str(), nullptr);
+  fs::remove_all(root);
+  ASSERT_TRUE(WaitForTrace(Error("Watcher: 2 no longer operating.\n")));
+  EXPECT_EQ(Traces(), (std::vector<TraceLine>{Error("Cannot create directory handle: 2\n"),
+                                              Error("Watcher: 2 no longer operating.\n")}));
+}
+
+TEST_F(WatcherWorkspaceExTest, StopKeepsWatchingAndDestructionEndsCallbacks) {
+  TempDir root;
+  auto workspace = Make(LSP::TraceLevel::Verbose);
+  workspace->Start("proj", root.Path().string().c_str(), nullptr);
+  workspace->Stop();
+  workspace->Stop("proj");
+  Touch(root / "still");
+  ASSERT_TRUE(WaitForEvent("still"));
+
+  std::atomic<bool> stop{false};
+  std::thread writer([&] {
+    for (std::size_t i = 0; !stop; ++i) Touch(root / ("f" + std::to_string(i % 100)));
+  });
+  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 20; }));
+  ASSERT_TRUE(ReturnsWithin(kDeadline, [&] { workspace.reset(); })) << "destruction hung";
+  const std::size_t events = Events().size(), traces = Traces().size();
+  for (int i = 0; i < 200; ++i) Touch(root / "after");
+  stop = true;
+  writer.join();
+  EXPECT_EQ(Events().size(), events);
+  EXPECT_EQ(Traces().size(), traces);
+}
+
+}  // namespace
