@@ -2,6 +2,11 @@
 // and traces the directories the host names; it reports no changes (the extended watcher does).
 #pragma once
 
+// On Windows, Poco's headers bring in windows.h, whose RemoveDirectory macro would rename
+// the tree's operation in some files and not in others: take it in first, then drop the macro.
+#include <Poco/Foundation.h>
+#undef RemoveDirectory
+
 #include <map>
 #include <memory>
 #include <string>

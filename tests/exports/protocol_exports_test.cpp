@@ -2,6 +2,9 @@
 // library alone: writing an initialize request, reading a completion reply, looking up ids.
 #include <gtest/gtest.h>
 
+#include <filesystem>
+#include <string>
+
 #include "vexil/client/languages.h"
 #include "vexil/client/uri.h"
 #include "vexil/protocol/feature_params.h"
@@ -41,5 +44,7 @@ TEST(ProtocolExports, LanguageTableAndUrisAreReachable) {
   const xLanguages languages;
   const xLanguages copy(languages);
   EXPECT_STREQ(copy.LanguageId("hpp"), "cpp");
-  EXPECT_EQ(UriToFile(FileToUri("/srv/a b.c").c_str()), "/srv/a b.c");
+  const std::string path = (std::filesystem::temp_directory_path() / "a b.c").string();
+  EXPECT_EQ(FileToUri(path.c_str()).rfind("file:///", 0), 0u);
+  EXPECT_EQ(UriToFile(FileToUri(path.c_str()).c_str()), path);
 }

@@ -1,6 +1,5 @@
 // Uses both watcher exports and the change record through the shared library alone.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <chrono>
 #include <condition_variable>
@@ -10,6 +9,7 @@
 #include <mutex>
 #include <string>
 
+#include "vexil_test/support.h"
 #include "vexil/watch/watcher.h"
 #include "vexil/watch/watcher_ex.h"
 
@@ -40,8 +40,8 @@ TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
   EXPECT_EQ(renamed.type, 2);
   EXPECT_EQ(xChangeEvent().action, 0xFFFFFFFFu);
 
-  std::string pattern = (std::filesystem::temp_directory_path() / "vexil-exports-XXXXXX").string();
-  const std::string root = mkdtemp(pattern.data());
+  const vexil_test::TempDirectory directory;
+  const std::string root = directory.Path().string();
   {
     std::unique_ptr<xWatcherWorkspaceEx> watcher(
         xWatcher_WorkspaceEx(OnChange, OnTrace, LSP::TraceLevel::Verbose));
@@ -54,5 +54,4 @@ TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
   const int before = traceLines;
   tree->Start("project", root.c_str(), nullptr);
   EXPECT_GT(traceLines, before);
-  std::filesystem::remove_all(root);
 }

@@ -1,7 +1,6 @@
 // Requests and replies against the fake server: tick counting, ignored messages, error
 // replies by id, server requests answered, dead servers, and big or split frames.
 #include <gtest/gtest.h>
-#include <sys/wait.h>
 
 #include <chrono>
 #include <string>
@@ -219,7 +218,7 @@ TEST_F(ServerTraffic, AServerThatDiesWhileAwaitedEndsTheWaitAtOnce) {
   auto asked = std::chrono::steady_clock::now();
   std::thread killer([id] {
     std::this_thread::sleep_for(300ms);
-    kill(id, SIGKILL);
+    vexil_test::KillProcess(id);
   });
   Ask(*server, "fake/silent", "", result);
   killer.join();

@@ -2,7 +2,6 @@
 // that script the fake server per request, and start records that launch it.
 #pragma once
 
-#include <signal.h>
 
 #include <chrono>
 #include <functional>
@@ -15,6 +14,7 @@
 #include "transport/server.h"
 #include "vexil/host/records.h"
 #include "vexil/protocol/message.h"
+#include "vexil_test/support.h"
 
 namespace transport_test {
 
@@ -148,7 +148,7 @@ inline bool WaitFor(const std::function<bool()>& condition, std::chrono::millise
 
 // Ends a fake server this test started, by its process id.
 inline void KillServer(vexil::xServer& server) {
-  if (server.Id() > 0) kill(server.Id(), SIGKILL);
+  vexil_test::KillProcess(server.Id());
   WaitFor([&] { return !server.IsRunning(); });
 }
 

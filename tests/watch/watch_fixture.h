@@ -2,8 +2,6 @@
 // waits on conditions under generous deadlines instead of sleeps.
 #pragma once
 
-#include <unistd.h>
-
 #include <chrono>
 #include <condition_variable>
 #include <cstdlib>
@@ -15,6 +13,8 @@
 #include <system_error>
 #include <thread>
 
+#include "vexil_test/support.h"
+
 namespace watchtest {
 
 namespace fs = std::filesystem;
@@ -22,26 +22,10 @@ namespace fs = std::filesystem;
 // Long enough that only a real loss or hang runs into it.
 constexpr std::chrono::seconds kDeadline{30};
 
-class TempDir {
+// In memory where possible: fast file creation is what exposes the monitor's races.
+class TempDir : public vexil_test::TempDirectory {
  public:
-  // In memory where possible: fast file creation is what exposes the monitor's races.
-  TempDir() {
-    const fs::path base = fs::is_directory("/dev/shm") ? fs::path("/dev/shm") : fs::temp_directory_path();
-    std::string pattern = (base / "vexil-watch-XXXXXX").string();
-    path_ = mkdtemp(pattern.data());
-  }
-  ~TempDir() {
-    std::error_code ignored;
-    fs::remove_all(path_, ignored);
-  }
-  TempDir(const TempDir&) = delete;
-  TempDir& operator=(const TempDir&) = delete;
-
-  const fs::path& Path() const { return path_; }
-  std::string operator/(const std::string& relative) const { return (path_ / relative).string(); }
-
- private:
-  fs::path path_;
+  TempDir() : TempDirectory(fs::is_directory("/dev/shm") ? fs::path("/dev/shm") : fs::path()) {}
 };
 
 inline void Touch(const std::string& path) { std::ofstream(path).put('x'); }

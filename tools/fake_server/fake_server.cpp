@@ -6,7 +6,8 @@
 //   exit=N                    exit with code N right after start-up
 //   hang                      never read; keep every pipe open until killed
 //   ignore-exit               stay alive after "exit" and after stdin closes
-//   grandchild=MS             fork a child that holds the pipes while we live, then MS longer
+//   grandchild=MS             start a copy that holds the pipes while we live, then MS longer
+//   hold=PID:MS               (that copy) wait for process PID to end, then MS, then exit
 // Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/crash" (half a
 // frame, then killed), "fake/cwd", "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
@@ -14,9 +15,6 @@
 // (ids answered first), ask (methods sent to the client, each answer awaited),
 // askSameId, error {code, message, id: "same"|"null"|"none"|number}, unparsable,
 // size (bytes of "data" in the result), split (write the answer in pieces of this size).
-#include <signal.h>
-#include <unistd.h>
-
 #include <chrono>
 #include <sstream>
 #include <string>
@@ -27,6 +25,7 @@
 #include <rapidjson/stringbuffer.h>
 #include <rapidjson/writer.h>
 
+#include "fake_os.h"
 #include "fake_wire.h"
 
 namespace {
@@ -42,10 +41,6 @@ struct Options {
 std::vector<std::string> received;  // notifications from the client, as sent
 
 void Pause(int milliseconds) { std::this_thread::sleep_for(std::chrono::milliseconds(milliseconds)); }
-
-[[noreturn]] void SleepUntilKilled() {
-  for (;;) pause();
-}
 
 std::string Text(const rapidjson::Value& value) {
   rapidjson::StringBuffer buffer;
@@ -64,26 +59,30 @@ std::string StringParam(const rapidjson::Value& params, const char* name) {
   return params.HasMember(name) && params[name].IsString() ? params[name].GetString() : "";
 }
 
-void Send(const std::string& body) { fake::WriteRaw(STDOUT_FILENO, fake::Frame(body)); }
+void Send(const std::string& body) { fake::WriteRaw(fake::kStdout, fake::Frame(body)); }
 
-// Holds the inherited pipes while the server lives, and `linger` ms after it is gone.
-void ForkGrandchild(int linger) {
-  pid_t parent = getpid();
-  if (fork() != 0) return;
-  while (getppid() == parent) Pause(20);
-  Pause(linger);
+// A copy of this server holds the inherited pipes while the server lives, and `linger`
+// ms after it is gone, as a language server's helper process might.
+void StartGrandchild(const std::string& linger) {
+  fake::SpawnSelf("hold=" + std::to_string(fake::ProcessId()) + ":" + linger);
+}
+
+[[noreturn]] void HoldPipes(const std::string& parentAndLinger) {
+  fake::WaitForProcessEnd(std::strtoul(parentAndLinger.c_str(), nullptr, 10));
+  Pause(std::atoi(parentAndLinger.substr(parentAndLinger.find(':') + 1).c_str()));
   std::_Exit(0);
 }
 
 void StartUp(const std::string& directive, Options& options) {
   std::string key = directive.substr(0, directive.find('='));
   std::string value = directive.find('=') == std::string::npos ? "" : directive.substr(directive.find('=') + 1);
-  if (key == "stdout") fake::WriteRaw(STDOUT_FILENO, fake::Unescape(value));
-  else if (key == "stderr") fake::WriteRaw(STDERR_FILENO, fake::Unescape(value));
+  if (key == "stdout") fake::WriteRaw(fake::kStdout, fake::Unescape(value));
+  else if (key == "stderr") fake::WriteRaw(fake::kStderr, fake::Unescape(value));
   else if (key == "exit") std::_Exit(std::atoi(value.c_str()));
-  else if (key == "hang") SleepUntilKilled();
+  else if (key == "hang") fake::SleepUntilKilled();
   else if (key == "ignore-exit") options.ignoreExit = true;
-  else if (key == "grandchild") ForkGrandchild(std::atoi(value.c_str()));
+  else if (key == "grandchild") StartGrandchild(value);
+  else if (key == "hold") HoldPipes(value);
 }
 
 // Sends each method of params.ask as a request to the client and waits for its answer.
@@ -117,8 +116,7 @@ std::string Result(const std::string& method, const rapidjson::Value& params, co
   std::ostringstream result;
   result << "{\"method\":" << Quote(method);
   if (method == "fake/cwd") {
-    char directory[4096];
-    result << ",\"cwd\":" << Quote(getcwd(directory, sizeof directory) ? directory : "");
+    result << ",\"cwd\":" << Quote(fake::CurrentDirectory());
   }
   result << ",\"answers\":[";
   for (std::size_t i = 0; i < answers.size(); ++i) result << (i ? "," : "") << answers[i];
@@ -143,17 +141,17 @@ std::string Answer(const std::string& method, const rapidjson::Value& params, co
 
 void WriteAnswer(const std::string& body, int split) {
   std::string framed = fake::Frame(body);
-  if (split <= 0) return fake::WriteRaw(STDOUT_FILENO, framed);
+  if (split <= 0) return fake::WriteRaw(fake::kStdout, framed);
   for (std::size_t at = 0; at < framed.size(); at += static_cast<std::size_t>(split)) {
-    fake::WriteRaw(STDOUT_FILENO, framed.substr(at, static_cast<std::size_t>(split)));
+    fake::WriteRaw(fake::kStdout, framed.substr(at, static_cast<std::size_t>(split)));
     Pause(1);
   }
 }
 
 void Prelude(const rapidjson::Value& params) {
   Pause(IntParam(params, "delay"));
-  if (params.HasMember("stderr")) fake::WriteRaw(STDERR_FILENO, fake::Unescape(StringParam(params, "stderr")));
-  if (params.HasMember("garbage")) fake::WriteRaw(STDOUT_FILENO, fake::Unescape(StringParam(params, "garbage")));
+  if (params.HasMember("stderr")) fake::WriteRaw(fake::kStderr, fake::Unescape(StringParam(params, "stderr")));
+  if (params.HasMember("garbage")) fake::WriteRaw(fake::kStdout, fake::Unescape(StringParam(params, "garbage")));
   for (int i = IntParam(params, "notifications"); i > 0; --i) {
     Send("{\"jsonrpc\":\"2.0\",\"method\":\"fake/progress\",\"params\":{\"left\":" + std::to_string(i) + "}}");
   }
@@ -167,8 +165,8 @@ void Prelude(const rapidjson::Value& params) {
 void HandleRequest(const std::string& method, const rapidjson::Value& params, const std::string& id) {
   if (method == "fake/exit") std::_Exit(IntParam(params, "code"));
   if (method == "fake/crash") {
-    fake::WriteRaw(STDOUT_FILENO, "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
-    kill(getpid(), SIGKILL);
+    fake::WriteRaw(fake::kStdout, "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
+    fake::Crash();
   }
   Prelude(params);
   if (method == "fake/silent") return;
@@ -192,14 +190,13 @@ void Serve(const Options& options) {
       received.push_back(body);
     }
   }
-  if (options.ignoreExit) SleepUntilKilled();
+  if (options.ignoreExit) fake::SleepUntilKilled();
 }
 
 }  // namespace
 
 int main(int argc, char** argv) {
-  signal(SIGPIPE, SIG_IGN);
-  alarm(kSafetyLifetimeSeconds);
+  fake::PrepareProcess(argv[0], kSafetyLifetimeSeconds);
   Options options;
   for (int i = 1; i < argc; ++i) {
     std::istringstream directives(argv[i]);

@@ -2,11 +2,10 @@
 // writers that give up quietly when the client has closed its end.
 #include "fake_wire.h"
 
-#include <unistd.h>
-
 #include <cctype>
 #include <cstdlib>
-#include <strings.h>
+
+#include "fake_os.h"
 
 namespace fake {
 namespace {
@@ -15,7 +14,7 @@ std::string pending;  // bytes read from stdin but not yet used
 
 bool Fill() {
   char buffer[65536];
-  ssize_t count = read(STDIN_FILENO, buffer, sizeof buffer);
+  long count = ReadInput(buffer, sizeof buffer);
   if (count <= 0) return false;
   pending.append(buffer, static_cast<std::size_t>(count));
   return true;
@@ -32,10 +31,10 @@ bool ReadLength(std::size_t& length) {
     std::string line = pending.substr(0, end);
     pending.erase(0, end + 2);
     if (line.empty()) return true;
-    static const char header[] = "content-length:";
-    if (strncasecmp(line.c_str(), header, sizeof header - 1) == 0) {
-      length = std::strtoul(line.c_str() + sizeof header - 1, nullptr, 10);
-    }
+    static const std::string header = "content-length:";
+    std::string name = line.substr(0, header.size());
+    for (char& c : name) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
+    if (name == header) length = std::strtoul(line.c_str() + header.size(), nullptr, 10);
   }
 }
 
@@ -55,7 +54,7 @@ bool ReadMessage(std::string& body) {
 void WriteRaw(int descriptor, const std::string& bytes) {
   std::size_t done = 0;
   while (done < bytes.size()) {
-    ssize_t count = write(descriptor, bytes.data() + done, bytes.size() - done);
+    long count = WriteOutput(descriptor, bytes.data() + done, static_cast<unsigned>(bytes.size() - done));
     if (count <= 0) std::_Exit(0);
     done += static_cast<std::size_t>(count);
   }

@@ -1,0 +1,30 @@
+// Portable helpers for tests: a temporary directory removed with its contents, and
+// control over processes a test started (the library itself never kills a child).
+#pragma once
+
+#include <filesystem>
+#include <string>
+
+namespace vexil_test {
+
+class TempDirectory {
+ public:
+  // A new, empty directory under `base` (the system's temporary directory when empty).
+  explicit TempDirectory(const std::filesystem::path& base = {});
+  ~TempDirectory();
+  TempDirectory(const TempDirectory&) = delete;
+  TempDirectory& operator=(const TempDirectory&) = delete;
+
+  const std::filesystem::path& Path() const { return path_; }
+  std::string operator/(const std::string& relative) const { return (path_ / relative).string(); }
+
+ private:
+  std::filesystem::path path_;
+};
+
+// Ends the process `id` at once, as a crash would.
+void KillProcess(int id);
+// Whether the process `id` still exists (an exited but unreaped child counts as existing).
+bool ProcessExists(int id);
+
+}  // namespace vexil_test
