@@ -32,11 +32,9 @@ void WatcherDirectory::Start() {
 }
 
 void WatcherDirectory::Stop() {
-  if (!watcher_) return;
-  // Unsubscribing waits for a handler that is running; the watcher's destructor then
-  // joins its thread.
-  watcher_->itemModified -= Poco::delegate(this, &WatcherDirectory::OnModified);
-  watcher_->itemAdded -= Poco::delegate(this, &WatcherDirectory::OnAdded);
+  // The watcher's destructor joins its thread, so a handler that is running finishes
+  // first, and the subscriptions end with the watcher on this thread. Unsubscribing
+  // while that thread notifies would leave it to free the subscriptions itself.
   watcher_.reset();
 }
 
