@@ -174,6 +174,11 @@ void xWatcherCmd::ReportEnd() {
 
 void xWatcherCmd::ReportTimeOut() {
   Cancel();
+  {
+    // Left running, yet collected once it ends, however long this command is kept.
+    std::lock_guard<std::mutex> lock(processMutex_);
+    process_.Abandon();
+  }
   errors_ = true;
   tracer_.Error("\nWatcher Command: '%s' => Timed out waiting for watcher task to complete.\n", name_.c_str());
 }

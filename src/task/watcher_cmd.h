@@ -32,9 +32,10 @@ class xWatcherCmd : public Poco::Runnable {
   // Stops reading; a child still running is left to end by itself and is never killed.
   ~xWatcherCmd() override;
 
-  // The child's process id; 0 before a launch.
+  // The child's process id; 0 before a launch and once it has been given up on.
   int Id() const;
   const std::string& Name() const { return name_; }
+  // False too once the child has been given up on after its time-out.
   bool IsRunning();
   bool Completed() const { return completed_; }
   bool HaveErrors() const { return errors_; }
