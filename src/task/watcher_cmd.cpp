@@ -52,7 +52,7 @@ xWatcherCmd::~xWatcherCmd() {
 
 int xWatcherCmd::Id() const {
   std::lock_guard<std::mutex> lock(processMutex_);
-  return std::max(process_.Id(), 0);
+  return id_;
 }
 
 bool xWatcherCmd::IsRunning() {
@@ -146,6 +146,7 @@ void xWatcherCmd::Launch() {
   {
     std::lock_guard<std::mutex> lock(processMutex_);
     process_.Launch(executable_, arguments_, directory_, nullptr, &outPipe_, &outPipe_);
+    id_ = process_.Id();
   }
   readerThread_.Start(reader_);
 }

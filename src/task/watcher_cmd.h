@@ -32,7 +32,7 @@ class xWatcherCmd : public Poco::Runnable {
   // Stops reading; a child still running is left to end by itself and is never killed.
   ~xWatcherCmd() override;
 
-  // The child's process id; 0 before a launch and once it has been given up on.
+  // The launched child's process id; 0 before a launch.
   int Id() const;
   const std::string& Name() const { return name_; }
   // False too once the child has been given up on after its time-out.
@@ -83,6 +83,7 @@ class xWatcherCmd : public Poco::Runnable {
   ReaderThread readerThread_;
   mutable std::mutex processMutex_;  // the child is looked at from the task's and the run thread
   xProcess process_;
+  int id_ = 0;  // kept when the child is given up on and the process wrapper forgets it
   bool useCommand_;
   std::atomic<bool> completed_{false};
   std::atomic<bool> errors_{false};

@@ -28,6 +28,16 @@ class WatcherCommand : public ::testing::Test {
     return std::make_unique<xWatcherEvent>(kTask, xFileTags(dir_ / file), options);
   }
 
+  // A `sleep 30` given `timeout` ms; returns once its time-out has been reported.
+  std::unique_ptr<xWatcherEvent> TimedOutSleep(int timeout) {
+    xWatcherOptions options = Options("30", timeout, false);
+    options.executable = "sleep";
+    auto event = Event("a.cpp", options);
+    EXPECT_TRUE(event->Start());
+    EXPECT_TRUE(WaitForLine(Error("\nWatcher Command: 'build' => Timed out waiting for watcher task to complete.\n")));
+    return event;
+  }
+
   watchtest::TempDir dir_;
 };
 
@@ -72,13 +82,9 @@ TEST_F(WatcherCommand, CommandsThatEndAtOnceGetNoWaitingThread) {
 }
 
 TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceItEnds) {
-  xWatcherOptions options = Options("30", 500, false);
-  options.executable = "sleep";
-  auto event = Event("a.cpp", options);
-  ASSERT_TRUE(event->Start());
+  auto event = TimedOutSleep(500);
   const int pid = event->Command().Id();
-
-  ASSERT_TRUE(WaitForLine(Error("\nWatcher Command: 'build' => Timed out waiting for watcher task to complete.\n")));
+  ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
   EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
   EXPECT_TRUE(event->Command().HaveErrors());
   EXPECT_FALSE(event->Command().Completed());
@@ -98,12 +104,9 @@ TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceIt
 
 TEST_F(WatcherCommand, ChildGivenUpOnIsCollectedWhileItsCommandIsStillKept) {
   // A task keeps a timed-out command until the next change, which may never come.
-  xWatcherOptions options = Options("30", 300, false);
-  options.executable = "sleep";
-  auto event = Event("a.cpp", options);
-  ASSERT_TRUE(event->Start());
+  auto event = TimedOutSleep(300);
   const int pid = event->Command().Id();
-  ASSERT_TRUE(WaitForLine(Error("\nWatcher Command: 'build' => Timed out waiting for watcher task to complete.\n")));
+  ASSERT_GT(pid, 0);
   kill(pid, SIGKILL);
   EXPECT_TRUE(WaitUntilGone(pid));
 }
