@@ -32,6 +32,9 @@ class xProcess {
   bool IsRunning();
   // The operating system's process id, or -1 before a launch.
   int Id() const;
+  // Forgets the child as the destructor does; one that still runs is collected once it
+  // ends, so leaving a child running leaves no zombie behind.
+  void Abandon();
 
  private:
   struct Child;

@@ -16,6 +16,8 @@
 
 #include <Poco/Exception.h>
 
+#include "transport/child_reaper.h"
+
 extern char** environ;
 
 namespace vexil {
@@ -173,6 +175,11 @@ void xProcess::Launch(const std::string& executable, const std::vector<std::stri
 bool xProcess::IsRunning() { return child_ && child_->Running(); }
 
 int xProcess::Id() const { return child_ ? static_cast<int>(child_->pid) : -1; }
+
+void xProcess::Abandon() {
+  if (child_ && child_->Running()) ReapInBackground(child_->pid);
+  child_.reset();
+}
 
 CommandInterpreter SystemCommandInterpreter() { return {"/bin/sh", "-c"}; }
 

@@ -33,6 +33,9 @@ bool xProcess::IsRunning() {
 
 int xProcess::Id() const { return child_ ? static_cast<int>(child_->handle.id()) : -1; }
 
+// An ended Windows child leaves nothing to collect once its handle is closed.
+void xProcess::Abandon() { child_.reset(); }
+
 CommandInterpreter SystemCommandInterpreter() { return {"cmd.exe", "/C"}; }
 
 std::string LastSystemErrorText() {

@@ -2,6 +2,9 @@
 // destroyed, so no path can leave it running or join it twice.
 #pragma once
 
+#include <chrono>
+#include <condition_variable>
+#include <mutex>
 #include <thread>
 
 #include <Poco/Runnable.h>
@@ -17,7 +20,14 @@ class ReaderThread {
 
   void Start(Poco::Runnable& body) {
     Join();
-    thread_ = std::thread([&body] { body.run(); });
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      ended_ = false;
+    }
+    thread_ = std::thread([this, &body] {
+      body.run();
+      MarkEnded();
+    });
   }
 
   // Returns at once when the thread never started or was joined before.
@@ -25,7 +35,30 @@ class ReaderThread {
     if (thread_.joinable()) thread_.join();
   }
 
+  // Joins the thread if its body returns within `limit`; otherwise leaves it to a later
+  // join and returns false. True at once when there is nothing to wait for.
+  bool TryJoin(std::chrono::milliseconds limit) {
+    if (!thread_.joinable()) return true;
+    {
+      std::unique_lock<std::mutex> lock(mutex_);
+      if (!endedChanged_.wait_for(lock, limit, [this] { return ended_; })) return false;
+    }
+    thread_.join();
+    return true;
+  }
+
  private:
+  void MarkEnded() {
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      ended_ = true;
+    }
+    endedChanged_.notify_all();
+  }
+
+  std::mutex mutex_;
+  std::condition_variable endedChanged_;
+  bool ended_ = false;
   std::thread thread_;
 };
 

@@ -6,6 +6,8 @@
 
 #include <Poco/Thread.h>
 
+#include "transport/launch_report.h"
+
 namespace vexil {
 
 const char* const kTraceLevelHint =
@@ -138,11 +140,7 @@ void xServer::ReportFailedStart(const std::string& reason, bool hint) {
 
 void xServer::TraceLaunchDetails() {
   if (!tracer_.Verbose()) return;
-  tracer_.Verbose(" Executable: %s\n", executable_.c_str());
-  tracer_.Verbose("  Directory: %s\n", directory_.c_str());
-  tracer_.Verbose("  Arguments: %s\n", Join(arguments_, " "));
-  tracer_.Verbose("Use Command: %s\n", useCommand_ ? "Yes" : "No");
-  tracer_.Verbose("     Timout: %d (milliseconds)\n\n", timeout_);
+  vexil::TraceLaunchDetails(tracer_, executable_, directory_, Join(arguments_, " "), useCommand_, timeout_);
 }
 
 void xServer::TraceStrayOutput() {

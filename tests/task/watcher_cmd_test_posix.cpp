@@ -1,0 +1,163 @@
+// Watcher commands as real child processes: one that runs on and ends, ones that end at
+// once, one that outlives its time-out, a missing program, and file names the shell
+// would read as commands.
+#include <gtest/gtest.h>
+#include <signal.h>
+
+#include <chrono>
+#include <filesystem>
+#include <memory>
+#include <string>
+
+#include "task/watcher_event.h"
+#include "task_test_support.h"
+
+namespace {
+
+using namespace tasktest;
+using vexil::xFileTags;
+using vexil::xWatcherEvent;
+
+const char* const kTask = "build";
+
+class WatcherCommand : public ::testing::Test {
+ protected:
+  void SetUp() override { watchtest::ResetRecording(); }
+
+  std::unique_ptr<xWatcherEvent> Event(const std::string& file, const xWatcherOptions& options) {
+    return std::make_unique<xWatcherEvent>(kTask, xFileTags(dir_ / file), options);
+  }
+
+  // A `sleep 30` given `timeout` ms; returns once its time-out has been reported.
+  std::unique_ptr<xWatcherEvent> TimedOutSleep(int timeout) {
+    xWatcherOptions options = Options("30", timeout, false);
+    options.executable = "sleep";
+    auto event = Event("a.cpp", options);
+    EXPECT_TRUE(event->Start());
+    EXPECT_TRUE(WaitForLine(Error("\nWatcher Command: 'build' => Timed out waiting for watcher task to complete.\n")));
+    return event;
+  }
+
+  watchtest::TempDir dir_;
+};
+
+TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
+  // Still running at the 100 ms look, ended long before its 10 s.
+  auto event = Event("a.cpp", Options("echo built $F; sleep 1"));
+  ASSERT_TRUE(event->Start());
+  const int pid = event->Command().Id();
+  EXPECT_GT(pid, 0);
+
+  ASSERT_TRUE(WaitForLine(Notice(kTask, "Watcher Command Run event complete.")));
+  EXPECT_TRUE(Traced(Message("built a.cpp\n")));
+  EXPECT_TRUE(event->Command().Completed());
+  EXPECT_FALSE(event->Command().HaveErrors());
+  EXPECT_TRUE(event->Finished());
+  for (const char* text : {"Watcher Event starting....\n\n", " Executable: /bin/sh\n",
+                           "  Arguments: -c echo built a.cpp; sleep 1 \n", "Use Command: Yes\n",
+                           "     Timout: 10000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"}) {
+    EXPECT_TRUE(Traced(Verbose(text))) << text;
+  }
+  EXPECT_FALSE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));
+  EXPECT_TRUE(WaitUntilGone(pid));  // reaped, no zombie
+}
+
+TEST_F(WatcherCommand, CommandsThatEndAtOnceGetNoWaitingThread) {
+  xWatcherOptions trueOptions = Options("", 0, false);
+  trueOptions.executable = "true";
+  auto quiet = Event("a.cpp", trueOptions);
+  EXPECT_FALSE(quiet->Start());
+  EXPECT_TRUE(quiet->Finished());
+  EXPECT_TRUE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));
+  EXPECT_TRUE(Traced(Verbose("     Timout: 5000 (milliseconds)\n\n")));  // 0 means 5000
+  EXPECT_TRUE(Traced(Verbose("  Arguments: \n")));                      // an empty argument is left out
+
+  xWatcherOptions echoOptions = Options("quick $FB", 2000, false);
+  echoOptions.executable = "echo";
+  auto talking = Event("a.cpp", echoOptions);
+  EXPECT_FALSE(talking->Start());
+  EXPECT_TRUE(Traced(Message("quick a\n")));  // one argument, blanks and all
+  EXPECT_FALSE(Traced(Verbose("Watcher Event starting ")));
+  EXPECT_FALSE(Traced(Notice(kTask, "Watcher Command Run event complete.")));
+}
+
+TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceItEnds) {
+  auto event = TimedOutSleep(500);
+  const int pid = event->Command().Id();
+  ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
+  EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
+  EXPECT_TRUE(event->Command().HaveErrors());
+  EXPECT_FALSE(event->Command().Completed());
+  EXPECT_TRUE(event->Finished());
+  ASSERT_EQ(kill(pid, 0), 0) << "the child is never killed by the library";
+
+  // The reader was stopped although the child holds the pipe open: a reader that
+  // waited for the end of the output would hold this up for the child's 30 s.
+  const auto begin = std::chrono::steady_clock::now();
+  event.reset();
+  EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(10));
+  EXPECT_TRUE(Traced(Verbose("Watcher command close complete.\n\n")));
+
+  kill(pid, SIGKILL);
+  EXPECT_TRUE(WaitUntilGone(pid)) << "a child given up on is still collected once it ends";
+}
+
+TEST_F(WatcherCommand, ChildGivenUpOnIsCollectedWhileItsCommandIsStillKept) {
+  // A task keeps a timed-out command until the next change, which may never come.
+  auto event = TimedOutSleep(300);
+  const int pid = event->Command().Id();
+  ASSERT_GT(pid, 0);
+  kill(pid, SIGKILL);
+  EXPECT_TRUE(WaitUntilGone(pid));
+}
+
+TEST_F(WatcherCommand, MissingProgramIsALaunchFailure) {
+  xWatcherOptions options = Options("$FN", 2000, false);
+  options.executable = "vexil-no-such-program";
+  auto event = Event("a.cpp", options);
+  EXPECT_FALSE(event->Start());
+  EXPECT_TRUE(Traced(Error(
+      "Cannot find executable: vexil-no-such-program\nWatcher Command: build => Make sure the executable exists, "
+      "the details are correctly configured and the executable is in the PATH.\n\n")));
+  EXPECT_TRUE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));
+  EXPECT_EQ(event->Command().Id(), 0);
+}
+
+TEST_F(WatcherCommand, FileNamesTheShellWouldInterpretAreNeverRun) {
+  const std::string refusal =
+      "\nWatcher Command: 'build' => Refused to run: the file name contains characters the command interpreter "
+      "would interpret.\n";
+  const std::string pwned = dir_ / "pwned";
+  for (const char* name : {"x;touch pwned;.cpp", "x$(touch pwned).cpp", "x`touch pwned`.cpp", "x|touch pwned.cpp",
+                           "x&&touch pwned&&.cpp", "x\ntouch pwned\n.cpp", "x'.cpp", "x\".cpp", "x>pwned.cpp",
+                           "x*.cpp", "x\\.cpp"}) {
+    watchtest::ResetRecording();
+    xWatcherOptions options = Options("echo $F > /dev/null");
+    options.directory = dir_.Path().string();
+    auto event = Event(name, options);
+    EXPECT_FALSE(event->Start()) << name;
+    EXPECT_TRUE(Traced(Error(refusal))) << name;
+    EXPECT_TRUE(event->Command().HaveErrors()) << name;
+    EXPECT_EQ(event->Command().Id(), 0) << name;
+  }
+  EXPECT_FALSE(std::filesystem::exists(pwned));
+
+  // Only inserted values count: the text the host configured is its own.
+  watchtest::ResetRecording();
+  auto own = Event("a.cpp", Options("echo $F; echo done"));
+  own->Start();
+  EXPECT_TRUE(WaitForText("Message", "done"));
+  EXPECT_FALSE(Traced(Error(refusal)));
+
+  // Without the interpreter the name is one argument that nothing reads as syntax.
+  watchtest::ResetRecording();
+  xWatcherOptions direct = Options("$F", 2000, false);
+  direct.executable = "echo";
+  direct.directory = dir_.Path().string();
+  auto plain = Event("x;touch pwned;.cpp", direct);
+  plain->Start();
+  EXPECT_TRUE(WaitForText("Message", "x;touch pwned;.cpp\n"));
+  EXPECT_FALSE(std::filesystem::exists(pwned));
+}
+
+}  // namespace

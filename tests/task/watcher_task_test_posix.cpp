@@ -1,0 +1,136 @@
+// Watcher tasks over real temporary directories: changed files with watched extensions
+// run the command, others are ignored, and the registry, disabling and release behave.
+#include <gtest/gtest.h>
+#include <signal.h>
+
+#include <chrono>
+#include <string>
+#include <vector>
+
+#include "task_test_support.h"
+#include "vexil/task/watcher_task.h"
+
+namespace {
+
+using namespace tasktest;
+
+class WatcherTaskTest : public ::testing::Test {
+ protected:
+  void SetUp() override { watchtest::ResetRecording(); }
+
+  std::string Dir() const { return dir_.Path().string(); }
+  std::string DirSlash() const { return Dir() + "/"; }
+
+  watchtest::TempDir dir_;
+};
+
+TEST_F(WatcherTaskTest, ChangedFilesWithWatchedExtensionsRunTheCommand) {
+  for (const char* file : {"a.cpp", "B.CPP", "notes.txt", "x.h"}) watchtest::Touch(dir_ / file);
+  xWatcherTask* task = xWatcher_Task("cpp", Options("echo ran $F $EXT in $FDD"), {Dir()});
+  ASSERT_NE(task, nullptr);
+  EXPECT_EQ(xWatcher_Have("cpp"), task);
+  task->AddExtension(".cpp");
+  task->AddExtension("h");  // without its dot
+  task->AddExtension(nullptr);
+  task->Start();
+  EXPECT_TRUE(Traced(Verbose("\nWatcher Task: 'cpp'\n")));
+  EXPECT_TRUE(Traced(Verbose("Watching Extension: .cpp\n")));
+  EXPECT_TRUE(Traced(Verbose("Watcher Task: 'cpp' => Starting watcher.....\n")));
+  EXPECT_TRUE(Traced(Verbose("Starting to watch directory: " + Dir() + "\n")));
+
+  ASSERT_TRUE(ModifyUntilTraced(dir_ / "a.cpp", "Message", "ran a.cpp .cpp in " + DirSlash() + "\n"));
+  const std::vector<std::string> changed = {"      Event: Changed\n",
+                                            "       Path: " + DirSlash() + "a.cpp\n",
+                                            "  Full Name: " + DirSlash() + "a.cpp\n",
+                                            "  Directory: " + DirSlash() + "\n",
+                                            "  File Name: a.cpp\n",
+                                            "  Base Name: a\n",
+                                            "  Extension: .cpp\n",
+                                            " UseCommand: 1\n",
+                                            "  Arguments: echo ran $F $EXT in $FDD\n"};
+  for (const std::string& text : changed) {
+    EXPECT_TRUE(Traced(Verbose(text))) << text;
+  }
+  EXPECT_TRUE(ModifyUntilTraced(dir_ / "B.CPP", "Message", "ran B.CPP .CPP"));  // compared in lower case
+  EXPECT_TRUE(ModifyUntilTraced(dir_ / "x.h", "Message", "ran x.h .h"));
+  EXPECT_TRUE(ModifyUntilTraced(dir_ / "notes.txt", "Verbose",
+                                "Watcher Task: 'cpp' => Ignoring changes for File: " + DirSlash() +
+                                    "notes.txt  Extension: .txt\n"));
+  EXPECT_FALSE(WaitForText("Message", "ran notes.txt", std::chrono::milliseconds(0)));
+
+  watchtest::Touch(dir_ / "new.cpp");
+  EXPECT_TRUE(WaitForLine(Notice("cpp", "An onFileAdded event.\n")));
+  EXPECT_TRUE(Traced(Verbose("      Path: " + DirSlash() + "new.cpp\n")));
+
+  task->Release();
+  EXPECT_EQ(xWatcher_Have("cpp"), nullptr);
+}
+
+TEST_F(WatcherTaskTest, RegistryKnowsTasksByName) {
+  xWatcherOptions options = Options("true");
+  EXPECT_EQ(xWatcher_Task("none", options, {}), nullptr);
+  EXPECT_EQ(xWatcher_Have("none"), nullptr);
+  EXPECT_TRUE(Traced(Verbose(
+      "Ignoring 'none' watcher as directories found did not contain file with watched extensions.\n")));
+
+  xWatcherTask* first = xWatcher_Task("twice", options, {Dir()});
+  EXPECT_EQ(xWatcher_Task("twice", options, {Dir()}), first);  // no second task under one name
+  EXPECT_STREQ(first->Name(), "twice");
+
+  // A directory that cannot be watched is reported, not thrown to the host.
+  xWatcherTask* missing = xWatcher_Task("missing", options, {Dir() + "/gone"});
+  missing->Start();
+  EXPECT_TRUE(WaitForText("Error", Dir() + "/gone"));
+  missing->Release();
+  first->Release();
+  EXPECT_EQ(xWatcher_Have("twice"), nullptr);
+  EXPECT_EQ(xWatcher_Have("missing"), nullptr);
+}
+
+TEST_F(WatcherTaskTest, DisabledTaskWatchesOnlyAfterEnable) {
+  watchtest::Touch(dir_ / "a.cpp");
+  xWatcherOptions options = Options("echo ran $F");
+  options.disabled = true;
+  options.flag = true;
+  xWatcherTask* task = xWatcher_Task("off", options, {Dir()});
+  task->AddExtension(".cpp");
+  EXPECT_TRUE(task->IsFlagged());
+  task->Start();
+  EXPECT_TRUE(Traced(Verbose("Watcher Task: 'off' => Ignoring disabled watcher.\n")));
+  EXPECT_FALSE(Traced(Verbose("Starting to watch directory: " + Dir() + "\n")));
+
+  task->Enable();
+  task->Start();
+  EXPECT_TRUE(Traced(Verbose("Starting to watch directory: " + Dir() + "\n")));
+  EXPECT_TRUE(ModifyUntilTraced(dir_ / "a.cpp", "Message", "ran a.cpp"));
+  task->Release();
+}
+
+TEST_F(WatcherTaskTest, ReleaseWhileACommandRunsNeitherWaitsForItNorKillsIt) {
+  watchtest::Touch(dir_ / "a.cpp");
+  xWatcherTask* task = xWatcher_Task("long", Options("echo pid $$; exec sleep 30", 60000), {Dir()});
+  task->AddExtension(".cpp");
+  task->Start();
+  ASSERT_TRUE(ModifyUntilTraced(dir_ / "a.cpp", "Message", "pid "));
+  const auto begin = std::chrono::steady_clock::now();
+  task->Release();
+  EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(10));  // not the child's 30 s
+  EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
+  // One save may be reported as several modifications, each starting a child.
+  const std::vector<int> pids = Recorded().shared.Read([] {
+    std::vector<int> found;
+    for (const TraceLine& line : Recorded().traces) {
+      const auto at = line.text.find("pid ");
+      if (line.title == "Message" && at != std::string::npos) found.push_back(std::stoi(line.text.substr(at + 4)));
+    }
+    return found;
+  });
+  for (const int pid : pids) {
+    ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
+    EXPECT_EQ(kill(pid, 0), 0) << "never killed by the library";
+    kill(pid, SIGKILL);
+    EXPECT_TRUE(WaitUntilGone(pid));
+  }
+}
+
+}  // namespace
