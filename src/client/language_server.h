@@ -57,10 +57,10 @@ class LanguageServer final : public xLanguageServer {
   // The one request pattern: send `method` with `params`, wait for the reply to its id
   // and read the reply's result into `holder`, which stays empty on any failure.
   void Request(const char* method, Params* params, Result& holder);
+  // The request pattern for a holder made here, returned with whatever it was given.
+  template <typename Holder>
+  Holder Ask(const char* method, Params* params, Holder holder = Holder());
   void Notify(const char* method, Params* params);
-  std::vector<Location> Locations(const char* method, Params* params);
-  std::vector<SymbolInformation> Symbols(const char* method, Params* params, std::string documentUri);
-  std::vector<TextEdit> Edits(const char* method, Params* params);
   // Polls until the process has ended or the limit has passed; true when it ended.
   bool AwaitEnd();
 

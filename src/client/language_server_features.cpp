@@ -38,85 +38,66 @@ void LanguageServer::Notify(const char* method, Params* params) {
   server.Write(notification);
 }
 
-std::vector<Location> LanguageServer::Locations(const char* method, Params* params) {
-  LocationsList holder;
+template <typename Holder>
+Holder LanguageServer::Ask(const char* method, Params* params, Holder holder) {
   Request(method, params, holder);
-  return holder.items;
-}
-
-std::vector<SymbolInformation> LanguageServer::Symbols(const char* method, Params* params, std::string documentUri) {
-  SymbolInformationList holder(std::move(documentUri));
-  Request(method, params, holder);
-  return holder.items;
-}
-
-std::vector<TextEdit> LanguageServer::Edits(const char* method, Params* params) {
-  DocumentFormattingList holder;
-  Request(method, params, holder);
-  return holder.items;
+  return holder;
 }
 
 CompletionList LanguageServer::TextDocument_Completion(CompletionParams* params) {
-  CompletionList list;
-  Request("textDocument/completion", params, list);
-  return list;
+  return Ask<CompletionList>("textDocument/completion", params);
 }
 
 std::vector<Location> LanguageServer::TextDocument_Declaration(TextDocumentPositionParams* params) {
-  return Locations("textDocument/declaration", params);
+  return Ask<LocationsList>("textDocument/declaration", params).items;
 }
 
 std::vector<Location> LanguageServer::TextDocument_Definition(TextDocumentPositionParams* params) {
-  return Locations("textDocument/definition", params);
+  return Ask<LocationsList>("textDocument/definition", params).items;
 }
 
 std::vector<Location> LanguageServer::TextDocument_TypeDefinition(TextDocumentPositionParams* params) {
-  return Locations("textDocument/typeDefinition", params);
+  return Ask<LocationsList>("textDocument/typeDefinition", params).items;
 }
 
 std::vector<Location> LanguageServer::TextDocument_Implementation(TextDocumentPositionParams* params) {
-  return Locations("textDocument/implementation", params);
+  return Ask<LocationsList>("textDocument/implementation", params).items;
 }
 
 std::vector<Location> LanguageServer::TextDocument_References(TextDocumentPositionParams* params) {
-  if (!params || dynamic_cast<ReferenceParams*>(params)) return Locations("textDocument/references", params);
+  if (!params || dynamic_cast<ReferenceParams*>(params)) return Ask<LocationsList>("textDocument/references", params).items;
   WithReferenceContext withContext(*params);
-  return Locations("textDocument/references", &withContext);
+  return Ask<LocationsList>("textDocument/references", &withContext).items;
 }
 
 std::vector<SymbolInformation> LanguageServer::TextDocument_DocumentSymbol(DocumentSymbolParams* params) {
   // Hierarchical symbols carry no URI of their own: they belong to the requested document.
-  return Symbols("textDocument/documentSymbol", params, params ? params->textDocument.uri : "");
+  SymbolInformationList holder(params ? params->textDocument.uri : "");
+  return Ask("textDocument/documentSymbol", params, std::move(holder)).items;
 }
 
 std::vector<SymbolInformation> LanguageServer::TextDocument_WorkspaceSymbol(WorkspaceSymbolParams* params) {
-  return Symbols("workspace/symbol", params, "");
+  return Ask<SymbolInformationList>("workspace/symbol", params).items;
 }
 
 Hover LanguageServer::TextDocument_Hover(TextDocumentPositionParams* params) {
-  Hover hover;
-  Request("textDocument/hover", params, hover);
-  return hover;
+  return Ask<Hover>("textDocument/hover", params);
 }
 
 SignatureHelp LanguageServer::TextDocument_Signature(TextDocumentPositionParams* params) {
-  SignatureHelp help;
-  Request("textDocument/signatureHelp", params, help);
-  return help;
+  return Ask<SignatureHelp>("textDocument/signatureHelp", params);
 }
 
 std::vector<TextEdit> LanguageServer::TextDocument_Formatting(DocumentFormattingParams* params) {
-  return Edits("textDocument/formatting", params);
+  return Ask<DocumentFormattingList>("textDocument/formatting", params).items;
 }
 
 std::vector<TextEdit> LanguageServer::TextDocument_RangeFormatting(DocumentRangeFormattingParams* params) {
-  return Edits("textDocument/rangeFormatting", params);
+  return Ask<DocumentFormattingList>("textDocument/rangeFormatting", params).items;
 }
 
 WorkspaceEdit LanguageServer::TextDocument_Rename(RenameParams* params) {
-  WorkspaceEdit edit;
-  Request("textDocument/rename", params, edit);
-  return edit;
+  return Ask<WorkspaceEdit>("textDocument/rename", params);
 }
 
 void LanguageServer::TextDocument_DidChange(DidChangeTextDocumentParams* params) {
