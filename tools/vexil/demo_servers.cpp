@@ -167,7 +167,8 @@ void Run(const Tour& tour, const std::string& examples) {
   auto start = std::chrono::steady_clock::now();
   std::string why;
   bool started = session.Start();
-  Expect(!session.Failed(why) && started, tour.title + " did not start (is it installed? `make deps` installs it): " + why);
+  bool failed = session.Failed(why);
+  Expect(started && !failed, tour.title + " did not start (is it installed? `make deps` installs it): " + why);
   Report("start", "process " + std::to_string(session.Server().Id()) + ", initialized in " + Elapsed(start));
 
   std::string main = directory + "/" + tour.files.back();
