@@ -108,7 +108,10 @@ void StartUp(const std::string& directive, Options& options) {
   else if (key == "ignore-exit") options.ignoreExit = true;
   else if (key == "grandchild") ForkGrandchild(std::atoi(value.c_str()));
   else if (key == "result") scripts.results.insert(MethodAndValue(value));
-  else if (key == "late") scripts.delays[MethodAndValue(value).first] = std::atoi(MethodAndValue(value).second.c_str());
+  else if (key == "late") {
+    auto [method, milliseconds] = MethodAndValue(value);
+    scripts.delays[method] = std::atoi(milliseconds.c_str());
+  }
   else if (key == "error") scripts.refused.push_back(value);
   else if (key == "ask") scripts.askedOnInitialize.push_back(value);
 }
