@@ -11,7 +11,7 @@ WINDOWS_BUILD   ?= build-windows
 WINDOWS_SYSROOT  = $(abspath $(WINDOWS_BUILD))/sysroot
 WINE_ENV         = WINEPREFIX=$(abspath $(WINDOWS_BUILD))/wineprefix WINEARCH=win32 WINEDEBUG=-all
 
-.PHONY: all deps configure build test bench asan tsan clean windows-deps windows test-windows
+.PHONY: all deps configure build test demo bench asan tsan clean windows-deps windows test-windows
 
 all: build
 
@@ -26,6 +26,10 @@ build: configure
 
 test: build
 	$(CTEST) --test-dir $(BUILD)
+
+# clangd and pylsp over the example projects, and a watcher over a temporary directory.
+demo: build
+	$(BUILD)/tools/vexil/vexil demo
 
 bench: build
 	cmake --build $(BUILD) --target vexil_bench

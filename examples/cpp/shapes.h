@@ -3,12 +3,19 @@
 
 namespace shapes {
 
+// Anything with an area.
+class Shape {
+ public:
+  virtual ~Shape() = default;
+  virtual int Area() const = 0;
+};
+
 // An axis-aligned rectangle.
-class Rectangle {
+class Rectangle : public Shape {
  public:
   Rectangle(int width, int height);
 
-  int Area() const;
+  int Area() const override;
   int Perimeter() const;
   void Scale(int factor);
 

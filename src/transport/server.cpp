@@ -26,7 +26,7 @@ xServer::xServer(const xServerStart& start)
     : tracer_(start.trace, start.level),
       outReader_("stdout", outPipe_),
       errReader_(errPipe_),
-      timeout_(start.timeout < 1 ? kDefaultTimeoutMs : start.timeout),
+      timeout_(kDefaultTimeoutMs),
       useCommand_(start.useCommand),
       directory_(start.directory) {
   if (useCommand_) {
@@ -41,7 +41,15 @@ xServer::xServer(const xServerStart& start)
                                       &start.argument5, &start.argument6, &start.argument7}) {
     AddArgument(*argument);
   }
+  Timeout(start.timeout);
   outReader_.SetDispatch([this](LSP::xReader& message) { Dispatch(message); });
+}
+
+void xServer::Timeout(int milliseconds) { timeout_ = milliseconds < 1 ? kDefaultTimeoutMs : milliseconds; }
+
+void xServer::WorkspaceFolders(const std::vector<LSP::WorkspaceFolder>& folders) {
+  std::lock_guard<std::mutex> lock(foldersMutex_);
+  folders_ = folders;
 }
 
 xServer::~xServer() {

@@ -15,6 +15,7 @@
 #include "transport/reader_thread.h"
 #include "vexil/host/records.h"
 #include "vexil/protocol/message.h"
+#include "vexil/protocol/structures.h"
 
 namespace vexil {
 
@@ -51,6 +52,12 @@ class xServer {
 
   // Waits of 100 ms in which nothing arrived, used by the last reply wait.
   int LastWaitTicks() const { return lastWaitTicks_; }
+
+  // The reply wait limit in milliseconds; a value below 1 becomes the default.
+  int Timeout() const { return timeout_; }
+  void Timeout(int milliseconds);
+  // The folders a "workspace/workspaceFolders" request from the server is answered with.
+  void WorkspaceFolders(const std::vector<LSP::WorkspaceFolder>& folders);
 
  protected:
   // Clears the error state and sends `text`, a message's JSON body, framed.
@@ -99,6 +106,8 @@ class xServer {
   bool haveErrors_ = false;
   std::string errorMessage_;
   std::mutex writeMutex_;  // one framed message at a time, from the host or the reader
+  std::mutex foldersMutex_;  // the host sets the folders while the reader may answer with them
+  std::vector<LSP::WorkspaceFolder> folders_;
   int lastWaitTicks_ = 0;
 };
 

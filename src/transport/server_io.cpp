@@ -168,7 +168,13 @@ void xServer::Read(int id, LSP::ResponseMessage& response) {
 
 void xServer::Dispatch(LSP::xReader& message) {
   LSP::xObject root = message.Root();
-  if (IsServerRequest(root)) Transmit(AnswerServerRequest(root), false);
+  if (!IsServerRequest(root)) return;
+  std::vector<LSP::WorkspaceFolder> folders;
+  {
+    std::lock_guard<std::mutex> lock(foldersMutex_);
+    folders = folders_;
+  }
+  Transmit(AnswerServerRequest(root, folders), false);
 }
 
 }  // namespace vexil

@@ -4,6 +4,7 @@
 
 
 #include "json/rapidjson.h"
+#include "protocol/json_arrays.h"
 #include "vexil/protocol/message.h"
 
 namespace vexil {
@@ -14,7 +15,7 @@ constexpr int kMethodNotFound = -32601;
 // Requests whose answer carries nothing: the client accepts and has nothing to add.
 bool AnsweredWithNull(const std::string& method) {
   static const char* const methods[] = {"window/workDoneProgress/create", "client/registerCapability",
-                                        "client/unregisterCapability", "workspace/workspaceFolders"};
+                                        "client/unregisterCapability"};
   for (const char* known : methods) {
     if (method == known) return true;
   }
@@ -36,14 +37,16 @@ bool IsServerRequest(const LSP::xObject& message) {
   return message.HasObject("id") && !message.Object("id").IsNull();
 }
 
-std::string AnswerServerRequest(const LSP::xObject& request) {
+std::string AnswerServerRequest(const LSP::xObject& request, std::vector<LSP::WorkspaceFolder>& folders) {
   std::string method = request.Object("method").GetString();
   LSP::xWriter writer;
   writer.StartObject();
   writer.String("jsonrpc", "2.0");
   writer.Raw("id", request.Object("id").Value());
-  if (AnsweredWithNull(method)) {
+  if (AnsweredWithNull(method) || (method == "workspace/workspaceFolders" && folders.empty())) {
     writer.Null("result");
+  } else if (method == "workspace/workspaceFolders") {
+    LSP::WriteArray(writer, "result", folders);
   } else if (method == "workspace/configuration") {
     WriteNullSettings(writer, request);
   } else {

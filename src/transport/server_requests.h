@@ -4,14 +4,18 @@
 
 #include <string>
 
+#include <vector>
+
 #include "vexil/json/json.h"
+#include "vexil/protocol/structures.h"
 
 namespace vexil {
 
 // Whether `message` (a parsed object with a "method") waits for an answer.
 bool IsServerRequest(const LSP::xObject& message);
 
-// The JSON text of our response to `request`, carrying its id back unchanged.
-std::string AnswerServerRequest(const LSP::xObject& request);
+// The JSON text of our response to `request`, carrying its id back unchanged;
+// "workspace/workspaceFolders" is answered with `folders` (null when there are none).
+std::string AnswerServerRequest(const LSP::xObject& request, std::vector<LSP::WorkspaceFolder>& folders);
 
 }  // namespace vexil

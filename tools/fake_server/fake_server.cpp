@@ -8,6 +8,10 @@
 //   ignore-exit               stay alive after "exit" and after stdin closes
 //   grandchild=MS             start a copy that holds the pipes while we live, then MS longer
 //   hold=PID:MS               (that copy) wait for process PID to end, then MS, then exit
+//   result=METHOD:JSON        answer METHOD with JSON as its result (e.g. null)
+//   error=METHOD              answer METHOD with error -32603 "refused METHOD"
+//   late=METHOD:MS            answer METHOD only after MS milliseconds
+//   ask=METHOD                send METHOD to the client while answering "initialize"
 // Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/crash" (half a
 // frame, then killed), "fake/cwd", "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
@@ -16,6 +20,7 @@
 // askSameId, error {code, message, id: "same"|"null"|"none"|number}, unparsable,
 // size (bytes of "data" in the result), split (write the answer in pieces of this size).
 #include <chrono>
+#include <map>
 #include <sstream>
 #include <string>
 #include <thread>
@@ -37,6 +42,24 @@ constexpr unsigned kSafetyLifetimeSeconds = 120;  // never outlive a forgotten t
 struct Options {
   bool ignoreExit = false;
 };
+
+// Per-method scripts given as start-up directives, for requests whose params the
+// client writes itself (initialize, shutdown and the feature requests).
+struct MethodScripts {
+  std::map<std::string, std::string> results;
+  std::map<std::string, int> delays;
+  std::vector<std::string> refused;
+  std::vector<std::string> askedOnInitialize;
+};
+
+MethodScripts scripts;
+
+// Splits "METHOD:VALUE" at its first colon (method names hold none).
+std::pair<std::string, std::string> MethodAndValue(const std::string& text) {
+  std::size_t colon = text.find(':');
+  if (colon == std::string::npos) return {text, ""};
+  return {text.substr(0, colon), text.substr(colon + 1)};
+}
 
 std::vector<std::string> received;  // notifications from the client, as sent
 
@@ -83,17 +106,37 @@ void StartUp(const std::string& directive, Options& options) {
   else if (key == "ignore-exit") options.ignoreExit = true;
   else if (key == "grandchild") StartGrandchild(value);
   else if (key == "hold") HoldPipes(value);
+  else if (key == "result") scripts.results.insert(MethodAndValue(value));
+  else if (key == "late") {
+    auto [method, milliseconds] = MethodAndValue(value);
+    scripts.delays[method] = std::atoi(milliseconds.c_str());
+  }
+  else if (key == "error") scripts.refused.push_back(value);
+  else if (key == "ask") scripts.askedOnInitialize.push_back(value);
 }
 
-// Sends each method of params.ask as a request to the client and waits for its answer.
-std::vector<std::string> AskClient(const rapidjson::Value& params, const std::string& requestId) {
-  std::vector<std::string> answers;
-  if (!params.HasMember("ask") || !params["ask"].IsArray()) return answers;
+bool Refused(const std::string& method) {
+  for (const std::string& refused : scripts.refused) {
+    if (refused == method) return true;
+  }
+  return false;
+}
+
+// Sends each method of params.ask (and, for "initialize", of the ask directives) as a request
+// to the client and waits for its answer.
+std::vector<std::string> AskClient(const std::string& method, const rapidjson::Value& params,
+                                   const std::string& requestId) {
+  std::vector<std::string> methods;
+  if (method == "initialize") methods = scripts.askedOnInitialize;
+  if (params.HasMember("ask") && params["ask"].IsArray()) {
+    for (const rapidjson::Value& asked : params["ask"].GetArray()) methods.push_back(asked.GetString());
+  }
   bool sameId = params.HasMember("askSameId") && params["askSameId"].IsTrue();
+  std::vector<std::string> answers;
   int next = 0;
-  for (const rapidjson::Value& method : params["ask"].GetArray()) {
+  for (const std::string& asked : methods) {
     std::string id = sameId ? requestId : std::to_string(next++);
-    Send("{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"method\":" + Text(method) +
+    Send("{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"method\":" + Quote(asked) +
          ",\"params\":{\"items\":[{\"section\":\"a\"},{\"section\":\"b\"}]}}");
     std::string answer;
     if (!fake::ReadMessage(answer)) std::_Exit(0);
@@ -112,6 +155,8 @@ std::string ErrorId(const rapidjson::Value& error, const std::string& requestId)
 }
 
 std::string Result(const std::string& method, const rapidjson::Value& params, const std::vector<std::string>& answers) {
+  auto scripted = scripts.results.find(method);
+  if (scripted != scripts.results.end()) return scripted->second;
   if (method == "shutdown") return "null";
   std::ostringstream result;
   result << "{\"method\":" << Quote(method);
@@ -131,6 +176,9 @@ std::string Result(const std::string& method, const rapidjson::Value& params, co
 std::string Answer(const std::string& method, const rapidjson::Value& params, const std::string& id,
                    const std::vector<std::string>& answers) {
   if (params.HasMember("unparsable")) return "this is not json";
+  if (Refused(method)) {
+    return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"error\":{\"code\":-32603,\"message\":" + Quote("refused " + method) + "}}";
+  }
   if (params.HasMember("error") && params["error"].IsObject()) {
     const rapidjson::Value& error = params["error"];
     return "{\"jsonrpc\":\"2.0\"," + ErrorId(error, id) + "\"error\":{\"code\":" + std::to_string(IntParam(error, "code")) +
@@ -148,8 +196,9 @@ void WriteAnswer(const std::string& body, int split) {
   }
 }
 
-void Prelude(const rapidjson::Value& params) {
+void Prelude(const std::string& method, const rapidjson::Value& params) {
   Pause(IntParam(params, "delay"));
+  if (scripts.delays.count(method)) Pause(scripts.delays[method]);
   if (params.HasMember("stderr")) fake::WriteRaw(fake::kStderr, fake::Unescape(StringParam(params, "stderr")));
   if (params.HasMember("garbage")) fake::WriteRaw(fake::kStdout, fake::Unescape(StringParam(params, "garbage")));
   for (int i = IntParam(params, "notifications"); i > 0; --i) {
@@ -168,9 +217,9 @@ void HandleRequest(const std::string& method, const rapidjson::Value& params, co
     fake::WriteRaw(fake::kStdout, "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
     fake::Crash();
   }
-  Prelude(params);
+  Prelude(method, params);
   if (method == "fake/silent") return;
-  std::vector<std::string> answers = AskClient(params, id);
+  std::vector<std::string> answers = AskClient(method, params, id);
   WriteAnswer(Answer(method, params, id, answers), IntParam(params, "split"));
 }
 

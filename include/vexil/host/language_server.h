@@ -1,0 +1,60 @@
+// The host's view of one language-server connection, and the two exports that find or
+// create connections by server name.
+#pragma once
+
+#include <vector>
+
+#include "vexil/export.h"
+#include "vexil/host/records.h"
+#include "vexil/protocol/feature_params.h"
+#include "vexil/protocol/feature_results.h"
+
+// One connection. Hosts call through the virtual slots, so the declaration order below is
+// part of the calling contract and must never change (Exit first, RangeFormatting after
+// Formatting). Connections destroy themselves in a successful Exit; hosts never delete them.
+// Every call runs on the host's thread and never throws for protocol or I/O failures:
+// failures give empty results or false, and HaveErrors()/ErrorMessage() tell what went wrong.
+class VEXIL_API xLanguageServer {
+ public:
+  // Sends "exit" and waits about a second for the server to end; true when it did, and
+  // then the connection is gone.
+  virtual bool Exit() = 0;
+  virtual const char* ErrorMessage() = 0;
+  virtual bool HaveErrors() = 0;
+  // The server's process id, -1 when none runs.
+  virtual int Id() = 0;
+  virtual bool Initialize(const xServerInitialise& init) = 0;
+  virtual bool IsRunning() = 0;
+  // Launches the server unless it runs, then initializes it.
+  virtual bool Start(const xServerInitialise& init) = 0;
+  virtual bool Shutdown() = 0;
+  virtual LSP::CompletionList TextDocument_Completion(LSP::CompletionParams* params) = 0;
+  virtual std::vector<LSP::Location> TextDocument_Declaration(LSP::TextDocumentPositionParams* params) = 0;
+  virtual std::vector<LSP::Location> TextDocument_Definition(LSP::TextDocumentPositionParams* params) = 0;
+  virtual std::vector<LSP::Location> TextDocument_TypeDefinition(LSP::TextDocumentPositionParams* params) = 0;
+  virtual std::vector<LSP::Location> TextDocument_Implementation(LSP::TextDocumentPositionParams* params) = 0;
+  // A plain TextDocumentPositionParams is sent with "includeDeclaration": true; a
+  // ReferenceParams is sent as it is.
+  virtual std::vector<LSP::Location> TextDocument_References(LSP::TextDocumentPositionParams* params) = 0;
+  virtual std::vector<LSP::SymbolInformation> TextDocument_DocumentSymbol(LSP::DocumentSymbolParams* params) = 0;
+  virtual std::vector<LSP::SymbolInformation> TextDocument_WorkspaceSymbol(LSP::WorkspaceSymbolParams* params) = 0;
+  virtual LSP::Hover TextDocument_Hover(LSP::TextDocumentPositionParams* params) = 0;
+  virtual LSP::SignatureHelp TextDocument_Signature(LSP::TextDocumentPositionParams* params) = 0;
+  virtual std::vector<LSP::TextEdit> TextDocument_Formatting(LSP::DocumentFormattingParams* params) = 0;
+  virtual std::vector<LSP::TextEdit> TextDocument_RangeFormatting(LSP::DocumentRangeFormattingParams* params) = 0;
+  virtual LSP::WorkspaceEdit TextDocument_Rename(LSP::RenameParams* params) = 0;
+  virtual void TextDocument_DidChange(LSP::DidChangeTextDocumentParams* params) = 0;
+  virtual void TextDocument_DidClose(LSP::DidCloseTextDocumentParams* params) = 0;
+  virtual void TextDocument_DidOpen(LSP::DidOpenTextDocumentParams* params) = 0;
+  virtual void TextDocument_DidSave(LSP::DidSaveTextDocumentParams* params) = 0;
+
+ protected:
+  // Not virtual, so no slot precedes Exit; protected, so hosts end connections with Exit.
+  ~xLanguageServer() = default;
+};
+
+// The connection registered under `name` (exact, case-sensitive), or null. Creates nothing.
+VEXIL_EXTERN_C VEXIL_API xLanguageServer* Vexil_Have(const char* name);
+// The connection registered under `start.name`, or else a new one registered under it.
+// Nothing is launched until Start.
+VEXIL_EXTERN_C VEXIL_API xLanguageServer* Vexil_Start(const xServerStart& start);

@@ -1,0 +1,72 @@
+// LSP::LanguageServer: the connection behind xLanguageServer. It owns the server
+// transport, runs the initialize/shutdown/exit handshake and turns each host call into
+// one protocol message.
+#pragma once
+
+#include "host/trace_line.h"
+#include "transport/server.h"
+#include "vexil/host/language_server.h"
+#include "vexil/protocol/initialize.h"
+
+namespace LSP {
+
+// Final, because Exit deletes the object through its own type and there is no virtual
+// destructor (the host's slot table has none).
+class LanguageServer final : public xLanguageServer {
+ public:
+  explicit LanguageServer(const xServerStart& start);
+  LanguageServer(const LanguageServer&) = delete;
+  LanguageServer& operator=(const LanguageServer&) = delete;
+  ~LanguageServer() = default;
+
+  bool Exit() override;
+  const char* ErrorMessage() override { return server.ErrorMessage(); }
+  bool HaveErrors() override { return server.HaveErrors(); }
+  int Id() override { return server.Id(); }
+  bool Initialize(const xServerInitialise& init) override;
+  bool IsRunning() override { return server.IsRunning(); }
+  bool Start(const xServerInitialise& init) override;
+  bool Shutdown() override;
+
+  CompletionList TextDocument_Completion(CompletionParams* params) override;
+  std::vector<Location> TextDocument_Declaration(TextDocumentPositionParams* params) override;
+  std::vector<Location> TextDocument_Definition(TextDocumentPositionParams* params) override;
+  std::vector<Location> TextDocument_TypeDefinition(TextDocumentPositionParams* params) override;
+  std::vector<Location> TextDocument_Implementation(TextDocumentPositionParams* params) override;
+  std::vector<Location> TextDocument_References(TextDocumentPositionParams* params) override;
+  std::vector<SymbolInformation> TextDocument_DocumentSymbol(DocumentSymbolParams* params) override;
+  std::vector<SymbolInformation> TextDocument_WorkspaceSymbol(WorkspaceSymbolParams* params) override;
+  Hover TextDocument_Hover(TextDocumentPositionParams* params) override;
+  SignatureHelp TextDocument_Signature(TextDocumentPositionParams* params) override;
+  std::vector<TextEdit> TextDocument_Formatting(DocumentFormattingParams* params) override;
+  std::vector<TextEdit> TextDocument_RangeFormatting(DocumentRangeFormattingParams* params) override;
+  WorkspaceEdit TextDocument_Rename(RenameParams* params) override;
+  void TextDocument_DidChange(DidChangeTextDocumentParams* params) override;
+  void TextDocument_DidClose(DidCloseTextDocumentParams* params) override;
+  void TextDocument_DidOpen(DidOpenTextDocumentParams* params) override;
+  void TextDocument_DidSave(DidSaveTextDocumentParams* params) override;
+
+ protected:
+  // Sends "initialized" once the handshake succeeded and the server still runs.
+  bool Initialized();
+  // Removes `server` from the registry (see UnregisterServer for the empty-name rule).
+  static void Erase(xLanguageServer* server);
+
+ private:
+  void TraceInitialise(const xServerInitialise& init) const;
+  // The one request pattern: send `method` with `params`, wait for the reply to its id
+  // and read the reply's result into `holder`, which stays empty on any failure.
+  void Request(const char* method, Params* params, Result& holder);
+  // The request pattern for a holder made here, returned with whatever it was given.
+  template <typename Holder>
+  Holder Ask(const char* method, Params* params, Holder holder = Holder());
+  void Notify(const char* method, Params* params);
+  // Polls until the process has ended or the limit has passed; true when it ended.
+  bool AwaitEnd();
+
+  vexil::xServer server;
+  bool initialized = false;
+  InitializeResult result;
+};
+
+}  // namespace LSP

@@ -1,0 +1,58 @@
+// The `vexil lsp` command line: server arguments up to the first action, positions read
+// from the right of FILE:LINE:COL, and each kind of bad usage refused before any launch.
+#include <gtest/gtest.h>
+
+#include "lsp_options.h"
+
+namespace {
+
+using cli::ActionKind;
+using cli::ParseLspOptions;
+using cli::UsageError;
+using Args = std::vector<std::string>;
+
+TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
+  cli::LspOptions options = ParseLspOptions(
+      {"--trace", "verbose", "--timeout", "900", "--json", "--", "clangd", "--log=error", "--pretty", "--hover",
+       "c:/odd:name.cpp:15:18", "--range-format", "a.cpp:1:2:3:4", "--rename", "a.cpp:5:6:Limit",
+       "--workspace-symbols", "Rect", "--close", "a.cpp"});
+  EXPECT_EQ(options.session.trace, LSP::TraceLevel::Verbose);
+  EXPECT_EQ(options.session.timeout, 900);
+  EXPECT_TRUE(options.json);
+  EXPECT_EQ(options.session.program, "clangd");
+  EXPECT_EQ(options.session.arguments, (Args{"--log=error", "--pretty"}));
+  ASSERT_EQ(options.actions.size(), 5u);
+  const cli::Action& hover = options.actions[0];
+  EXPECT_EQ(hover.kind, ActionKind::Hover);
+  EXPECT_EQ(hover.file, "c:/odd:name.cpp");
+  EXPECT_EQ(hover.line, 15);
+  EXPECT_EQ(hover.column, 18);
+  const cli::Action& range = options.actions[1];
+  EXPECT_EQ(std::vector<int>({range.line, range.column, range.endLine, range.endColumn}), std::vector<int>({1, 2, 3, 4}));
+  EXPECT_EQ(options.actions[2].text, "Limit");
+  EXPECT_EQ(options.actions[2].line, 5);
+  EXPECT_EQ(options.actions[3].text, "Rect");
+  EXPECT_EQ(options.actions[4].kind, ActionKind::Close);
+  EXPECT_EQ(cli::Describe(options.actions[2]), "rename a.cpp:5:6 -> Limit");
+}
+
+TEST(LspOptions, BadUsageIsRefusedWithAReason) {
+  const std::vector<Args> bad = {
+      {"--", "clangd"},                                     // no action
+      {"clangd", "--hover", "a.cpp:1:1"},                   // no "--"
+      {"--trace", "loud", "--", "clangd", "--open", "a.cpp"},
+      {"--timeout", "0", "--", "clangd", "--open", "a.cpp"},
+      {"--", "clangd", "--hover", "a.cpp:1"},               // column missing
+      {"--", "clangd", "--hover", "a.cpp:0:1"},             // lines count from 1
+      {"--", "clangd", "--rename", "a.cpp:1:1:"},           // no new name
+      {"--", "clangd", "--hover"},                          // no operand
+      {"--", "clangd", "--open", "notes.txt"},              // no language for .txt
+      {"--", "s", "1", "2", "3", "4", "5", "6", "7", "8", "--open", "a.cpp"},
+  };
+  for (const Args& arguments : bad) {
+    EXPECT_THROW(ParseLspOptions(arguments), UsageError) << ::testing::PrintToString(arguments);
+  }
+  EXPECT_EQ(ParseLspOptions({"--language", "plaintext", "--", "s", "--open", "notes.txt"}).session.language, "plaintext");
+}
+
+}  // namespace

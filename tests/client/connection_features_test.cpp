@@ -1,0 +1,163 @@
+// The seventeen calls against the fake server: each method on the wire, empty results for
+// null, error and dead-server replies, the references context, and symbols without a URI.
+#include <gtest/gtest.h>
+
+#include <string>
+
+#include "connection_test_support.h"
+
+namespace {
+
+using namespace connection_test;
+using transport_test::FakeStart;
+
+constexpr char kName[] = "features";
+constexpr char kUri[] = "file:///work/a.cpp";
+
+class ConnectionFeatures : public ::testing::Test {
+ protected:
+  void SetUp() override { TraceLog::Clear(); }
+  void TearDown() override { Dispose(kName); }
+
+  xLanguageServer* Started(std::vector<std::string> directives = {}) {
+    xServerStart start = FakeStart(std::move(directives), 2000, LSP::TraceLevel::Messages);
+    start.name = kName;
+    xLanguageServer* server = Vexil_Start(start);
+    EXPECT_TRUE(server->Start(xServerInitialise()));
+    TraceLog::Clear();
+    return server;
+  }
+
+  template <typename P>
+  static P At(int line, int character) {
+    P params;
+    params.textDocument.uri = kUri;
+    params.position = LSP::Position(line, character);
+    return params;
+  }
+};
+
+// Every request answered with null: each comes back empty, under its own method.
+TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
+  std::string nulls;
+  for (const char* method : {"completion", "declaration", "definition", "typeDefinition", "implementation",
+                             "references", "documentSymbol", "hover", "signatureHelp", "formatting",
+                             "rangeFormatting", "rename"}) {
+    nulls += std::string("result=textDocument/") + method + ":null;";
+  }
+  xLanguageServer* server = Started({nulls + "result=workspace/symbol:null"});
+  auto position = At<LSP::TextDocumentPositionParams>(3, 4);
+  auto completion = At<LSP::CompletionParams>(3, 4);
+  auto rename = At<LSP::RenameParams>(3, 4);
+  rename.newName = "Limit";
+  LSP::DocumentSymbolParams symbols;
+  LSP::WorkspaceSymbolParams query;
+  LSP::DocumentFormattingParams formatting;
+  LSP::DocumentRangeFormattingParams rangeFormatting;
+
+  EXPECT_TRUE(server->TextDocument_Completion(&completion).items.empty());
+  EXPECT_TRUE(server->TextDocument_Declaration(&position).empty());
+  EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
+  EXPECT_TRUE(server->TextDocument_TypeDefinition(&position).empty());
+  EXPECT_TRUE(server->TextDocument_Implementation(&position).empty());
+  EXPECT_TRUE(server->TextDocument_References(&position).empty());
+  EXPECT_TRUE(server->TextDocument_DocumentSymbol(&symbols).empty());
+  EXPECT_TRUE(server->TextDocument_WorkspaceSymbol(&query).empty());
+  EXPECT_TRUE(server->TextDocument_Hover(&position).contents.value.empty());
+  EXPECT_TRUE(server->TextDocument_Signature(&position).signatures.empty());
+  EXPECT_TRUE(server->TextDocument_Formatting(&formatting).empty());
+  EXPECT_TRUE(server->TextDocument_RangeFormatting(&rangeFormatting).empty());
+  EXPECT_TRUE(server->TextDocument_Rename(&rename).documentChanges.empty());
+  EXPECT_FALSE(server->HaveErrors());
+
+  std::vector<std::string> methods;
+  for (const std::string& body : SentBodies()) {
+    std::size_t start = body.find("\"method\":\"") + 10;
+    methods.push_back(body.substr(start, body.find('"', start) - start));
+  }
+  EXPECT_EQ(methods, (std::vector<std::string>{
+                         "textDocument/completion", "textDocument/declaration", "textDocument/definition",
+                         "textDocument/typeDefinition", "textDocument/implementation", "textDocument/references",
+                         "textDocument/documentSymbol", "workspace/symbol", "textDocument/hover",
+                         "textDocument/signatureHelp", "textDocument/formatting", "textDocument/rangeFormatting",
+                         "textDocument/rename"}));
+  EXPECT_FALSE(TraceLog::Contains("Timed out"));
+}
+
+TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
+  xLanguageServer* server = Started();
+  LSP::DidOpenTextDocumentParams open;
+  open.textDocument.uri = kUri;
+  open.textDocument.languageId = "cpp";
+  open.textDocument.version = 1;
+  open.textDocument.text = "int x;\n";
+  LSP::DidChangeTextDocumentParams change;
+  change.textDocument = LSP::VersionedTextDocumentIdentifier(kUri, 2);
+  change.contentChanges.emplace_back();
+  change.contentChanges.back().text = "int y;\n";
+  LSP::DidSaveTextDocumentParams save;
+  save.textDocument.uri = kUri;
+  LSP::DidCloseTextDocumentParams close;
+  close.textDocument.uri = kUri;
+  server->TextDocument_DidOpen(&open);
+  server->TextDocument_DidChange(&change);
+  server->TextDocument_DidSave(&save);
+  server->TextDocument_DidClose(&close);
+  EXPECT_EQ(SentBodies(), (std::vector<std::string>{
+      R"({"jsonrpc":"2.0","method":"textDocument/didOpen","params":{"textDocument":{"uri":"file:///work/a.cpp","languageId":"cpp","version":1,"text":"int x;\n"}}})",
+      R"({"jsonrpc":"2.0","method":"textDocument/didChange","params":{"textDocument":{"uri":"file:///work/a.cpp","version":2},"contentChanges":[{"text":"int y;\n"}]}})",
+      R"({"jsonrpc":"2.0","method":"textDocument/didSave","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})",
+      R"({"jsonrpc":"2.0","method":"textDocument/didClose","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})"}));
+  EXPECT_TRUE(TraceLog::Texts("Error").empty());
+}
+
+TEST_F(ConnectionFeatures, PlainReferencesIncludeTheDeclarationAndReferenceParamsGoAsGiven) {
+  xLanguageServer* server = Started({"result=textDocument/references:null"});
+  auto plain = At<LSP::TextDocumentPositionParams>(1, 2);
+  auto explicitContext = At<LSP::ReferenceParams>(1, 2);
+  explicitContext.context.includeDeclaration = false;
+  server->TextDocument_References(&plain);
+  server->TextDocument_References(&explicitContext);
+  std::vector<std::string> bodies = SentBodies();
+  ASSERT_EQ(bodies.size(), 2u);
+  const char* params = R"("params":{"textDocument":{"uri":"file:///work/a.cpp"},"position":{"line":1,"character":2},)";
+  EXPECT_NE(bodies[0].find(std::string(params) + R"("context":{"includeDeclaration":true}}})"), std::string::npos)
+      << bodies[0];
+  EXPECT_NE(bodies[1].find(std::string(params) + R"("context":{"includeDeclaration":false}}})"), std::string::npos)
+      << bodies[1];
+}
+
+TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {
+  xLanguageServer* server = Started({R"(result=textDocument/documentSymbol:[{"name":"Clamp","kind":12,)"
+                                     R"("range":{"start":{"line":16,"character":0},"end":{"line":20,"character":1}},)"
+                                     R"("selectionRange":{"start":{"line":16,"character":4},"end":{"line":16,"character":9}}}])"});
+  LSP::DocumentSymbolParams params;
+  params.textDocument.uri = kUri;
+  std::vector<LSP::SymbolInformation> symbols = server->TextDocument_DocumentSymbol(&params);
+  ASSERT_EQ(symbols.size(), 1u);
+  EXPECT_EQ(symbols[0].name, "Clamp");
+  EXPECT_EQ(symbols[0].location.uri, kUri);
+  EXPECT_EQ(symbols[0].location.range.start.line, 16);
+}
+
+TEST_F(ConnectionFeatures, ErrorRepliesAndDeadServersGiveEmptyResultsAndTheErrorState) {
+  xLanguageServer* server = Started({"error=textDocument/hover"});
+  auto position = At<LSP::TextDocumentPositionParams>(0, 0);
+  EXPECT_TRUE(server->TextDocument_Hover(&position).contents.value.empty());
+  EXPECT_TRUE(server->HaveErrors());
+  EXPECT_STREQ(server->ErrorMessage(), "refused textDocument/hover");
+  server->TextDocument_Definition(&position);
+  EXPECT_FALSE(server->HaveErrors()) << "every request starts with a clean error state";
+
+  kill(server->Id(), SIGKILL);
+  ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
+  TraceLog::Clear();
+  LSP::DidCloseTextDocumentParams close;
+  server->TextDocument_DidClose(&close);
+  EXPECT_TRUE(TraceLog::Lines().empty());
+  EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
+  EXPECT_TRUE(server->HaveErrors());
+  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
+}
+
+}  // namespace

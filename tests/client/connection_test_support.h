@@ -1,0 +1,45 @@
+// Helpers for the connection tests: connections to the fake server made through the
+// exports, and the messages the connection sent, taken from its "Sent" trace lines.
+#pragma once
+
+#include <signal.h>
+
+#include <string>
+#include <vector>
+
+#include "transport_test_support.h"
+#include "vexil/host/language_server.h"
+
+namespace connection_test {
+
+using transport_test::TraceLog;
+
+// The JSON bodies of every message traced as sent, in order.
+inline std::vector<std::string> SentBodies() {
+  std::vector<std::string> bodies;
+  for (const std::string& text : TraceLog::Texts("Message")) {
+    if (text.rfind("\nSent: ", 0) != 0) continue;
+    std::size_t body = text.find("\r\n\r\n") + 4;
+    bodies.push_back(text.substr(body, text.size() - body - 1));
+  }
+  return bodies;
+}
+
+// The sent body whose method is `method`; empty when none was sent.
+inline std::string SentBody(const std::string& method) {
+  for (const std::string& body : SentBodies()) {
+    if (body.find("\"method\":\"" + method + "\"") != std::string::npos) return body;
+  }
+  return "";
+}
+
+// Ends a connection a test left behind: its server is killed first, so Exit succeeds.
+inline void Dispose(const std::string& name) {
+  xLanguageServer* server = Vexil_Have(name.c_str());
+  if (!server) return;
+  if (server->Id() > 0) kill(server->Id(), SIGKILL);
+  transport_test::WaitFor([&] { return !server->IsRunning(); });
+  server->Exit();
+}
+
+}  // namespace connection_test

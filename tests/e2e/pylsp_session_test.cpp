@@ -1,0 +1,73 @@
+// A pylsp session through the shared library over the Python example: the answers jedi
+// gives about the geometry module, then shutdown and exit.
+#include <gtest/gtest.h>
+
+#include <map>
+#include <set>
+
+#include "e2e_support.h"
+
+namespace {
+
+using namespace e2e;
+
+TEST(PylspSession, AnswersAboutTheGeometryModule) {
+  Project project = Python();
+  xLanguageServer* server = Vexil_Start(StartRecord(project, "pylsp-session"));
+  ASSERT_TRUE(server->Start(InitRecord(project)));
+  Open(*server, project, "geometry.py");
+  Open(*server, project, "main.py");
+
+  auto call = At(project, "main.py", Find(project, "main.py", "print(clamp(", 6));
+  LSP::Hover hover = server->TextDocument_Hover(&call);
+  EXPECT_NE(hover.contents.value.find("clamp(value, low, high)"), std::string::npos) << hover.contents.value;
+  EXPECT_NE(hover.contents.value.find("Limit value to the range from low to high."), std::string::npos);
+
+  std::vector<LSP::Location> definition = server->TextDocument_Definition(&call);
+  ASSERT_EQ(definition.size(), 1u);
+  EXPECT_TRUE(EndsWith(definition[0].uri, "/examples/python/geometry.py")) << definition[0].uri;
+  EXPECT_EQ(definition[0].range.start.line, LineOf(project, "geometry.py", "def clamp"));
+
+  // The definition and two calls in geometry.py, the import and one call in main.py.
+  std::map<std::string, int> perFile;
+  for (const LSP::Location& location : server->TextDocument_References(&call)) ++perFile[UriToFile(location.uri.c_str())];
+  EXPECT_EQ(perFile, (std::map<std::string, int>{{Path(project, "geometry.py"), 3}, {Path(project, "main.py"), 2}}));
+
+  auto member = At<LSP::CompletionParams>(project, "main.py", Find(project, "main.py", "rectangle.scale", 10));
+  std::set<std::string> labels;
+  for (const LSP::CompletionItem& item : server->TextDocument_Completion(&member).items) labels.insert(item.label);
+  EXPECT_EQ(labels.count("area()"), 1u);
+  EXPECT_EQ(labels.count("scale(factor)"), 1u);
+
+  auto inCall = At(project, "main.py", Find(project, "main.py", "print(clamp(", 12));
+  LSP::SignatureHelp help = server->TextDocument_Signature(&inCall);
+  ASSERT_EQ(help.signatures.size(), 1u);
+  EXPECT_EQ(help.signatures[0].label, "clamp(value, low, high)");
+
+  LSP::DocumentSymbolParams module;
+  module.textDocument.uri = Uri(project, "geometry.py");
+  std::map<std::string, int> symbolLines;
+  for (const LSP::SymbolInformation& symbol : server->TextDocument_DocumentSymbol(&module)) {
+    symbolLines[symbol.name] = symbol.location.range.start.line;
+  }
+  EXPECT_EQ(symbolLines["Rectangle"], LineOf(project, "geometry.py", "class Rectangle"));
+  EXPECT_EQ(symbolLines["clamp"], LineOf(project, "geometry.py", "def clamp"));
+
+  auto rename = At<LSP::RenameParams>(project, "main.py", call.position);
+  rename.newName = "limit";
+  LSP::WorkspaceEdit change = server->TextDocument_Rename(&rename);
+  std::string renamedModule;
+  for (const LSP::TextDocumentEdit& document : change.documentChanges) {
+    if (EndsWith(document.textDocument.uri, "/geometry.py") && !document.edits.empty()) {
+      renamedModule = document.edits[0].newText;
+    }
+  }
+  EXPECT_NE(renamedModule.find("def limit(value, low, high):"), std::string::npos) << renamedModule;
+  EXPECT_FALSE(server->HaveErrors());
+
+  EXPECT_TRUE(server->Shutdown());
+  EXPECT_TRUE(server->Exit());
+  EXPECT_EQ(Vexil_Have("pylsp-session"), nullptr);
+}
+
+}  // namespace

@@ -1,0 +1,124 @@
+// The readable forms of results, and the helpers the demo shares: where a location is,
+// what a symbol kind is called, and a file's edits as a diff.
+#include "render.h"
+
+#include <algorithm>
+#include <filesystem>
+
+#include "text_edits.h"
+#include "vexil/client/uri.h"
+
+namespace cli {
+namespace {
+
+std::string Relative(const std::string& path) {
+  std::error_code error;
+  std::filesystem::path relative = std::filesystem::relative(path, std::filesystem::current_path(error), error);
+  if (error || relative.empty() || relative.string().rfind("..", 0) == 0) return path;
+  return relative.string();
+}
+
+std::string SourceLine(const std::string& path, int line) {
+  std::vector<std::string> lines = SplitLines(ReadText(path));
+  if (line < 0 || static_cast<std::size_t>(line) >= lines.size()) return "";
+  std::string text = lines[static_cast<std::size_t>(line)];
+  text.erase(0, text.find_first_not_of(" \t"));
+  return text;
+}
+
+void PrintLocations(std::ostream& out, const std::vector<LSP::Location>& locations) {
+  if (locations.empty()) out << "  (none)\n";
+  for (const LSP::Location& location : locations) {
+    out << "  " << Where(location) << ": " << SourceLine(UriToFile(location.uri.c_str()), location.range.start.line)
+        << "\n";
+  }
+}
+
+void PrintSymbols(std::ostream& out, const std::vector<LSP::SymbolInformation>& symbols, int depth) {
+  if (symbols.empty() && depth == 0) out << "  (none)\n";
+  for (const LSP::SymbolInformation& symbol : symbols) {
+    out << std::string(2 + 2 * static_cast<std::size_t>(depth), ' ') << SymbolKindName(symbol.kind) << " "
+        << symbol.name << "  " << Where(symbol.location) << "\n";
+    PrintSymbols(out, symbol.children, depth + 1);
+  }
+}
+
+void PrintSignature(std::ostream& out, const LSP::SignatureHelp& help) {
+  if (help.signatures.empty()) out << "  (none)\n";
+  for (std::size_t i = 0; i < help.signatures.size(); ++i) {
+    const LSP::SignatureInformation& signature = help.signatures[i];
+    bool active = static_cast<int>(i) == help.activeSignature;
+    out << (active ? "* " : "  ") << signature.label << "\n";
+    if (active && help.activeParameter >= 0 &&
+        static_cast<std::size_t>(help.activeParameter) < signature.parameters.size()) {
+      out << "    parameter: " << signature.parameters[static_cast<std::size_t>(help.activeParameter)].label << "\n";
+    }
+    if (!signature.documentation.value.empty()) out << "    " << signature.documentation.value << "\n";
+  }
+}
+
+void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files) {
+  std::string diff;
+  for (const FileEdits& file : files) diff += EditsAsDiff(file);
+  out << (diff.empty() ? "  (no changes)\n" : diff);
+}
+
+}  // namespace
+
+std::string Where(const LSP::Location& location) {
+  return Relative(UriToFile(location.uri.c_str())) + ":" + std::to_string(location.range.start.line + 1) + ":" +
+         std::to_string(location.range.start.character + 1);
+}
+
+const char* SymbolKindName(int kind) {
+  static const char* const names[] = {"file", "module", "namespace", "package", "class", "method", "property",
+                                      "field", "constructor", "enum", "interface", "function", "variable",
+                                      "constant", "string", "number", "boolean", "array", "object", "key",
+                                      "null", "enum member", "struct", "event", "operator", "type parameter"};
+  return kind >= 1 && kind <= 26 ? names[kind - 1] : "symbol";
+}
+
+std::string HoverText(const LSP::Hover& hover) {
+  if (!hover.contents.value.empty()) return hover.contents.value;
+  std::string text;
+  for (const LSP::MarkedString& item : hover.contents.items) text += (text.empty() ? "" : "\n") + item.value;
+  return text;
+}
+
+std::string EditsAsDiff(const FileEdits& file) {
+  std::string before = ReadText(file.path);
+  return UnifiedDiff(Relative(file.path), before, ApplyEdits(before, file.edits));
+}
+
+void PrintReadable(std::ostream& out, const Action& action, const Outcome& outcome) {
+  if (!IsQuery(action.kind)) return;
+  out << Describe(action) << "\n";
+  if (outcome.failed) {
+    out << "  failed: " << outcome.why << "\n";
+    return;
+  }
+  switch (action.kind) {
+    case ActionKind::Hover: {
+      std::string text = HoverText(outcome.hover);
+      out << (text.empty() ? "  (none)" : text) << "\n";
+      break;
+    }
+    case ActionKind::Completion:
+      if (outcome.completion.items.empty()) out << "  (none)\n";
+      for (const LSP::CompletionItem& item : outcome.completion.items) {
+        // clangd pads labels with a blank where an include marker may go.
+        out << "  " << item.label.substr(std::min(item.label.find_first_not_of(' '), item.label.size()))
+            << (item.detail.empty() ? "" : "  : " + item.detail) << "\n";
+      }
+      break;
+    case ActionKind::Signature: PrintSignature(out, outcome.signature); break;
+    case ActionKind::Symbols:
+    case ActionKind::WorkspaceSymbols: PrintSymbols(out, outcome.symbols, 0); break;
+    case ActionKind::Format:
+    case ActionKind::RangeFormat:
+    case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
+    default: PrintLocations(out, outcome.locations); break;
+  }
+}
+
+}  // namespace cli

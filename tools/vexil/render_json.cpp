@@ -1,0 +1,124 @@
+// The JSON form of an action's result, one object per line, written with the library's
+// writer. Lines and columns count from 1 here, as they do on the command line.
+#include "render.h"
+
+#include "vexil/client/uri.h"
+#include "vexil/json/json.h"
+
+namespace cli {
+namespace {
+
+void Point(LSP::xWriter& writer, const char* line, const char* column, const LSP::Position& position) {
+  writer.Int(line, position.line + 1);
+  writer.Int(column, position.character + 1);
+}
+
+void Span(LSP::xWriter& writer, const LSP::Range& range) {
+  Point(writer, "line", "column", range.start);
+  Point(writer, "endLine", "endColumn", range.end);
+}
+
+void Locations(LSP::xWriter& writer, const std::vector<LSP::Location>& locations) {
+  writer.StartArray("result");
+  for (const LSP::Location& location : locations) {
+    writer.StartObject();
+    writer.RequiredString("path", UriToFile(location.uri.c_str()));
+    Span(writer, location.range);
+    writer.EndObject();
+  }
+  writer.EndArray();
+}
+
+void Symbols(LSP::xWriter& writer, const char* name, const std::vector<LSP::SymbolInformation>& symbols) {
+  writer.StartArray(name);
+  for (const LSP::SymbolInformation& symbol : symbols) {
+    writer.StartObject();
+    writer.RequiredString("name", symbol.name);
+    writer.RequiredString("kind", SymbolKindName(symbol.kind));
+    writer.String("container", symbol.containerName);
+    writer.RequiredString("path", UriToFile(symbol.location.uri.c_str()));
+    Span(writer, symbol.location.range);
+    if (!symbol.children.empty()) Symbols(writer, "children", symbol.children);
+    writer.EndObject();
+  }
+  writer.EndArray();
+}
+
+void Edits(LSP::xWriter& writer, const std::vector<FileEdits>& files) {
+  writer.StartArray("result");
+  for (const FileEdits& file : files) {
+    for (const LSP::TextEdit& edit : file.edits) {
+      writer.StartObject();
+      writer.RequiredString("path", file.path);
+      Span(writer, edit.range);
+      writer.RequiredString("newText", edit.newText);
+      writer.EndObject();
+    }
+  }
+  writer.EndArray();
+}
+
+void Completion(LSP::xWriter& writer, const LSP::CompletionList& list) {
+  writer.StartArray("result");
+  for (const LSP::CompletionItem& item : list.items) {
+    writer.StartObject();
+    writer.RequiredString("label", item.label);
+    writer.Int("kind", item.kind);
+    writer.String("detail", item.detail);
+    writer.String("insertText", item.insertText);
+    writer.EndObject();
+  }
+  writer.EndArray();
+}
+
+void Signature(LSP::xWriter& writer, const LSP::SignatureHelp& help) {
+  writer.StartArray("result");
+  for (const LSP::SignatureInformation& signature : help.signatures) {
+    writer.StartObject();
+    writer.RequiredString("label", signature.label);
+    writer.String("documentation", signature.documentation.value);
+    writer.StartArray("parameters");
+    for (const LSP::ParameterInformation& parameter : signature.parameters) writer.String(parameter.label);
+    writer.EndArray();
+    writer.EndObject();
+  }
+  writer.EndArray();
+  writer.Int("activeSignature", help.activeSignature);
+  writer.Int("activeParameter", help.activeParameter);
+}
+
+void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) {
+  switch (action.kind) {
+    case ActionKind::Hover: writer.RequiredString("result", HoverText(outcome.hover)); break;
+    case ActionKind::Completion: Completion(writer, outcome.completion); break;
+    case ActionKind::Signature: Signature(writer, outcome.signature); break;
+    case ActionKind::Symbols:
+    case ActionKind::WorkspaceSymbols: Symbols(writer, "result", outcome.symbols); break;
+    case ActionKind::Format:
+    case ActionKind::RangeFormat:
+    case ActionKind::Rename: Edits(writer, outcome.edits); break;
+    default: Locations(writer, outcome.locations); break;
+  }
+}
+
+}  // namespace
+
+void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome) {
+  if (!IsQuery(action.kind)) return;
+  LSP::xWriter writer;
+  writer.StartObject();
+  writer.RequiredString("action", std::string(OptionName(action.kind)).substr(2));
+  writer.String("file", action.file);
+  if (action.line > 0) {
+    writer.Int("line", action.line);
+    writer.Int("column", action.column);
+  }
+  writer.String("text", action.text);
+  writer.Bool("failed", outcome.failed);
+  if (outcome.failed) writer.RequiredString("error", outcome.why);
+  else Result(writer, action, outcome);
+  writer.EndObject();
+  out << writer.GetString() << "\n";
+}
+
+}  // namespace cli
