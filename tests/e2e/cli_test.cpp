@@ -15,8 +15,9 @@ struct Outcome {
   std::string output;  // stdout, and stderr when asked for
 };
 
-Outcome Vexil(const std::string& arguments, bool withErrors = false) {
-  std::string command = "cd '" VEXIL_EXAMPLES "/cpp' && '" VEXIL_CLI "' " + arguments + (withErrors ? " 2>&1" : " 2>/dev/null");
+// Runs a shell command line in the C++ example directory.
+Outcome Shell(const std::string& script) {
+  std::string command = "cd '" VEXIL_EXAMPLES "/cpp' && " + script;
   Outcome run;
   FILE* pipe = popen(command.c_str(), "r");
   if (!pipe) return run;
@@ -25,6 +26,10 @@ Outcome Vexil(const std::string& arguments, bool withErrors = false) {
   int status = pclose(pipe);
   run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
   return run;
+}
+
+Outcome Vexil(const std::string& arguments, bool withErrors = false) {
+  return Shell("'" VEXIL_CLI "' " + arguments + (withErrors ? " 2>&1" : " 2>/dev/null"));
 }
 
 TEST(CommandLine, LspPrintsLocationsWithTheirSourceAndCompletionsOnePerLine) {
@@ -66,3 +71,21 @@ TEST(CommandLine, ExitStatusTellsFailureFromBadUsage) {
 }
 
 }  // namespace
+
+// `vexil task` runs its command for an edited file with a watched extension and ends
+// cleanly on Ctrl-C. The file is edited until the task has seen it: the directory
+// watcher settles in on a thread of its own.
+TEST(CommandLine, TaskRunsItsCommandForAnEditedFileAndEndsOnInterrupt) {
+  const std::string script =
+      "dir=$(mktemp -d); echo x > \"$dir/a.cpp\"; echo x > \"$dir/a.txt\"; "
+      "'" VEXIL_CLI "' task --ext cpp --run 'echo hit $F' --shell \"$dir\" > \"$dir/out\" 2>&1 & pid=$!; "
+      "for i in $(seq 150); do echo y >> \"$dir/a.cpp\"; echo y >> \"$dir/a.txt\"; "
+      "grep -q 'hit a.cpp' \"$dir/out\" && break; sleep 0.2; done; "
+      "kill -INT $pid; wait $pid; echo \"status=$?\"; cat \"$dir/out\"; rm -rf \"$dir\"";
+  Outcome run = Shell(script);
+  EXPECT_NE(run.output.find("status=0\n"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("Message: hit a.cpp\n"), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("=> Ignoring changes for File: "), std::string::npos) << run.output;
+  EXPECT_NE(run.output.find("vexil: task released\n"), std::string::npos) << run.output;
+  EXPECT_EQ(Vexil("task --run x /tmp").status, 2);
+}

@@ -11,6 +11,7 @@ using Arguments = std::vector<std::string>;
 
 int RunLsp(const Arguments& arguments);
 int RunWatch(const Arguments& arguments);
+int RunTask(const Arguments& arguments);
 int RunDemo(const Arguments& arguments);
 
 }  // namespace cli

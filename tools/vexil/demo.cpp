@@ -1,4 +1,4 @@
-// `vexil demo`: runs the three tours in turn and turns the first failed check into one
+// `vexil demo`: runs the four tours in turn and turns the first failed check into one
 // line and exit status 1.
 #include "demo.h"
 
@@ -64,6 +64,7 @@ int RunDemo(const Arguments& arguments) {
     DemoClangd(examples);
     DemoPylsp(examples);
     DemoWatcher();
+    DemoTask();
   } catch (const DemoFailure& failure) {
     std::fflush(stdout);
     std::fprintf(stderr, "vexil demo failed: %s\n", failure.what());

@@ -3,7 +3,9 @@
 #pragma once
 
 #include <chrono>
+#include <filesystem>
 #include <stdexcept>
+#include <random>
 #include <string>
 
 #include "actions.h"
@@ -28,8 +30,29 @@ Action At(ActionKind kind, const std::string& path, const std::string& needle, s
 // The one-based line of the first `needle` in `path`, 0 when absent.
 int LineOf(const std::string& path, const std::string& needle);
 
+// A directory of its own below the system's temporary one, removed again on the way out.
+class TemporaryDirectory {
+ public:
+  TemporaryDirectory() {
+    std::random_device random;
+    path_ = std::filesystem::temp_directory_path() / ("vexil-demo-" + std::to_string(random()));
+    std::filesystem::create_directories(path_);
+  }
+  TemporaryDirectory(const TemporaryDirectory&) = delete;
+  TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;
+  ~TemporaryDirectory() {
+    std::error_code ignored;
+    std::filesystem::remove_all(path_, ignored);
+  }
+  const std::filesystem::path& Path() const { return path_; }
+
+ private:
+  std::filesystem::path path_;
+};
+
 void DemoClangd(const std::string& examples);
 void DemoPylsp(const std::string& examples);
 void DemoWatcher();
+void DemoTask();
 
 }  // namespace cli

@@ -6,7 +6,6 @@
 #include <fstream>
 #include <memory>
 #include <mutex>
-#include <random>
 #include <vector>
 
 #include "demo.h"
@@ -55,26 +54,6 @@ std::string Await(int type, const std::string& name, const std::string& change) 
   }
   return "";
 }
-
-// A directory of its own below the system's temporary one, removed again on the way out.
-class TemporaryDirectory {
- public:
-  TemporaryDirectory() {
-    std::random_device random;
-    path_ = fs::temp_directory_path() / ("vexil-demo-" + std::to_string(random()));
-    fs::create_directories(path_);
-  }
-  TemporaryDirectory(const TemporaryDirectory&) = delete;
-  TemporaryDirectory& operator=(const TemporaryDirectory&) = delete;
-  ~TemporaryDirectory() {
-    std::error_code ignored;
-    fs::remove_all(path_, ignored);
-  }
-  const fs::path& Path() const { return path_; }
-
- private:
-  fs::path path_;
-};
 
 }  // namespace
 

@@ -5,11 +5,8 @@
 #include <cstdlib>
 
 namespace cli {
-namespace {
 
-constexpr std::size_t kMaxServerArguments = 7;  // the start record's argument slots
-
-int Number(const std::string& text, const std::string& what) {
+int PositiveNumber(const std::string& text, const std::string& what) {
   char* end = nullptr;
   long value = std::strtol(text.c_str(), &end, 10);
   if (text.empty() || *end != '\0' || value < 1 || value > 1000000000) {
@@ -17,6 +14,10 @@ int Number(const std::string& text, const std::string& what) {
   }
   return static_cast<int>(value);
 }
+
+namespace {
+
+constexpr std::size_t kMaxServerArguments = 7;  // the start record's argument slots
 
 // Splits "FILE:A:B..." into the file and `count` numbers, taken from the right so that
 // the file name may itself hold colons.
@@ -36,8 +37,8 @@ std::vector<std::string> SplitFromRight(const std::string& text, std::size_t cou
 void ReadPosition(const std::string& text, Action& action) {
   std::vector<std::string> pieces = SplitFromRight(text, 2, "FILE:LINE:COL");
   action.file = pieces[0];
-  action.line = Number(pieces[1], "LINE");
-  action.column = Number(pieces[2], "COL");
+  action.line = PositiveNumber(pieces[1], "LINE");
+  action.column = PositiveNumber(pieces[2], "COL");
 }
 
 void ReadOperand(const std::string& text, Action& action) {
@@ -55,10 +56,10 @@ void ReadOperand(const std::string& text, Action& action) {
     case ActionKind::RangeFormat: {
       std::vector<std::string> pieces = SplitFromRight(text, 4, "FILE:L1:C1:L2:C2");
       action.file = pieces[0];
-      action.line = Number(pieces[1], "L1");
-      action.column = Number(pieces[2], "C1");
-      action.endLine = Number(pieces[3], "L2");
-      action.endColumn = Number(pieces[4], "C2");
+      action.line = PositiveNumber(pieces[1], "L1");
+      action.column = PositiveNumber(pieces[2], "C1");
+      action.endLine = PositiveNumber(pieces[3], "L2");
+      action.endColumn = PositiveNumber(pieces[4], "C2");
       break;
     }
     case ActionKind::Open: case ActionKind::Symbols: case ActionKind::Format: case ActionKind::Change:
@@ -84,7 +85,7 @@ std::size_t ReadOptions(const std::vector<std::string>& arguments, LspOptions& o
   for (; i < arguments.size() && arguments[i] != "--"; ++i) {
     const std::string& option = arguments[i];
     if (option == "--trace") options.session.trace = TraceLevelOf(value(option));
-    else if (option == "--timeout") options.session.timeout = Number(value(option), "--timeout");
+    else if (option == "--timeout") options.session.timeout = PositiveNumber(value(option), "--timeout");
     else if (option == "--root") options.session.root = value(option);
     else if (option == "--language") options.session.language = value(option);
     else if (option == "--json") options.json = true;

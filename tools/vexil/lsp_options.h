@@ -23,6 +23,9 @@ struct LspOptions {
   std::vector<Action> actions;
 };
 
+// `text` as a number from 1 up; throws UsageError naming `what` otherwise.
+int PositiveNumber(const std::string& text, const std::string& what);
+
 // `arguments` are those after "lsp". Throws UsageError.
 LspOptions ParseLspOptions(const std::vector<std::string>& arguments);
 

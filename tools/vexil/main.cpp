@@ -1,5 +1,5 @@
-// `vexil`, the command-line host of the library: language servers on the command line
-// (`lsp`), directory watching (`watch`) and the show-case behind `make demo` (`demo`).
+// `vexil`, the command-line host of the library: language servers (`lsp`), directory
+// watching (`watch`), watcher tasks (`task`) and the show-case behind `make demo` (`demo`).
 #include <exception>
 #include <iostream>
 
@@ -12,6 +12,7 @@ const char kUsage[] =
     "usage: vexil lsp [--trace off|messages|verbose] [--timeout MS] [--root DIR] [--language ID] [--json]\n"
     "                 -- SERVER [ARGS...] ACTION...\n"
     "       vexil watch DIR...\n"
+    "       vexil task --ext EXT[,EXT...] --run 'COMMAND with $FN tags' [--shell] [--timeout MS] DIR...\n"
     "       vexil demo [--examples DIR]\n"
     "\n"
     "lsp actions, performed in order (lines and columns count from 1):\n"
@@ -23,6 +24,9 @@ const char kUsage[] =
     "  --change FILE (sends its current text)  --save FILE  --close FILE\n"
     "A file is opened before its first action. Trace lines go to stderr; the time-out is\n"
     "5000 ms and the root the current directory unless given.\n"
+    "task: runs the command for each changed file with a watched extension; without --shell\n"
+    "the first word of --run is the program and the rest one argument; tags: $FN full name,\n"
+    "$F file name, $FB base name, $EXT extension, $FDD directory.\n"
     "exit status: 0 success, 1 a server or request failed, 2 bad usage\n";
 
 int Dispatch(const cli::Arguments& arguments) {
@@ -31,6 +35,7 @@ int Dispatch(const cli::Arguments& arguments) {
   cli::Arguments rest(arguments.begin() + 1, arguments.end());
   if (command == "lsp") return cli::RunLsp(rest);
   if (command == "watch") return cli::RunWatch(rest);
+  if (command == "task") return cli::RunTask(rest);
   if (command == "demo") return cli::RunDemo(rest);
   if (command == "--help" || command == "-h" || command == "help") {
     std::cout << kUsage;
