@@ -128,7 +128,9 @@ TEST_F(ConnectionFeatures, PlainReferencesIncludeTheDeclarationAndReferenceParam
 }
 
 TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {
-  xLanguageServer* server = Started({R"(result=textDocument/documentSymbol:[{"name":"Clamp","kind":12,)"
+  // The blank after the first colon makes Windows launches quote the argument whole
+  // instead of taking its quotation marks as the caller's own quoting.
+  xLanguageServer* server = Started({R"(result=textDocument/documentSymbol:[{"name": "Clamp","kind":12,)"
                                      R"("range":{"start":{"line":16,"character":0},"end":{"line":20,"character":1}},)"
                                      R"("selectionRange":{"start":{"line":16,"character":4},"end":{"line":16,"character":9}}}])"});
   LSP::DocumentSymbolParams params;
@@ -149,7 +151,7 @@ TEST_F(ConnectionFeatures, ErrorRepliesAndDeadServersGiveEmptyResultsAndTheError
   server->TextDocument_Definition(&position);
   EXPECT_FALSE(server->HaveErrors()) << "every request starts with a clean error state";
 
-  kill(server->Id(), SIGKILL);
+  vexil_test::KillProcess(server->Id());
   ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
   TraceLog::Clear();
   LSP::DidCloseTextDocumentParams close;

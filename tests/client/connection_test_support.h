@@ -2,11 +2,11 @@
 // exports, and the messages the connection sent, taken from its "Sent" trace lines.
 #pragma once
 
-#include <signal.h>
 
 #include <string>
 #include <vector>
 
+#include "vexil_test/support.h"
 #include "transport_test_support.h"
 #include "vexil/host/language_server.h"
 
@@ -37,7 +37,7 @@ inline std::string SentBody(const std::string& method) {
 inline void Dispose(const std::string& name) {
   xLanguageServer* server = Vexil_Have(name.c_str());
   if (!server) return;
-  if (server->Id() > 0) kill(server->Id(), SIGKILL);
+  vexil_test::KillProcess(server->Id());
   transport_test::WaitFor([&] { return !server->IsRunning(); });
   server->Exit();
 }

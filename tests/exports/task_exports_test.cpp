@@ -1,12 +1,12 @@
 // Uses the task record and both task exports through the shared library alone.
 #include <gtest/gtest.h>
-#include <unistd.h>
 
 #include <filesystem>
 #include <mutex>
 #include <string>
 #include <vector>
 
+#include "vexil_test/support.h"
 #include "vexil/task/watcher_task.h"
 
 namespace {
@@ -32,8 +32,8 @@ TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   const xWatcherOptions copy = options;
   EXPECT_EQ(copy.arguments, "echo $FN");
 
-  std::string pattern = (std::filesystem::temp_directory_path() / "vexil-task-exports-XXXXXX").string();
-  const std::string root = mkdtemp(pattern.data());
+  const vexil_test::TempDirectory directory;
+  const std::string root = directory.Path().string();
   xWatcherTask* task = xWatcher_Task("exported", copy, {root});
   ASSERT_NE(task, nullptr);
   EXPECT_EQ(xWatcher_Have("exported"), task);
@@ -47,5 +47,4 @@ TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
     std::lock_guard<std::mutex> lock(traceMutex);
     EXPECT_FALSE(traced.empty());
   }
-  std::filesystem::remove_all(root);
 }

@@ -2,6 +2,7 @@
 // the host would receive, so tests can wait for them and compare them exactly.
 #pragma once
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
@@ -66,6 +67,13 @@ inline std::vector<TraceLine> Traces() {
 
 inline std::vector<Delivered> Events() {
   return Recorded().shared.Read([] { return Recorded().events; });
+}
+
+inline bool WaitForTrace(const TraceLine& line) {
+  return Recorded().shared.WaitUntil([&] {
+    const auto& traces = Recorded().traces;
+    return std::find(traces.begin(), traces.end(), line) != traces.end();
+  });
 }
 
 inline TraceLine Verbose(const std::string& text) { return {TraceType::Line, "Verbose", text}; }
