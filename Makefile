@@ -27,9 +27,16 @@ build: configure
 test: build
 	$(CTEST) --test-dir $(BUILD)
 
+# The memory check runs first, in a process of its own, so that no other benchmark's freed
+# memory hides its growth. The other repetitions are interleaved at random, so a load that
+# comes and goes on a shared machine weighs on a figure and its floor alike.
 bench: build
 	cmake --build $(BUILD) --target vexil_bench
-	$(BUILD)/bench/vexil_bench
+	$(BUILD)/bench/vexil_bench --benchmark_filter=Memory \
+	  --benchmark_out=$(BUILD)/bench/memory.json --benchmark_out_format=json
+	$(BUILD)/bench/vexil_bench --benchmark_filter=-Memory --benchmark_enable_random_interleaving=true \
+	  --benchmark_out=$(BUILD)/bench/figures.json --benchmark_out_format=json
+	python3 scripts/bench-report.py $(BUILD)/bench/results.json $(BUILD)/bench/figures.json $(BUILD)/bench/memory.json
 
 asan: deps
 	cmake -S . -B build-asan -G $(GENERATOR) -DCMAKE_BUILD_TYPE=Debug -DVEXIL_SANITIZE=address,undefined

@@ -13,6 +13,7 @@ constexpr char kHeader[] = "Content-Length: ";
 constexpr std::size_t kHeaderSize = sizeof kHeader - 1;
 constexpr char kSeparator[] = "\r\n\r\n";
 constexpr std::size_t kSeparatorSize = sizeof kSeparator - 1;
+constexpr std::size_t kReserveLimit = std::size_t{16} << 20;
 
 char Lower(char byte) { return static_cast<char>(std::tolower(static_cast<unsigned char>(byte))); }
 
@@ -106,7 +107,11 @@ void FrameParser::StepSeparator(char byte) {
     match_ = 0;
     return;
   }
-  if (++match_ == kSeparatorSize) state_ = State::Body;
+  if (++match_ < kSeparatorSize) return;
+  state_ = State::Body;
+  // Sized once rather than grown by doubling, which copies a big body twice over; only
+  // up to a bound, since the length is the server's word and nothing has arrived yet.
+  if (remaining_ > 0) body_.reserve(std::min(static_cast<std::size_t>(remaining_), kReserveLimit));
 }
 
 const char* FrameParser::FeedBody(const char* begin, const char* end, std::vector<std::string>& bodies) {
