@@ -13,7 +13,6 @@ constexpr char kHeader[] = "Content-Length: ";
 constexpr std::size_t kHeaderSize = sizeof kHeader - 1;
 constexpr char kSeparator[] = "\r\n\r\n";
 constexpr std::size_t kSeparatorSize = sizeof kSeparator - 1;
-constexpr std::size_t kReserveLimit = std::size_t{16} << 20;
 
 char Lower(char byte) { return static_cast<char>(std::tolower(static_cast<unsigned char>(byte))); }
 

@@ -16,6 +16,8 @@ class FrameParser {
   static constexpr std::size_t kOutputLimit = std::size_t{1} << 20;
   // A longer frame is not believed: its header is stray output like any other text.
   static constexpr std::int64_t kLengthLimit = std::int64_t{1} << 30;
+  // A body is sized from its length up to this; a longer one grows as it arrives.
+  static constexpr std::size_t kReserveLimit = std::size_t{16} << 20;
 
   // Consumes `size` bytes and appends every body they complete to `bodies`, in order.
   void Feed(const char* data, std::size_t size, std::vector<std::string>& bodies);
