@@ -11,7 +11,10 @@ WINDOWS_BUILD   ?= build-windows
 WINDOWS_SYSROOT  = $(abspath $(WINDOWS_BUILD))/sysroot
 WINE_ENV         = WINEPREFIX=$(abspath $(WINDOWS_BUILD))/wineprefix WINEARCH=win32 WINEDEBUG=-all
 
-.PHONY: all deps configure build test demo bench asan tsan clean windows-deps windows test-windows
+FUZZ_BUILD   ?= build-fuzz
+FUZZ_SECONDS ?= 60
+
+.PHONY: all deps configure build test demo bench asan tsan fuzz clean windows-deps windows test-windows
 
 all: build
 
@@ -31,9 +34,16 @@ test: build
 demo: build
 	$(BUILD)/tools/vexil/vexil demo
 
+# The memory check runs first, in a process of its own, so that no other benchmark's freed
+# memory hides its growth. The other repetitions are interleaved at random, so a load that
+# comes and goes on a shared machine weighs on a figure and its floor alike.
 bench: build
 	cmake --build $(BUILD) --target vexil_bench
-	$(BUILD)/bench/vexil_bench
+	$(BUILD)/bench/vexil_bench --benchmark_filter=Memory \
+	  --benchmark_out=$(BUILD)/bench/memory.json --benchmark_out_format=json
+	$(BUILD)/bench/vexil_bench --benchmark_filter=-Memory --benchmark_enable_random_interleaving=true \
+	  --benchmark_out=$(BUILD)/bench/figures.json --benchmark_out_format=json
+	python3 scripts/bench-report.py $(BUILD)/bench/results.json $(BUILD)/bench/figures.json $(BUILD)/bench/memory.json
 
 asan: deps
 	cmake -S . -B build-asan -G $(GENERATOR) -DCMAKE_BUILD_TYPE=Debug -DVEXIL_SANITIZE=address,undefined
@@ -44,6 +54,16 @@ tsan: deps
 	cmake -S . -B build-tsan -G $(GENERATOR) -DCMAKE_BUILD_TYPE=Debug -DVEXIL_SANITIZE=thread
 	cmake --build build-tsan
 	TSAN_OPTIONS=halt_on_error=1:second_deadlock_stack=1 $(CTEST) --test-dir build-tsan
+
+# libFuzzer targets under address and undefined-behaviour sanitizers, built with clang in a
+# directory of their own; each runs FUZZ_SECONDS from the corpus in tests/fuzz/corpus.
+fuzz:
+	scripts/install-fuzz-deps.sh
+	cmake -S . -B $(FUZZ_BUILD) -G $(GENERATOR) -DCMAKE_BUILD_TYPE=RelWithDebInfo \
+	  -DCMAKE_C_COMPILER=clang -DCMAKE_CXX_COMPILER=clang++ \
+	  -DVEXIL_FUZZ=ON -DVEXIL_SANITIZE=address,undefined -DVEXIL_BUILD_BENCH=OFF
+	cmake --build $(FUZZ_BUILD) --target vexil_fuzz
+	scripts/run-fuzz.sh $(FUZZ_BUILD) $(FUZZ_SECONDS)
 
 # The 32-bit Windows DLL, cross-built with mingw-w64; its tests run under wine.
 windows-deps:
@@ -65,4 +85,4 @@ test-windows: windows
 	$(WINE_ENV) $(CTEST) --test-dir $(WINDOWS_BUILD); status=$$?; $(WINE_ENV) wineserver -k; exit $$status
 
 clean:
-	rm -rf $(BUILD) build-asan build-tsan $(WINDOWS_BUILD)
+	rm -rf $(BUILD) build-asan build-tsan $(FUZZ_BUILD) $(WINDOWS_BUILD)

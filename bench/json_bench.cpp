@@ -1,87 +1,93 @@
-// JSON layer throughput: reading a completion-sized reply through the typed accessors
-// beside the JSON library's bare parse, and writing a request with nested structures.
+// The JSON layer beside the JSON library alone: a 1 MiB completion reply read into
+// LSP::CompletionList against RapidJSON's bare parse of the same text, and an
+// InitializeParams request written against RapidJSON writing the same document.
 #include <benchmark/benchmark.h>
 
 #include <string>
 
+#include "bench_replies.h"
 #include "json/rapidjson.h"
+#include "vexil/protocol/feature_results.h"
+#include "vexil/protocol/initialize.h"
 #include "vexil/protocol/message.h"
-#include "vexil/protocol/structures.h"
 
 namespace {
 
-// A reply of `count` location-like items, about 150 bytes each.
-std::string LocationsReply(int count) {
-  std::string text = R"({"jsonrpc":"2.0","id":7,"result":[)";
-  for (int i = 0; i < count; ++i) {
-    if (i) text += ',';
-    text += R"({"uri":"file:///home/user/project/src/module)" + std::to_string(i) +
-            R"(.cpp","range":{"start":{"line":)" + std::to_string(i) +
-            R"(,"character":4},"end":{"line":)" + std::to_string(i) + R"(,"character":12}}})";
-  }
-  return text + "]}";
+constexpr int kRepetitions = 10;
+
+const std::string& CompletionReply() {
+  static const std::string text = bench::Reply(1, bench::CompletionResult(1u << 20));
+  return text;
 }
 
-class Locations : public LSP::Result {
- public:
-  void Read(const LSP::xObject& value) override {
-    for (const LSP::JsonValue& element : value.Value().GetArray()) {
-      items.emplace_back();
-      items.back().Read(LSP::xObject(element));
-    }
-  }
-  using LSP::JsonObject::Read;
-  void Write(LSP::xWriter&) override {}
-  std::vector<LSP::Location> items;
-};
+void SetBytes(benchmark::State& state, const std::string& text) {
+  state.SetBytesProcessed(static_cast<int64_t>(state.iterations()) * static_cast<int64_t>(text.size()));
+}
 
-void BM_BareParse(benchmark::State& state) {
-  const std::string text = LocationsReply(static_cast<int>(state.range(0)));
+void Json_completion_vexil(benchmark::State& state) {
+  const std::string& text = CompletionReply();
+  for (auto _ : state) {
+    LSP::xReader reader;
+    reader.Parse(text);
+    LSP::CompletionList list;
+    LSP::ResponseMessage response(&list);
+    response.Read(reader);
+    benchmark::DoNotOptimize(list.items.data());
+  }
+  SetBytes(state, text);
+}
+
+void Json_completion_floor(benchmark::State& state) {
+  const std::string& text = CompletionReply();
   for (auto _ : state) {
     LSP::JsonDocument document;
     document.Parse(text.c_str(), text.size());
     benchmark::DoNotOptimize(document.HasParseError());
   }
-  state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * text.size()));
+  SetBytes(state, text);
 }
 
-void BM_ReadIntoModel(benchmark::State& state) {
-  const std::string text = LocationsReply(static_cast<int>(state.range(0)));
+// An initialize request as a host sends it: capabilities, options and two folders.
+LSP::InitializeParams Initialize() {
+  LSP::InitializationOptions options(R"({"initializationOptions":{"clangdFileStatus":true,"fallbackFlags":["-std=c++17"]}})");
+  LSP::InitializeParams params(4242, "file:///home/user/project", LSP::TraceLevel::Messages, options);
+  params.workspaceFolders = {{"file:///home/user/project", "project"}, {"file:///home/user/library", "library"}};
+  return params;
+}
+
+void Json_initialize_vexil(benchmark::State& state) {
+  LSP::InitializeParams params = Initialize();
+  std::string text;
   for (auto _ : state) {
-    LSP::xReader reader;
-    reader.Parse(text);
-    Locations result;
-    LSP::ResponseMessage response(&result);
-    response.Read(reader);
-    benchmark::DoNotOptimize(result.items.data());
+    LSP::RequestMessage request("initialize", &params);
+    text = request.ToJSON();
+    benchmark::DoNotOptimize(text.data());
   }
-  state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * text.size()));
+  SetBytes(state, text);
 }
 
-class Edit : public LSP::Params {
- public:
-  void Write(LSP::xWriter& writer) override {
-    writer.Object(document, true);
-    writer.StartArray("contentChanges");
-    writer.Object(change, false);
-    writer.EndArray();
-  }
-  LSP::VersionedTextDocumentIdentifier document{"file:///home/user/project/src/main.cpp", 12};
-  LSP::TextDocumentContentChangeEvent change;
-};
-
-void BM_WriteChange(benchmark::State& state) {
-  Edit params;
-  params.change.text = std::string(static_cast<size_t>(state.range(0)), 'x');
+void Json_initialize_floor(benchmark::State& state) {
+  LSP::InitializeParams params = Initialize();
+  LSP::RequestMessage request("initialize", &params);
+  const std::string text = request.ToJSON();
+  LSP::JsonDocument document;
+  document.Parse(text.c_str(), text.size());
   for (auto _ : state) {
-    LSP::NotificationMessage message("textDocument/didChange", &params);
-    benchmark::DoNotOptimize(message.ToJSON());
+    rapidjson::StringBuffer buffer;
+    rapidjson::Writer<rapidjson::StringBuffer> writer(buffer);
+    document.Accept(writer);
+    benchmark::DoNotOptimize(buffer.GetString());
   }
-  state.SetBytesProcessed(static_cast<int64_t>(state.iterations() * state.range(0)));
+  SetBytes(state, text);
 }
+
+void Figure(benchmark::internal::Benchmark* benchmark) {
+  benchmark->Repetitions(kRepetitions)->ReportAggregatesOnly(true)->Unit(benchmark::kMicrosecond);
+}
+
+BENCHMARK(Json_completion_vexil)->Apply(Figure);
+BENCHMARK(Json_completion_floor)->Apply(Figure);
+BENCHMARK(Json_initialize_vexil)->Apply(Figure);
+BENCHMARK(Json_initialize_floor)->Apply(Figure);
 
 }  // namespace
-
-BENCHMARK(BM_BareParse)->Arg(100)->Arg(7000);
-BENCHMARK(BM_ReadIntoModel)->Arg(100)->Arg(7000);
-BENCHMARK(BM_WriteChange)->Arg(1024)->Arg(1 << 20);

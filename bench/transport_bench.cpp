@@ -1,32 +1,104 @@
-// Round trips to the scripted fake server: a reply must be taken the moment it arrives,
-// so the median round trip stays far below one 100 ms wait (aim: under 10 ms).
+// Round trips to the scripted fake server: xServer (framing, reader thread, reply
+// matching, reading into the result) against a bare round trip over the same kind of
+// pipes, framed by hand and never parsed. The fake server answers with a fixed result.
 #include <benchmark/benchmark.h>
 
-#include "transport/server.h"
+#include <Poco/Pipe.h>
+#include <Poco/Process.h>
+
+#include <memory>
+#include <string>
+
+#include "bare_splitter.h"
+#include "bench_replies.h"
+#include "fake_server.h"
+#include "transport/pipe_io.h"
+#include "vexil/protocol/feature_params.h"
+#include "vexil/protocol/feature_results.h"
 
 namespace {
 
-void RoundTrip(benchmark::State& state) {
-  xServerStart start;
-  start.executable = VEXIL_FAKE_SERVER;
-  start.timeout = 5000;
-  vexil::xServer server(start);
-  if (!server.Start()) {
-    state.SkipWithError("the fake server did not start");
-    return;
-  }
-  for (auto _ : state) {
-    LSP::RequestMessage request("fake/echo", nullptr);
-    LSP::ResponseMessage response(nullptr);
-    server.Write(request);
-    server.Read(request.id, response);
-    if (response.id != request.id) state.SkipWithError("no reply");
-  }
-  LSP::NotificationMessage exit("exit", nullptr);
-  server.Write(exit);
+constexpr int kRepetitions = 10;
+constexpr std::size_t kCompletionBytes = 1u << 20;
+
+const std::string& HoverFile() {
+  static const std::string path = bench::TemporaryFile("hover.json", bench::HoverResult());
+  return path;
 }
 
-// Each repetition is one round trip; the median of twenty is the figure that counts.
-BENCHMARK(RoundTrip)->Iterations(1)->Repetitions(20)->ReportAggregatesOnly(true)->Unit(benchmark::kMillisecond);
+const std::string& CompletionFile() {
+  static const std::string path = bench::TemporaryFile("completion.json", bench::CompletionResult(kCompletionBytes));
+  return path;
+}
+
+// What the host asks: a position in a document.
+template <typename Params>
+Params AtPosition() {
+  Params params;
+  params.textDocument.uri = "file:///home/user/project/src/shapes.cpp";
+  params.position.line = 12;
+  params.position.character = 12;
+  return params;
+}
+
+template <typename Result, typename Params>
+void ThroughServer(benchmark::State& state, const char* method, const std::string& resultFile) {
+  std::unique_ptr<vexil::xServer> server = bench::StartFakeServer("result-file=" + resultFile, 5000);
+  if (!server) return state.SkipWithError("the fake server did not start");
+  Params params = AtPosition<Params>();
+  for (auto _ : state) {
+    LSP::RequestMessage request(method, &params);
+    Result result;
+    LSP::ResponseMessage response(&result);
+    server->Write(request);
+    server->Read(request.id, response);
+    if (response.id != request.id) state.SkipWithError("no reply");
+  }
+  bench::EndFakeServer(*server);
+}
+
+// The same request text, written and answered over bare pipes.
+template <typename Params>
+void Bare(benchmark::State& state, const char* method, const std::string& resultFile) {
+  Poco::Pipe in;
+  Poco::Pipe out;
+  Poco::ProcessHandle server = Poco::Process::launch(VEXIL_FAKE_SERVER, {"result-file=" + resultFile}, &in, &out, nullptr);
+  Params params = AtPosition<Params>();
+  LSP::RequestMessage request(method, &params);
+  const std::string body = request.ToJSON();
+  const std::string framed = "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
+  bench::BareSplitter replies(out.readHandle());
+  for (auto _ : state) {
+    vexil::WriteAll(in, framed.data(), framed.size());
+    benchmark::DoNotOptimize(replies.Next().data());
+  }
+  in.close();  // the fake server ends at the end of its input
+  server.wait();
+}
+
+void RoundTrip_hover_vexil(benchmark::State& state) {
+  ThroughServer<LSP::Hover, LSP::TextDocumentPositionParams>(state, "textDocument/hover", HoverFile());
+}
+
+void RoundTrip_hover_floor(benchmark::State& state) {
+  Bare<LSP::TextDocumentPositionParams>(state, "textDocument/hover", HoverFile());
+}
+
+void RoundTrip_completion_vexil(benchmark::State& state) {
+  ThroughServer<LSP::CompletionList, LSP::CompletionParams>(state, "textDocument/completion", CompletionFile());
+}
+
+void RoundTrip_completion_floor(benchmark::State& state) {
+  Bare<LSP::CompletionParams>(state, "textDocument/completion", CompletionFile());
+}
+
+void Figure(benchmark::internal::Benchmark* benchmark) {
+  benchmark->UseRealTime()->Repetitions(kRepetitions)->ReportAggregatesOnly(true)->Unit(benchmark::kMicrosecond);
+}
+
+BENCHMARK(RoundTrip_hover_vexil)->Apply(Figure);
+BENCHMARK(RoundTrip_hover_floor)->Apply(Figure);
+BENCHMARK(RoundTrip_completion_vexil)->Apply(Figure);
+BENCHMARK(RoundTrip_completion_floor)->Apply(Figure);
 
 }  // namespace

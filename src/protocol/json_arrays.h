@@ -13,6 +13,7 @@ namespace LSP {
 // reported with the caught text and the array's type number.
 template <typename T>
 void ReadArrayElements(const JsonValue& array, std::vector<T>& items) {
+  items.reserve(items.size() + array.Size());  // a completion list can hold thousands of items
   for (const JsonValue& element : array.GetArray()) {
     T item;
     try {

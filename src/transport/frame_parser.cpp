@@ -16,6 +16,19 @@ constexpr std::size_t kSeparatorSize = sizeof kSeparator - 1;
 
 char Lower(char byte) { return static_cast<char>(std::tolower(static_cast<unsigned char>(byte))); }
 
+// Appends `byte`, forgetting the oldest bytes once `text` holds twice `limit`, so the
+// newest `limit` bytes are always there at the cost of an occasional move.
+void AppendKeepingNewest(std::string& text, char byte, std::size_t limit) {
+  text += byte;
+  if (text.size() > 2 * limit) text.erase(0, text.size() - limit);
+}
+
+// The first line end or dropped byte in [begin, end), or `end`.
+const char* LineRunEnd(const char* begin, const char* end) {
+  while (begin < end && *begin != '\r' && *begin != '\n' && *begin != kDroppedByte) ++begin;
+  return begin;
+}
+
 }  // namespace
 
 void FrameParser::Feed(const char* data, std::size_t size, std::vector<std::string>& bodies) {
@@ -34,6 +47,7 @@ void FrameParser::Feed(const char* data, std::size_t size, std::vector<std::stri
 std::string FrameParser::TakeOutput() {
   std::string taken;
   taken.swap(output_);
+  if (taken.size() > kOutputLimit) taken.erase(0, taken.size() - kOutputLimit);
   return taken;
 }
 
@@ -47,7 +61,7 @@ void FrameParser::Step(char byte, std::vector<std::string>& bodies) {
 }
 
 void FrameParser::StepHeader(char byte) {
-  output_ += byte;
+  AppendKeepingNewest(output_, byte, kOutputLimit);
   // The byte that breaks a match is not tried as the start of a new one, so a
   // doubled first letter ("CContent-Length") hides the frame behind it.
   if (Lower(byte) != Lower(kHeader[match_])) {
@@ -59,18 +73,31 @@ void FrameParser::StepHeader(char byte) {
   match_ = 0;
   remaining_ = 0;
   body_.clear();
+  digits_.clear();
 }
 
 void FrameParser::StepLength(char byte) {
   if (std::isdigit(static_cast<unsigned char>(byte))) {
-    // The count wraps like the 32-bit number it is; no bound is applied.
-    remaining_ = static_cast<std::int32_t>(static_cast<std::uint32_t>(remaining_) * 10u +
-                                           static_cast<std::uint32_t>(byte - '0'));
+    std::int64_t length = std::int64_t{remaining_} * 10 + (byte - '0');
+    // Leading zeros can run on forever; only the newest of them could reach the output.
+    AppendKeepingNewest(digits_, byte, kOutputLimit);
+    if (length > kLengthLimit) return RejectLength();
+    remaining_ = static_cast<std::int32_t>(length);
     return;
   }
   state_ = State::Separator;
   match_ = 0;
+  digits_.clear();
   StepSeparator(byte);
+}
+
+void FrameParser::RejectLength() {
+  // The header and its digits stay stray output; the search goes on after them.
+  for (char digit : digits_) AppendKeepingNewest(output_, digit, kOutputLimit);
+  digits_.clear();
+  state_ = State::Header;
+  match_ = 0;
+  remaining_ = 0;
 }
 
 void FrameParser::StepSeparator(char byte) {
@@ -79,7 +106,11 @@ void FrameParser::StepSeparator(char byte) {
     match_ = 0;
     return;
   }
-  if (++match_ == kSeparatorSize) state_ = State::Body;
+  if (++match_ < kSeparatorSize) return;
+  state_ = State::Body;
+  // Sized once rather than grown by doubling, which copies a big body twice over; only
+  // up to a bound, since the length is the server's word and nothing has arrived yet.
+  if (remaining_ > 0) body_.reserve(std::min(static_cast<std::size_t>(remaining_), kReserveLimit));
 }
 
 const char* FrameParser::FeedBody(const char* begin, const char* end, std::vector<std::string>& bodies) {
@@ -106,21 +137,36 @@ void FrameParser::Complete(std::vector<std::string>& bodies) {
 }
 
 void LineSplitter::Feed(const char* data, std::size_t size, std::vector<std::string>& lines) {
-  for (const char* end = data + size; data < end; ++data) {
+  const char* end = data + size;
+  while (data < end) {
     char byte = *data;
-    if (byte == kDroppedByte) continue;
+    if (byte == kDroppedByte) {
+      ++data;
+      continue;
+    }
     if (byte == '\r') {
       carriageReturn_ = true;
+      ++data;
       continue;
     }
     if (carriageReturn_ || byte == '\n') {
       lines.push_back(std::move(line_));
       line_.clear();
       carriageReturn_ = false;
-      if (byte == '\n') continue;
+      if (byte == '\n') {
+        ++data;
+        continue;
+      }
     }
-    line_ += byte;
+    const char* runEnd = LineRunEnd(data, end);
+    Append(data, runEnd);
+    data = runEnd;
   }
+}
+
+void LineSplitter::Append(const char* begin, const char* end) {
+  std::size_t room = kLineLimit - line_.size();
+  line_.append(begin, std::min(room, static_cast<std::size_t>(end - begin)));
 }
 
 }  // namespace vexil

@@ -1,5 +1,6 @@
 // The queue between a pipe reader's thread and its one consumer: completed message
-// bodies or error lines, with a wait that also ends when the reader has finished.
+// bodies or error lines, with a wait that also ends when the reader has finished, and a
+// bound on the memory it holds.
 #pragma once
 
 #include <chrono>
@@ -14,10 +15,21 @@ class MessageQueue {
  public:
   enum class Wait { Taken, TimedOut, Finished };
 
+  // Holds at most `byteLimit` bytes, counted by Footprint: nothing may drain the queue
+  // for a long time (the host sends no request), so the oldest items give way.
+  explicit MessageQueue(std::size_t byteLimit) : byteLimit_(byteLimit) {}
+
+  // What an item costs: its allocation and its place in the queue.
+  static std::size_t Footprint(const std::string& item) { return item.capacity() + sizeof(std::string); }
+
+  // Appends `item`, dropping the oldest items until the queue fits its limit again; the
+  // newest item is kept whatever its size.
   void Push(std::string item);
   // No more items will come: wakes every waiter so it need not sit out its limit.
   void Finish();
   std::size_t Size() const;
+  // The Footprint of everything queued.
+  std::size_t Bytes() const;
   bool TryPop(std::string& item);
   // Takes the front item, waiting up to `limit` for one. Finished means the queue is
   // empty and its producer has ended, so waiting longer cannot help.
@@ -26,9 +38,11 @@ class MessageQueue {
  private:
   bool TakeFront(std::string& item);
 
+  const std::size_t byteLimit_;
   mutable std::mutex mutex_;
   std::condition_variable ready_;
   std::deque<std::string> items_;
+  std::size_t bytes_ = 0;
   bool finished_ = false;
 };
 

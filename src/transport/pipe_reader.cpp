@@ -18,7 +18,10 @@ bool MayNameMethod(const std::string& body) { return body.find("\"method\"") != 
 
 }  // namespace
 
-xPipeReader::xPipeReader(const char* name, Poco::Pipe pipe) : name_(name), pipe_(std::move(pipe)) {}
+xPipeReader::xPipeReader(const char* name, Poco::Pipe pipe) : xPipeReader(name, std::move(pipe), kQueueLimit) {}
+
+xPipeReader::xPipeReader(const char* name, Poco::Pipe pipe, std::size_t queueLimit)
+    : name_(name), pipe_(std::move(pipe)), messages_(queueLimit) {}
 
 void xPipeReader::run() {
   std::vector<char> buffer(kChunkSize);
@@ -79,7 +82,7 @@ void xPipeReader::DispatchMessage(const std::string& body) {
   }
 }
 
-xPipeErrReader::xPipeErrReader(Poco::Pipe pipe) : xPipeReader("strderr", std::move(pipe)) {}
+xPipeErrReader::xPipeErrReader(Poco::Pipe pipe) : xPipeReader("strderr", std::move(pipe), kQueueLimit) {}
 
 void xPipeErrReader::Consume(const char* data, std::size_t size) {
   std::vector<std::string> lines;

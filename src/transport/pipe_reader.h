@@ -48,8 +48,13 @@ class xPipeReader : public Poco::Runnable {
 
   // How long a read waits before it looks at the stop flag again.
   static constexpr int kStopPollMs = 50;
+  // Only notifications and late replies pile up unread: a request's own reply is taken
+  // while the host waits for it.
+  static constexpr std::size_t kQueueLimit = std::size_t{64} << 20;
 
  protected:
+  xPipeReader(const char* name, Poco::Pipe pipe, std::size_t queueLimit);
+
   // Turns one chunk of bytes into queue entries.
   virtual void Consume(const char* data, std::size_t size);
   void Deliver(std::string unit);
@@ -71,6 +76,10 @@ class xPipeReader : public Poco::Runnable {
 // Reads a server's standard error as lines; it keeps no stray output.
 class xPipeErrReader : public xPipeReader {
  public:
+  // Error lines are only drained when a request waits; a server that logs every
+  // request (clangd does) would otherwise grow the host while it is idle.
+  static constexpr std::size_t kQueueLimit = std::size_t{16} << 20;
+
   explicit xPipeErrReader(Poco::Pipe pipe);
 
  protected:

@@ -2,6 +2,7 @@
 // the framing of outgoing messages and the matching of replies to requests.
 #pragma once
 
+#include <memory>
 #include <mutex>
 #include <string>
 #include <vector>
@@ -72,6 +73,9 @@ class xServer {
   const char* Join(const std::vector<std::string>& list, const char* separator);
 
  private:
+  // Reply and HaveId that leave the reply's parsed document in `parsed` / `reader`.
+  std::string Reply(int id, std::unique_ptr<LSP::xReader>& parsed);
+  bool HaveId(int id, const std::string& text, LSP::xReader& reader);
   void WriteMessage(LSP::MessageBase& message);
   void Transmit(const std::string& body, bool reportReaderErrors);
   void ReportReaderErrors() const;

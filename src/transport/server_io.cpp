@@ -2,6 +2,7 @@
 // waiting for a reply by its id, and reading it into the caller's response.
 #include <chrono>
 #include <climits>
+#include <memory>
 #include <stdexcept>
 
 #include "transport/pipe_io.h"
@@ -63,6 +64,11 @@ void xServer::ReportReaderErrors() const {
 }
 
 std::string xServer::Reply(int id) {
+  std::unique_ptr<LSP::xReader> parsed;
+  return Reply(id, parsed);
+}
+
+std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
   lastWaitTicks_ = 0;
   if (!IsRunning()) return "";
   int countdown = timeout_ / 100 + 1;
@@ -81,8 +87,11 @@ std::string xServer::Reply(int id) {
       CancelRequest(id);
       return "";
     }
-    if (HaveId(id, text)) {
+    // A fresh reader for each text: a document keeps the memory of every earlier parse.
+    auto reader = std::make_unique<LSP::xReader>();
+    if (HaveId(id, text, *reader)) {
       tracer_.Message("Reply: %s%s", text.c_str(), LineEnd(text));
+      parsed = std::move(reader);
       return text;
     }
     countdown = Extend(countdown);
@@ -117,8 +126,12 @@ void xServer::CancelRequest(int id) {
 }
 
 bool xServer::HaveId(int id, const std::string& text) {
+  LSP::xReader reader;
+  return HaveId(id, text, reader);
+}
+
+bool xServer::HaveId(int id, const std::string& text, LSP::xReader& reader) {
   try {
-    LSP::xReader reader;
     if (!reader.Parse(text)) {
       tracer_.Message("JSON Parse Failed:\n%s\n", text.c_str());
       return true;
@@ -146,9 +159,10 @@ bool xServer::HaveId(int id, const std::string& text) {
 void xServer::Read(int id, LSP::ResponseMessage& response) {
   try {
     if (!IsRunning()) throw std::runtime_error("A server read was requested but the server is not running.");
-    std::string text = Reply(id);
-    LSP::xReader reader;
-    if (reader.Parse(text)) response.Read(reader);
+    // The reply was parsed once to recognise it; the same document is read here.
+    std::unique_ptr<LSP::xReader> reader;
+    std::string text = Reply(id, reader);
+    if (reader && reader->Error().empty()) response.Read(*reader);
     if (!response.HaveError()) return;
     errorMessage_ = response.ErrorMessage();
     if (response.MethodNotFound()) {

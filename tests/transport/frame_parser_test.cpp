@@ -1,5 +1,6 @@
 // The two splitters on their own: frames cut at every byte, odd headers, the kept
-// quirks (doubled first letter, length 0, byte 0xFF), and error-stream line endings.
+// quirks (doubled first letter, length 0, byte 0xFF), error-stream line endings, and
+// the bounds on what an abusive stream can make them hold.
 #include <gtest/gtest.h>
 
 #include <string>
@@ -105,6 +106,50 @@ TEST(FrameParser, SixteenMebibyteBodyInPipeSizedChunks) {
   EXPECT_EQ(bodies[1], "{}");
 }
 
+TEST(FrameParser, StrayOutputKeepsItsNewestMebibyte) {
+  vexil::FrameParser parser;
+  const std::string tail = "the newest stray bytes";
+  Bodies bodies = FeedAll(parser, std::string(3u << 20, 'n') + tail, 65536);
+  EXPECT_TRUE(bodies.empty());
+  EXPECT_LE(parser.HeldBytes(), 8 * vexil::FrameParser::kOutputLimit);
+  std::string output = parser.TakeOutput();
+  EXPECT_EQ(output.size(), vexil::FrameParser::kOutputLimit);
+  EXPECT_EQ(output.substr(output.size() - tail.size()), tail);
+
+  // Framing goes on as before.
+  EXPECT_EQ(FeedAll(parser, std::string(5u << 20, 'n') + Frame("{}"), 65536), Bodies{"{}"});
+  EXPECT_EQ(parser.TakeOutput(), "");
+}
+
+TEST(FrameParser, LengthsAboveOneGibibyteAreBrokenHeaders) {
+  // Just below the bound the frame is believed and waits for its body.
+  vexil::FrameParser believed;
+  EXPECT_TRUE(FeedAll(believed, "Content-Length: 1073741824\r\n\r\nab", 1).empty());
+  EXPECT_EQ(believed.TakeOutput(), "Content-Length: ");
+
+  // Above it the header stays stray output, and the next frame is found.
+  const std::string broken = "Content-Length: 1073741825\r\n\r\nab";
+  vexil::FrameParser parser;
+  EXPECT_TRUE(FeedAll(parser, broken, 1).empty());
+  EXPECT_EQ(parser.TakeOutput(), broken);
+  EXPECT_EQ(Parse(broken + Frame("{}")), Bodies{"{}"});
+  // A length that would wrap a 32-bit count to 2 does not take the next two bytes.
+  EXPECT_EQ(Parse("Content-Length: 4294967298\r\n\r\nab" + Frame("{}")), Bodies{"{}"});
+  // Leading zeros are digits like any other: they are kept, but only the newest of them.
+  vexil::FrameParser zeros;
+  FeedAll(zeros, "Content-Length: " + std::string(5u << 20, '0') + "2000000000", 65536);
+  EXPECT_LE(zeros.HeldBytes(), 8 * vexil::FrameParser::kOutputLimit);
+  std::string output = zeros.TakeOutput();
+  EXPECT_EQ(output.size(), vexil::FrameParser::kOutputLimit);
+  EXPECT_EQ(output.substr(output.size() - 10), "2000000000");
+}
+
+TEST(FrameParser, ALengthOfZeroKeepsNothingOfWhatItSwallows) {
+  vexil::FrameParser parser;
+  EXPECT_TRUE(FeedAll(parser, "Content-Length: 0\r\n\r\n" + std::string(32u << 20, 'x') + Frame("{}"), 65536).empty());
+  EXPECT_LT(parser.HeldBytes(), 1024u);
+}
+
 TEST(LineSplitter, CarriageReturnLineFeedAndBoth) {
   EXPECT_EQ(Lines("w\r\nx\ny\rz\n"), (std::vector<std::string>{"w", "x", "y", "z"}));
   EXPECT_EQ(Lines("\n\r\n"), (std::vector<std::string>{"", ""}));
@@ -116,6 +161,19 @@ TEST(LineSplitter, CarriageReturnLineFeedAndBoth) {
   splitter.Feed("one\r", 4, lines);
   splitter.Feed("\ntwo\n", 5, lines);
   EXPECT_EQ(lines, (std::vector<std::string>{"one", "two"}));
+}
+
+TEST(LineSplitter, LongLinesAreCutAtSixtyFourKibibytes) {
+  std::string head(vexil::LineSplitter::kLineLimit, 'h');
+  std::string stream = head + std::string(200000, 't') + "\nnext\r\n";
+  vexil::LineSplitter splitter;
+  std::vector<std::string> lines;
+  for (std::size_t at = 0; at < stream.size(); at += 4096) {
+    splitter.Feed(stream.data() + at, std::min<std::size_t>(4096, stream.size() - at), lines);
+  }
+  ASSERT_EQ(lines.size(), 2u);
+  EXPECT_TRUE(lines[0] == head) << lines[0].size();
+  EXPECT_EQ(lines[1], "next");
 }
 
 }  // namespace

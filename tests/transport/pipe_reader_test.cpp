@@ -1,5 +1,6 @@
 // The readers over real pipes: queueing, end of file, stopping while the writer stays
-// silent, the dispatch hook, the error reader's lines, and one big body.
+// silent, the dispatch hook, the error reader's lines, one big body, and the bounds on
+// what their queues hold while nobody takes from them.
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -120,6 +121,45 @@ TEST(PipeReader, SixteenMebibyteBodyThroughAPipe) {
   EXPECT_TRUE(first == body) << "got " << first.size() << " bytes";
   EXPECT_EQ(Pop(reader), "{}");
   writer.join();
+}
+
+// Writes `bytes` (the reader drains the pipe meanwhile), closes the pipe and waits until
+// the reader has taken all of it.
+template <typename Running>
+void Flood(Running& running, const std::string& bytes) {
+  Send(running.pipe, bytes);
+  running.pipe.close(Poco::Pipe::CLOSE_WRITE);
+  running.thread.Join();
+}
+
+// The last item in the queue, which must be the newest one sent.
+std::string Newest(MessageQueue& queue) {
+  std::string item;
+  while (queue.TryPop(item) && queue.Size() > 0) {
+  }
+  return item;
+}
+
+TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
+  RunningReader<vexil::xPipeErrReader> err;
+  std::string lines;
+  for (int i = 0; lines.size() < 40u << 20; ++i) lines += "I[10:00:00.000] log line " + std::to_string(i) + std::string(60, '.') + "\n";
+  lines += "last line\n";
+  Flood(err, lines);
+  EXPECT_LE(err.reader.Messages().Bytes(), vexil::xPipeErrReader::kQueueLimit);
+  EXPECT_GT(err.reader.Messages().Bytes(), vexil::xPipeErrReader::kQueueLimit / 2);
+  EXPECT_EQ(Newest(err.reader.Messages()), "last line");
+
+  RunningReader<vexil::xPipeReader> out("stdout");
+  const std::string notification = Frame(R"({"jsonrpc":"2.0","method":"$/progress","params":{"value":")" +
+                                         std::string(1000, 'p') + R"("}})");
+  std::string frames;
+  while (frames.size() < 100u << 20) frames += notification;
+  frames += Frame(R"({"id":1})");
+  Flood(out, frames);
+  EXPECT_LE(out.reader.Messages().Bytes(), vexil::xPipeReader::kQueueLimit);
+  EXPECT_GT(out.reader.Messages().Bytes(), vexil::xPipeReader::kQueueLimit / 2);
+  EXPECT_EQ(Newest(out.reader.Messages()), R"({"id":1})");
 }
 
 TEST(PipeIo, WritingToAPipeNobodyReadsFailsWithoutSignallingTheProcess) {

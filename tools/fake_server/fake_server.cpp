@@ -12,6 +12,11 @@
 //   error=METHOD              answer METHOD with error -32603 "refused METHOD"
 //   late=METHOD:MS            answer METHOD only after MS milliseconds
 //   ask=METHOD                send METHOD to the client while answering "initialize"
+//   result-file=PATH          answer every request but "shutdown" with the JSON in PATH as its result
+//   flood-stderr=BYTES        write that many bytes of log lines to stderr, as a chatty server does
+//   flood-stdout=BYTES        write that many bytes of text without any header to stdout
+//   flood-notifications=N     send N notifications
+//   flood-done=PATH           create PATH once every flood above is written
 // Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/crash" (half a
 // frame, then killed), "fake/cwd", "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
@@ -21,6 +26,7 @@
 // size (bytes of "data" in the result), split (write the answer in pieces of this size).
 #include <chrono>
 #include <map>
+#include <fstream>
 #include <sstream>
 #include <string>
 #include <thread>
@@ -41,6 +47,7 @@ constexpr unsigned kSafetyLifetimeSeconds = 120;  // never outlive a forgotten t
 
 struct Options {
   bool ignoreExit = false;
+  std::string result;  // the JSON text every request is answered with, when set
 };
 
 // Per-method scripts given as start-up directives, for requests whose params the
@@ -96,6 +103,28 @@ void StartGrandchild(const std::string& linger) {
   std::_Exit(0);
 }
 
+std::string ReadFile(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  std::ostringstream text;
+  text << file.rdbuf();
+  return text.str();
+}
+
+// Writes `total` bytes to `descriptor` as repeats of `pattern`, in pipe-sized writes.
+void Flood(int descriptor, const std::string& pattern, long long total) {
+  std::string block;
+  while (block.size() < 65536) block += pattern;
+  for (long long left = total; left > 0; left -= static_cast<long long>(block.size())) {
+    fake::WriteRaw(descriptor, left < static_cast<long long>(block.size()) ? block.substr(0, static_cast<std::size_t>(left)) : block);
+  }
+}
+
+void SendNotifications(int count) {
+  for (int i = count; i > 0; --i) {
+    Send("{\"jsonrpc\":\"2.0\",\"method\":\"fake/progress\",\"params\":{\"left\":" + std::to_string(i) + "}}");
+  }
+}
+
 void StartUp(const std::string& directive, Options& options) {
   std::string key = directive.substr(0, directive.find('='));
   std::string value = directive.find('=') == std::string::npos ? "" : directive.substr(directive.find('=') + 1);
@@ -113,6 +142,11 @@ void StartUp(const std::string& directive, Options& options) {
   }
   else if (key == "error") scripts.refused.push_back(value);
   else if (key == "ask") scripts.askedOnInitialize.push_back(value);
+  else if (key == "result-file") options.result = ReadFile(value);
+  else if (key == "flood-stderr") Flood(fake::kStderr, "I[12:00:00.000] ASTWorker building file /src/main.cpp version 1 with command\n", std::atoll(value.c_str()));
+  else if (key == "flood-stdout") Flood(fake::kStdout, "progress: indexing file 17 of 2000\n", std::atoll(value.c_str()));
+  else if (key == "flood-notifications") SendNotifications(std::atoi(value.c_str()));
+  else if (key == "flood-done") std::ofstream(value).put('\n');
 }
 
 bool Refused(const std::string& method) {
@@ -174,7 +208,7 @@ std::string Result(const std::string& method, const rapidjson::Value& params, co
 }
 
 std::string Answer(const std::string& method, const rapidjson::Value& params, const std::string& id,
-                   const std::vector<std::string>& answers) {
+                   const std::vector<std::string>& answers, const Options& options) {
   if (params.HasMember("unparsable")) return "this is not json";
   if (Refused(method)) {
     return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"error\":{\"code\":-32603,\"message\":" + Quote("refused " + method) + "}}";
@@ -184,7 +218,8 @@ std::string Answer(const std::string& method, const rapidjson::Value& params, co
     return "{\"jsonrpc\":\"2.0\"," + ErrorId(error, id) + "\"error\":{\"code\":" + std::to_string(IntParam(error, "code")) +
            ",\"message\":" + Quote(StringParam(error, "message")) + "}}";
   }
-  return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"result\":" + Result(method, params, answers) + "}";
+  std::string result = options.result.empty() || method == "shutdown" ? Result(method, params, answers) : options.result;
+  return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"result\":" + result + "}";
 }
 
 void WriteAnswer(const std::string& body, int split) {
@@ -201,9 +236,7 @@ void Prelude(const std::string& method, const rapidjson::Value& params) {
   if (scripts.delays.count(method)) Pause(scripts.delays[method]);
   if (params.HasMember("stderr")) fake::WriteRaw(fake::kStderr, fake::Unescape(StringParam(params, "stderr")));
   if (params.HasMember("garbage")) fake::WriteRaw(fake::kStdout, fake::Unescape(StringParam(params, "garbage")));
-  for (int i = IntParam(params, "notifications"); i > 0; --i) {
-    Send("{\"jsonrpc\":\"2.0\",\"method\":\"fake/progress\",\"params\":{\"left\":" + std::to_string(i) + "}}");
-  }
+  SendNotifications(IntParam(params, "notifications"));
   if (params.HasMember("stale") && params["stale"].IsArray()) {
     for (const rapidjson::Value& stale : params["stale"].GetArray()) {
       Send("{\"jsonrpc\":\"2.0\",\"id\":" + Text(stale) + ",\"result\":null}");
@@ -211,7 +244,8 @@ void Prelude(const std::string& method, const rapidjson::Value& params) {
   }
 }
 
-void HandleRequest(const std::string& method, const rapidjson::Value& params, const std::string& id) {
+void HandleRequest(const std::string& method, const rapidjson::Value& params, const std::string& id,
+                   const Options& options) {
   if (method == "fake/exit") std::_Exit(IntParam(params, "code"));
   if (method == "fake/crash") {
     fake::WriteRaw(fake::kStdout, "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
@@ -220,7 +254,7 @@ void HandleRequest(const std::string& method, const rapidjson::Value& params, co
   Prelude(method, params);
   if (method == "fake/silent") return;
   std::vector<std::string> answers = AskClient(method, params, id);
-  WriteAnswer(Answer(method, params, id, answers), IntParam(params, "split"));
+  WriteAnswer(Answer(method, params, id, answers, options), IntParam(params, "split"));
 }
 
 void Serve(const Options& options) {
@@ -232,7 +266,7 @@ void Serve(const Options& options) {
     std::string method = message.HasMember("method") && message["method"].IsString() ? message["method"].GetString() : "";
     const rapidjson::Value& params = message.HasMember("params") && message["params"].IsObject() ? message["params"] : noParams;
     if (message.HasMember("id")) {
-      HandleRequest(method, params, Text(message["id"]));
+      HandleRequest(method, params, Text(message["id"]), options);
     } else if (method == "exit" && !options.ignoreExit) {
       std::_Exit(0);
     } else {

@@ -1,0 +1,138 @@
+#!/usr/bin/env python3
+"""Prints each benchmark figure beside its floor, with the ratio and the target it meets or
+misses, and writes the Google Benchmark JSON files it reads as one, with that table added
+(as "figures").
+
+Usage: bench-report.py OUTPUT.json INPUT.json...
+Exits 0 whatever the figures are: a missed target is news, not a broken build."""
+import json
+import re
+import sys
+
+# (figure, measured benchmark, floor benchmarks summed, kind, target)
+# kind "time": ratio = measured / floor, lower is better; "rate": ratio = floor / measured
+# time, i.e. measured throughput over the floor's, higher is better.
+FIGURES = [
+    ("framing, 1 KiB bodies", "Framing_vexil/1024", ["Framing_floor/1024"], "rate", None),
+    ("framing, 64 KiB bodies", "Framing_vexil/65536", ["Framing_floor/65536"], "rate", None),
+    ("framing, 16 MiB bodies", "Framing_vexil/16777216", ["Framing_floor/16777216"], "rate", (">=", 0.5)),
+    ("hover round trip", "RoundTrip_hover_vexil", ["RoundTrip_hover_floor"], "time", ("<=", 1.2)),
+    ("1 MiB completion round trip", "RoundTrip_completion_vexil",
+     ["RoundTrip_completion_floor", "Json_completion_floor"], "time", ("<=", 2.0)),
+    ("1 MiB completion into the model", "Json_completion_vexil", ["Json_completion_floor"], "time", None),
+    ("writing InitializeParams", "Json_initialize_vexil", ["Json_initialize_floor"], "time", None),
+]
+
+# (figure, benchmark, counter, limit or None, unit)
+MEMORY = [
+    ("flood while idle: peak growth", "Memory_abusive_server", "peak_growth_MiB", 128, "MiB"),
+    ("flood while idle: growth after it", "Memory_abusive_server", "idle_growth_MiB", 128, "MiB"),
+    ("next request answered (1 = yes)", "Memory_abusive_server", "next_reply_ok", None, ""),
+    ("next request's reply time", "Memory_abusive_server", "next_reply_ms", None, "ms"),
+]
+
+UNIT_SECONDS = {"ns": 1e-9, "us": 1e-6, "ms": 1e-3, "s": 1.0}
+
+
+def base_name(run_name):
+    """The benchmark's name without the decorations Google Benchmark adds."""
+    return re.sub(r"/(repeats:\d+|real_time|manual_time|iterations:\d+)", "", run_name)
+
+
+def medians(benchmarks):
+    """Median real time in seconds of every benchmark run with repetitions."""
+    found = {}
+    for entry in benchmarks:
+        if entry.get("run_type") == "aggregate" and entry.get("aggregate_name") == "median":
+            found[base_name(entry["run_name"])] = entry["real_time"] * UNIT_SECONDS[entry["time_unit"]]
+    return found
+
+
+def counters(benchmarks):
+    """Every counter of the single-run benchmarks, by benchmark name."""
+    found = {}
+    for entry in benchmarks:
+        if entry.get("run_type") == "iteration":
+            found.setdefault(base_name(entry["run_name"]), {}).update(entry)
+    return found
+
+
+def meets(ratio, target):
+    comparison, bound = target
+    return ratio >= bound if comparison == ">=" else ratio <= bound
+
+
+def ratio_rows(times):
+    rows = []
+    for figure, measured, floors, kind, target in FIGURES:
+        if measured not in times or any(f not in times for f in floors):
+            rows.append({"figure": figure, "missing": True})
+            continue
+        floor = sum(times[f] for f in floors)
+        ratio = floor / times[measured] if kind == "rate" else times[measured] / floor
+        rows.append({"figure": figure, "measured_s": times[measured], "floor_s": floor, "kind": kind,
+                     "ratio": ratio, "target": "%s %.1f" % target if target else None,
+                     "met": meets(ratio, target) if target else None})
+    return rows
+
+
+def memory_rows(runs):
+    rows = []
+    for figure, benchmark, counter, limit, unit in MEMORY:
+        value = runs.get(benchmark, {}).get(counter)
+        rows.append({"figure": figure, "value": value, "unit": unit, "limit": limit,
+                     "met": None if limit is None or value is None else value < limit})
+    return rows
+
+
+def verdict(met):
+    return "-" if met is None else ("met" if met else "MISSED")
+
+
+def show_time(row):
+    if row["kind"] == "rate":
+        return "%9.3f ms" % (row["measured_s"] * 1e3), "%9.3f ms" % (row["floor_s"] * 1e3)
+    return "%9.1f us" % (row["measured_s"] * 1e6), "%9.1f us" % (row["floor_s"] * 1e6)
+
+
+def print_table(ratios, memory):
+    print("\n%-34s %12s %12s %7s %9s %7s" % ("figure (median)", "vexil", "floor", "ratio", "target", ""))
+    for row in ratios:
+        if row.get("missing"):
+            print("%-34s %s" % (row["figure"], "not measured"))
+            continue
+        measured, floor = show_time(row)
+        print("%-34s %12s %12s %7.2f %9s %7s" % (row["figure"], measured, floor, row["ratio"],
+                                                 row["target"] or "-", verdict(row["met"])))
+    print("(framing ratios are throughput over the floor's; the others are time over the floor's)")
+    for row in memory:
+        value = "not measured" if row["value"] is None else "%.1f %s" % (row["value"], row["unit"])
+        limit = "< %d %s" % (row["limit"], row["unit"]) if row["limit"] else "-"
+        print("%-34s %12s %12s %7s %9s %7s" % (row["figure"], value, "", "", limit, verdict(row["met"])))
+
+
+def merged(paths):
+    """The first file's context with the benchmarks of all of them."""
+    results = None
+    for path in paths:
+        with open(path) as handle:
+            loaded = json.load(handle)
+        if results is None:
+            results = loaded
+        else:
+            results["benchmarks"] += loaded["benchmarks"]
+    return results
+
+
+def main(path, inputs):
+    results = merged(inputs)
+    ratios = ratio_rows(medians(results["benchmarks"]))
+    memory = memory_rows(counters(results["benchmarks"]))
+    print_table(ratios, memory)
+    results["figures"] = {"ratios": ratios, "memory": memory}
+    with open(path, "w") as handle:
+        json.dump(results, handle, indent=2)
+
+
+if __name__ == "__main__":
+    main(sys.argv[1], sys.argv[2:])
