@@ -2,9 +2,11 @@
 # Installs what the 32-bit Windows build needs: the mingw-w64 cross compiler, wine, and
 # Poco Foundation cross-built from Debian's own source package into a sysroot.
 # Idempotent: installed packages and an existing sysroot are reused.
-# Usage: scripts/install-windows-deps.sh [SYSROOT]   (default: build-windows/sysroot)
+# Usage: scripts/install-windows-deps.sh [--packages-only] [SYSROOT]   (default: build-windows/sysroot)
 set -euo pipefail
 
+packages_only=false
+if [ "${1:-}" = "--packages-only" ]; then packages_only=true; shift; fi
 top=$(cd "$(dirname "$0")/.." && pwd)
 sysroot=$(realpath -m "${1:-$top/build-windows/sysroot}")
 work=$(dirname "$sysroot")/poco-src
@@ -33,6 +35,7 @@ if ! dpkg --print-foreign-architectures | grep -qx i386; then
 fi
 install_packages g++-mingw-w64-i686-posix mingw-w64-i686-dev binutils-mingw-w64-i686 dpkg-dev rapidjson-dev
 install_packages wine wine32:i386
+$packages_only && exit 0
 
 if [ -f "$sysroot/lib/libPocoFoundation.a" ] || [ -f "$sysroot/lib/libPocoFoundationmt.a" ]; then
   echo "install-windows-deps: Poco Foundation already in $sysroot"
