@@ -15,6 +15,7 @@
 #include "vexil/protocol/initialize.h"
 #include "vexil/protocol/feature_params.h"
 #include "vexil/protocol/feature_results.h"
+#include "vexil/protocol/diagnostics.h"
 #include "vexil/client/languages.h"
 #include "vexil/client/uri.h"
 #include "vexil/watch/change_event.h"

@@ -45,6 +45,9 @@ class LanguageServer final : public xLanguageServer {
   void TextDocument_DidClose(DidCloseTextDocumentParams* params) override;
   void TextDocument_DidOpen(DidOpenTextDocumentParams* params) override;
   void TextDocument_DidSave(DidSaveTextDocumentParams* params) override;
+  std::vector<Diagnostic> TextDocument_Diagnostics(const char* uri) override;
+  int DiagnosticsVersion() override { return server.Diagnostics().Version(); }
+  std::vector<Diagnostic> TextDocument_PullDiagnostics(TextDocumentIdentifier* document) override;
 
  protected:
   // Sends "initialized" once the handshake succeeded and the server still runs.
@@ -68,5 +71,11 @@ class LanguageServer final : public xLanguageServer {
   bool initialized = false;
   InitializeResult result;
 };
+
+template <typename Holder>
+Holder LanguageServer::Ask(const char* method, Params* params, Holder holder) {
+  Request(method, params, holder);
+  return holder;
+}
 
 }  // namespace LSP

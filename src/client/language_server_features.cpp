@@ -38,12 +38,6 @@ void LanguageServer::Notify(const char* method, Params* params) {
   server.Write(notification);
 }
 
-template <typename Holder>
-Holder LanguageServer::Ask(const char* method, Params* params, Holder holder) {
-  Request(method, params, holder);
-  return holder;
-}
-
 CompletionList LanguageServer::TextDocument_Completion(CompletionParams* params) {
   return Ask<CompletionList>("textDocument/completion", params);
 }

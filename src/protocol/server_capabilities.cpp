@@ -88,6 +88,7 @@ void ServerCapabilities::Read(const xObject& value) {
   colorProvider.Read(value.Object("colorProvider"));
   documentOnTypeFormattingProvider.Read(value.Object("documentOnTypeFormattingProvider"));
   executeCommandProvider.Read(value.Object("executeCommandProvider"));
+  diagnosticProvider = ReadProvider(value, "diagnosticProvider");
 }
 
 }  // namespace LSP

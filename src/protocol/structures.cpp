@@ -2,9 +2,29 @@
 // their range flattened; change events write the protocol's "range" object.
 #include "vexil/protocol/structures.h"
 
+#include <string>
+
 #include "protocol/json_arrays.h"
 
 namespace LSP {
+namespace {
+
+// clangd, pyright and pylsp's linters name their codes ("undeclared_var_use", "F821"),
+// other servers number them: both are kept as text, and numbers also as numbers. Any
+// other type still raises the type error.
+void ReadCode(const xObject& diagnostic, int& code, std::string& codeText) {
+  xObject member = diagnostic.Object("code");
+  if (member.IsString()) {
+    code = -1;
+    codeText = member.GetString();
+    return;
+  }
+  code = diagnostic.Int("code");
+  codeText = member.IsInt() ? std::to_string(code) : "";
+}
+
+}  // namespace
+
 void Position::Read(const xObject& value) {
   line = value.Int("line");
   character = value.Int("character");
@@ -151,9 +171,10 @@ void SymbolInformation::Write(xWriter& writer) {
 
 void Diagnostic::Read(const xObject& value) {
   range.Read(value.Object("range"));
-  code = value.Int("code");
+  ReadCode(value, code, codeText);
   source = value.String("source");
   message = value.String("message");
+  severity = value.Int("severity");
 }
 
 void Diagnostic::Write(xWriter& writer) {

@@ -11,6 +11,7 @@
 #include <Poco/Pipe.h>
 
 #include "host/trace_line.h"
+#include "transport/diagnostics_store.h"
 #include "transport/pipe_reader.h"
 #include "transport/process.h"
 #include "transport/reader_thread.h"
@@ -59,6 +60,8 @@ class xServer {
   void Timeout(int milliseconds);
   // The folders a "workspace/workspaceFolders" request from the server is answered with.
   void WorkspaceFolders(const std::vector<LSP::WorkspaceFolder>& folders);
+  // The server's diagnostics by document, kept whether or not a request is waiting.
+  DiagnosticsStore& Diagnostics() { return diagnostics_; }
 
  protected:
   // Clears the error state and sends `text`, a message's JSON body, framed.
@@ -91,6 +94,7 @@ class xServer {
   void ReportTimeOut();
   void CancelRequest(int id);
   void Dispatch(LSP::xReader& message);
+  void StoreDiagnostics(const LSP::xObject& notification);
 
   std::string joined_;
   Tracer tracer_;
@@ -112,6 +116,7 @@ class xServer {
   std::mutex writeMutex_;  // one framed message at a time, from the host or the reader
   std::mutex foldersMutex_;  // the host sets the folders while the reader may answer with them
   std::vector<LSP::WorkspaceFolder> folders_;
+  DiagnosticsStore diagnostics_;
   int lastWaitTicks_ = 0;
 };
 

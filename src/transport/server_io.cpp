@@ -24,6 +24,11 @@ bool HasNullOrNoId(const LSP::xObject& message) {
   return !message.HasObject("id") || message.Object("id").IsNull();
 }
 
+bool IsDiagnosticsPublication(const LSP::xObject& message) {
+  return HasNullOrNoId(message) && message.Object("method").IsString() &&
+         message.Object("method").GetString() == "textDocument/publishDiagnostics";
+}
+
 }  // namespace
 
 void xServer::Write(LSP::RequestMessage& message) { WriteMessage(message); }
@@ -182,6 +187,7 @@ void xServer::Read(int id, LSP::ResponseMessage& response) {
 
 void xServer::Dispatch(LSP::xReader& message) {
   LSP::xObject root = message.Root();
+  if (IsDiagnosticsPublication(root)) return StoreDiagnostics(root);
   if (!IsServerRequest(root)) return;
   std::vector<LSP::WorkspaceFolder> folders;
   {
@@ -189,6 +195,18 @@ void xServer::Dispatch(LSP::xReader& message) {
     folders = folders_;
   }
   Transmit(AnswerServerRequest(root, folders), false);
+}
+
+void xServer::StoreDiagnostics(const LSP::xObject& notification) {
+  // A malformed publication is dropped here rather than counted as a failure of the
+  // reader, which every later write would report again.
+  try {
+    LSP::PublishDiagnosticsParams published;
+    published.Read(notification.Object("params"));
+    diagnostics_.Publish(published);
+  } catch (const std::exception& e) {
+    tracer_.Error("Diagnostics Error: %s\n", e.what());
+  }
 }
 
 }  // namespace vexil

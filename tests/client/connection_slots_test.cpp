@@ -47,6 +47,9 @@ TEST(ConnectionSlots, OperationsSitInTheHostsSlotOrder) {
   EXPECT_EQ(Slot(&S::TextDocument_DidClose), 22);
   EXPECT_EQ(Slot(&S::TextDocument_DidOpen), 23);
   EXPECT_EQ(Slot(&S::TextDocument_DidSave), 24);
+  EXPECT_EQ(Slot(&S::TextDocument_Diagnostics), 25);
+  EXPECT_EQ(Slot(&S::DiagnosticsVersion), 26);
+  EXPECT_EQ(Slot(&S::TextDocument_PullDiagnostics), 27);
 }
 
 }  // namespace

@@ -4,6 +4,7 @@
 #include <sys/wait.h>
 
 #include <cstdio>
+#include <fstream>
 #include <string>
 
 #include "e2e_support.h"
@@ -56,6 +57,22 @@ TEST(CommandLine, LspWritesOneJsonObjectPerQueryAndDiffsForRenames) {
                                "+  return shapes::Limit(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n"),
             std::string::npos)
       << rename.output;
+}
+
+// pylsp announces no diagnostic provider, so the command waits for its publication.
+TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormat) {
+  char directory[] = "/tmp/vexil-cli-XXXXXX";
+  ASSERT_NE(mkdtemp(directory), nullptr);
+  std::string file = std::string(directory) + "/broken.py";
+  { std::ofstream(file) << "import os\n\nprint(undefined_name)\n"; }
+  Outcome run = Vexil("lsp -- pylsp --diagnostics " + file);
+  EXPECT_EQ(run.status, 0) << run.output;
+  EXPECT_NE(run.output.find(file + ":3:7: error: undefined name 'undefined_name' [pyflakes]\n"), std::string::npos)
+      << run.output;
+  EXPECT_NE(run.output.find(file + ":1:1: warning: 'os' imported but unused [pyflakes]\n"), std::string::npos)
+      << run.output;
+  std::remove(file.c_str());
+  rmdir(directory);
 }
 
 TEST(CommandLine, ExitStatusTellsFailureFromBadUsage) {

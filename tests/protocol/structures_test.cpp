@@ -45,6 +45,24 @@ TEST(Structures, EditsAndDiagnosticsWriteTheirRangeFlattened) {
   EXPECT_STREQ(diagnostic.Name(), "params");
 }
 
+TEST(Structures, DiagnosticsReadTextCodesAndSeverityButWriteAsBefore) {
+  auto clangd = ReadJson<LSP::Diagnostic>(
+      R"({"range":{"start":{"line":3,"character":8},"end":{"line":3,"character":9}},"severity":1,)"
+      R"("code":"undeclared_var_use","source":"clang","message":"Use of undeclared identifier 'y'"})");
+  EXPECT_EQ(clangd.code, -1);
+  EXPECT_EQ(clangd.codeText, "undeclared_var_use");
+  EXPECT_EQ(clangd.severity, 1);
+  EXPECT_EQ(LSP::ToJsonText(clangd),
+            R"({"start":{"line":3,"character":8},"end":{"line":3,"character":9},"code":-1,"source":"clang",)"
+            R"("message":"Use of undeclared identifier 'y'"})");
+
+  auto bare = ReadJson<LSP::Diagnostic>(R"({"message":"m"})");
+  EXPECT_EQ(bare.severity, -1);
+  EXPECT_EQ(bare.code, -1);
+  EXPECT_EQ(bare.codeText, "");
+  EXPECT_THROW(ReadJson<LSP::Diagnostic>(R"({"code":{"value":1}})"), std::exception);
+}
+
 TEST(Structures, ChangeEventsCarryTheProtocolRangeAndAlwaysTheText) {
   LSP::TextDocumentContentChangeEvent whole;
   EXPECT_STREQ(whole.Name(), "contentChanges");

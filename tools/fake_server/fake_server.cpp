@@ -17,6 +17,7 @@
 //   flood-stdout=BYTES        write that many bytes of text without any header to stdout
 //   flood-notifications=N     send N notifications
 //   flood-done=PATH           create PATH once every flood above is written
+//   diagnose                  publish diagnostics of opened and changed documents (below)
 // Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/crash" (half a
 // frame, then killed), "fake/cwd", "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
@@ -24,6 +25,14 @@
 // (ids answered first), ask (methods sent to the client, each answer awaited),
 // askSameId, error {code, message, id: "same"|"null"|"none"|number}, unparsable,
 // size (bytes of "data" in the result), split (write the answer in pieces of this size).
+// The notification "fake/publish" makes the server publish diagnostics at once, while the
+// client waits for nothing: params.count publications, one document after another of
+// params.documents ("file:///fake/doc<N>.cpp"); publication K for a document reports
+// "pass K" on line K with code "fake<K>", or nothing when params.empty is true.
+// With the start-up directive "diagnose", after each didOpen and each whole-text didChange
+// the server publishes, like a real one, an error "found error" (code "fake-error") for
+// every line of the text that holds "error".
+#include <algorithm>
 #include <chrono>
 #include <map>
 #include <fstream>
@@ -48,6 +57,7 @@ constexpr unsigned kSafetyLifetimeSeconds = 120;  // never outlive a forgotten t
 struct Options {
   bool ignoreExit = false;
   std::string result;  // the JSON text every request is answered with, when set
+  bool diagnose = false;
 };
 
 // Per-method scripts given as start-up directives, for requests whose params the
@@ -133,6 +143,7 @@ void StartUp(const std::string& directive, Options& options) {
   else if (key == "exit") std::_Exit(std::atoi(value.c_str()));
   else if (key == "hang") fake::SleepUntilKilled();
   else if (key == "ignore-exit") options.ignoreExit = true;
+  else if (key == "diagnose") options.diagnose = true;
   else if (key == "grandchild") StartGrandchild(value);
   else if (key == "hold") HoldPipes(value);
   else if (key == "result") scripts.results.insert(MethodAndValue(value));
@@ -244,6 +255,59 @@ void Prelude(const std::string& method, const rapidjson::Value& params) {
   }
 }
 
+std::string PublishedDiagnostic(int pass) {
+  std::string line = std::to_string(pass);
+  return "{\"range\":{\"start\":{\"line\":" + line + ",\"character\":0},\"end\":{\"line\":" + line +
+         ",\"character\":4}},\"severity\":" + std::to_string(pass % 2 + 1) + ",\"code\":\"fake" + line +
+         "\",\"source\":\"fake\",\"message\":\"pass " + line + "\"}";
+}
+
+void SendPublication(const std::string& uri, const std::string& diagnostics) {
+  Send("{\"jsonrpc\":\"2.0\",\"method\":\"textDocument/publishDiagnostics\",\"params\":{\"uri\":" + Quote(uri) +
+       ",\"diagnostics\":[" + diagnostics + "]}}");
+}
+
+void Publish(const rapidjson::Value& params) {
+  int documents = std::max(1, IntParam(params, "documents"));
+  bool empty = params.HasMember("empty") && params["empty"].IsTrue();
+  for (int i = 0; i < IntParam(params, "count"); ++i) {
+    std::string uri = "file:///fake/doc" + std::to_string(i % documents) + ".cpp";
+    SendPublication(uri, empty ? "" : PublishedDiagnostic(i / documents));
+  }
+}
+
+// The text a didOpen or a whole-text didChange carries; false for other changes.
+bool DocumentText(const rapidjson::Value& params, std::string& text) {
+  if (!params.HasMember("textDocument") || !params["textDocument"].IsObject()) return false;
+  const rapidjson::Value& document = params["textDocument"];
+  if (document.HasMember("text") && document["text"].IsString()) {
+    text = document["text"].GetString();
+    return true;
+  }
+  if (!params.HasMember("contentChanges") || !params["contentChanges"].IsArray()) return false;
+  for (const rapidjson::Value& change : params["contentChanges"].GetArray()) {
+    if (change.HasMember("range") || !change.HasMember("text") || !change["text"].IsString()) return false;
+    text = change["text"].GetString();
+  }
+  return true;
+}
+
+void Diagnose(const rapidjson::Value& params) {
+  std::string text;
+  if (!DocumentText(params, text)) return;
+  std::istringstream lines(text);
+  std::string line;
+  std::string diagnostics;
+  for (int number = 0; std::getline(lines, line); ++number) {
+    if (line.find("error") == std::string::npos) continue;
+    std::string at = std::to_string(number);
+    diagnostics += std::string(diagnostics.empty() ? "" : ",") + "{\"range\":{\"start\":{\"line\":" + at +
+                   ",\"character\":0},\"end\":{\"line\":" + at + ",\"character\":5}},\"severity\":1," +
+                   "\"code\":\"fake-error\",\"source\":\"fake\",\"message\":\"found error\"}";
+  }
+  SendPublication(StringParam(params["textDocument"], "uri"), diagnostics);
+}
+
 void HandleRequest(const std::string& method, const rapidjson::Value& params, const std::string& id,
                    const Options& options) {
   if (method == "fake/exit") std::_Exit(IntParam(params, "code"));
@@ -269,8 +333,12 @@ void Serve(const Options& options) {
       HandleRequest(method, params, Text(message["id"]), options);
     } else if (method == "exit" && !options.ignoreExit) {
       std::_Exit(0);
+    } else if (method == "fake/publish") {
+      Publish(params);
     } else {
       received.push_back(body);
+      bool changesText = method == "textDocument/didOpen" || method == "textDocument/didChange";
+      if (options.diagnose && changesText) Diagnose(params);
     }
   }
   if (options.ignoreExit) fake::SleepUntilKilled();

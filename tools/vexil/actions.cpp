@@ -2,6 +2,9 @@
 // connection, and the reply kept with the failure state the library reports.
 #include "actions.h"
 
+#include <chrono>
+#include <thread>
+
 #include "vexil/client/uri.h"
 
 namespace cli {
@@ -31,6 +34,7 @@ constexpr ActionName kActionNames[] = {
     {ActionKind::Change, "--change", false},
     {ActionKind::Save, "--save", false},
     {ActionKind::Close, "--close", false},
+    {ActionKind::Diagnostics, "--diagnostics", true},
 };
 
 const ActionName& NameOf(ActionKind kind) {
@@ -86,6 +90,21 @@ std::vector<FileEdits> Formatting(Session& session, const Action& action) {
   return {{AbsolutePath(action.file), edits}};
 }
 
+// A server that announced a provider answers the pull, which stores its report; any other
+// publishes by itself after didOpen, so the store is watched until the time-out.
+std::vector<LSP::Diagnostic> Diagnostics(Session& session, const Action& action) {
+  xLanguageServer& server = session.Server();
+  int before = server.DiagnosticsVersion();
+  LSP::TextDocumentIdentifier document;
+  document.uri = session.Document(action.file);
+  server.TextDocument_PullDiagnostics(&document);
+  auto deadline = std::chrono::steady_clock::now() + std::chrono::milliseconds(session.Timeout());
+  while (server.DiagnosticsVersion() == before && std::chrono::steady_clock::now() < deadline) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+  }
+  return server.TextDocument_Diagnostics(document.uri.c_str());
+}
+
 void Ask(Session& session, const Action& action, Outcome& outcome) {
   xLanguageServer& server = session.Server();
   switch (action.kind) {
@@ -122,6 +141,7 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
     }
     case ActionKind::Format:
     case ActionKind::RangeFormat: outcome.edits = Formatting(session, action); break;
+    case ActionKind::Diagnostics: outcome.diagnostics = Diagnostics(session, action); break;
     case ActionKind::Rename: {
       auto params = Positioned<LSP::RenameParams>(session, action);
       params.newName = action.text;

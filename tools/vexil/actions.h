@@ -11,7 +11,7 @@ namespace cli {
 
 enum class ActionKind {
   Open, Hover, Definition, Declaration, TypeDefinition, Implementation, References, Completion,
-  Signature, Symbols, WorkspaceSymbols, Format, RangeFormat, Rename, Change, Save, Close
+  Signature, Symbols, WorkspaceSymbols, Format, RangeFormat, Rename, Change, Save, Close, Diagnostics
 };
 
 // Lines and columns count from 1, as people do.
@@ -38,6 +38,7 @@ struct Outcome {
   LSP::SignatureHelp signature;
   std::vector<LSP::SymbolInformation> symbols;
   std::vector<FileEdits> edits;
+  std::vector<LSP::Diagnostic> diagnostics;
   bool failed = false;
   std::string why;  // when failed
 };

@@ -63,7 +63,7 @@ void ReadOperand(const std::string& text, Action& action) {
       break;
     }
     case ActionKind::Open: case ActionKind::Symbols: case ActionKind::Format: case ActionKind::Change:
-    case ActionKind::Save: case ActionKind::Close: action.file = text; break;
+    case ActionKind::Save: case ActionKind::Close: case ActionKind::Diagnostics: action.file = text; break;
     default: ReadPosition(text, action); break;
   }
 }

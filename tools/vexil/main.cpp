@@ -22,6 +22,7 @@ const char kUsage[] =
     "  --symbols FILE             --workspace-symbols QUERY     --format FILE\n"
     "  --range-format FILE:L1:C1:L2:C2  --rename FILE:LINE:COL:NEWNAME\n"
     "  --change FILE (sends its current text)  --save FILE  --close FILE\n"
+    "  --diagnostics FILE (path:line:col: severity: message [source code])\n"
     "A file is opened before its first action. Trace lines go to stderr; the time-out is\n"
     "5000 ms and the root the current directory unless given.\n"
     "task: runs the command for each changed file with a watched extension; without --shell\n"

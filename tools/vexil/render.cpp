@@ -57,6 +57,21 @@ void PrintSignature(std::ostream& out, const LSP::SignatureHelp& help) {
   }
 }
 
+// The compiler's format, which editors and terminals turn into links.
+void PrintDiagnostics(std::ostream& out, const std::string& path, const std::vector<LSP::Diagnostic>& diagnostics) {
+  if (diagnostics.empty()) out << "  (none)\n";
+  for (const LSP::Diagnostic& diagnostic : diagnostics) {
+    std::string origin = diagnostic.source + (diagnostic.source.empty() || diagnostic.codeText.empty() ? "" : " ") +
+                         diagnostic.codeText;
+    LSP::Location location;
+    location.uri = FileToUri(AbsolutePath(path).c_str());
+    location.range = diagnostic.range;
+    out << Where(location) << ": "
+        << SeverityName(diagnostic.severity) << ": " << diagnostic.message
+        << (origin.empty() ? "" : " [" + origin + "]") << "\n";
+  }
+}
+
 void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files) {
   std::string diff;
   for (const FileEdits& file : files) diff += EditsAsDiff(file);
@@ -76,6 +91,11 @@ const char* SymbolKindName(int kind) {
                                       "constant", "string", "number", "boolean", "array", "object", "key",
                                       "null", "enum member", "struct", "event", "operator", "type parameter"};
   return kind >= 1 && kind <= 26 ? names[kind - 1] : "symbol";
+}
+
+const char* SeverityName(int severity) {
+  static const char* const names[] = {"error", "warning", "info", "hint"};
+  return severity >= 1 && severity <= 4 ? names[severity - 1] : "error";
 }
 
 std::string HoverText(const LSP::Hover& hover) {
@@ -117,6 +137,7 @@ void PrintReadable(std::ostream& out, const Action& action, const Outcome& outco
     case ActionKind::Format:
     case ActionKind::RangeFormat:
     case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
+    case ActionKind::Diagnostics: PrintDiagnostics(out, action.file, outcome.diagnostics); break;
     default: PrintLocations(out, outcome.locations); break;
   }
 }

@@ -17,6 +17,8 @@ void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome);
 std::string Where(const LSP::Location& location);
 // The name of a protocol symbol kind ("class", "function", ...), or "symbol".
 const char* SymbolKindName(int kind);
+// "error", "warning", "info" or "hint"; a diagnostic without a severity counts as an error.
+const char* SeverityName(int severity);
 // The hover's text: its markup value, or else its marked strings one after the other.
 std::string HoverText(const LSP::Hover& hover);
 // The text of `path` after the edits, as a unified diff against the file.

@@ -87,6 +87,21 @@ void Signature(LSP::xWriter& writer, const LSP::SignatureHelp& help) {
   writer.Int("activeParameter", help.activeParameter);
 }
 
+void Diagnostics(LSP::xWriter& writer, const std::string& file, const std::vector<LSP::Diagnostic>& diagnostics) {
+  writer.StartArray("result");
+  for (const LSP::Diagnostic& diagnostic : diagnostics) {
+    writer.StartObject();
+    writer.RequiredString("path", AbsolutePath(file));
+    Span(writer, diagnostic.range);
+    writer.RequiredString("severity", SeverityName(diagnostic.severity));
+    writer.RequiredString("message", diagnostic.message);
+    writer.String("source", diagnostic.source);
+    writer.String("code", diagnostic.codeText);
+    writer.EndObject();
+  }
+  writer.EndArray();
+}
+
 void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) {
   switch (action.kind) {
     case ActionKind::Hover: writer.RequiredString("result", HoverText(outcome.hover)); break;
@@ -97,6 +112,7 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
     case ActionKind::Format:
     case ActionKind::RangeFormat:
     case ActionKind::Rename: Edits(writer, outcome.edits); break;
+    case ActionKind::Diagnostics: Diagnostics(writer, action.file, outcome.diagnostics); break;
     default: Locations(writer, outcome.locations); break;
   }
 }

@@ -43,6 +43,8 @@ class Session {
   void Close(const std::string& path);
   // The language id a document of `path` is opened with; "" when none is known.
   std::string LanguageOf(const std::string& path) const;
+  // The reply time-out in milliseconds.
+  int Timeout() const { return options_.timeout; }
 
   // Marks the start of an operation, and afterwards tells whether it failed and why:
   // the server's error state, or else the first error line traced since the mark.

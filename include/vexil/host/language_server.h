@@ -6,6 +6,7 @@
 
 #include "vexil/export.h"
 #include "vexil/host/records.h"
+#include "vexil/protocol/diagnostics.h"
 #include "vexil/protocol/feature_params.h"
 #include "vexil/protocol/feature_results.h"
 
@@ -47,6 +48,15 @@ class VEXIL_API xLanguageServer {
   virtual void TextDocument_DidClose(LSP::DidCloseTextDocumentParams* params) = 0;
   virtual void TextDocument_DidOpen(LSP::DidOpenTextDocumentParams* params) = 0;
   virtual void TextDocument_DidSave(LSP::DidSaveTextDocumentParams* params) = 0;
+  // Later additions: hosts built before them still find every slot above in its place.
+  // The newest diagnostics the server published or reported for the document `uri`;
+  // empty when there are none. Answered from the connection's store, without a message.
+  virtual std::vector<LSP::Diagnostic> TextDocument_Diagnostics(const char* uri) = 0;
+  // Moves on whenever a document's diagnostics change; poll it and fetch on a change.
+  virtual int DiagnosticsVersion() = 0;
+  // Asks a server that announced a diagnostic provider ("textDocument/diagnostic") and
+  // stores the answer; to any other server nothing is sent and the stored ones return.
+  virtual std::vector<LSP::Diagnostic> TextDocument_PullDiagnostics(LSP::TextDocumentIdentifier* document) = 0;
 
  protected:
   // Not virtual, so no slot precedes Exit; protected, so hosts end connections with Exit.

@@ -121,6 +121,8 @@ class VEXIL_API ServerCapabilities : public Params {
   DocumentLinkOptions documentLinkProvider;
   ColorProviderOptions colorProvider;
   ExecuteCommandOptions executeCommandProvider;
+  // Whether the server answers "textDocument/diagnostic" (pulled diagnostics).
+  bool diagnosticProvider = false;
 };
 
 }  // namespace LSP

@@ -154,6 +154,9 @@ class VEXIL_API SymbolInformation : public JsonObject {
   std::vector<SymbolInformation> children;
 };
 
+// A server's error, warning or hint about a range of a document. The protocol allows a
+// number or a string as "code": `codeText` holds either as text, `code` only a number.
+// Tags and related information are not kept. Writing leaves out severity and codeText.
 class VEXIL_API Diagnostic : public Params {
  public:
   void Read(const xObject& value) override;
@@ -164,6 +167,8 @@ class VEXIL_API Diagnostic : public Params {
   int code = -1;
   std::string source;
   std::string message;
+  int severity = -1;  // 1 error, 2 warning, 3 information, 4 hint
+  std::string codeText;
 };
 
 class VEXIL_API MarkedString : public JsonObject {
