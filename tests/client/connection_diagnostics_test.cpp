@@ -86,14 +86,7 @@ class ConnectionDiagnostics : public ::testing::Test {
   void SetUp() override { TraceLog::Clear(); }
   void TearDown() override { Dispose(kName); }
 
-  xLanguageServer* Started(std::vector<std::string> directives) {
-    xServerStart start = FakeStart(std::move(directives), 2000, LSP::TraceLevel::Messages);
-    start.name = kName;
-    xLanguageServer* server = Vexil_Start(start);
-    EXPECT_TRUE(server->Start(xServerInitialise()));
-    TraceLog::Clear();
-    return server;
-  }
+  xLanguageServer* Started(std::vector<std::string> directives) { return StartedFake(kName, std::move(directives)); }
 
   static bool Moves(xLanguageServer& server, int from) {
     return WaitFor([&] { return server.DiagnosticsVersion() != from; });

@@ -9,7 +9,6 @@
 namespace {
 
 using namespace connection_test;
-using transport_test::FakeStart;
 
 constexpr char kName[] = "features";
 constexpr char kUri[] = "file:///work/a.cpp";
@@ -19,14 +18,7 @@ class ConnectionFeatures : public ::testing::Test {
   void SetUp() override { TraceLog::Clear(); }
   void TearDown() override { Dispose(kName); }
 
-  xLanguageServer* Started(std::vector<std::string> directives = {}) {
-    xServerStart start = FakeStart(std::move(directives), 2000, LSP::TraceLevel::Messages);
-    start.name = kName;
-    xLanguageServer* server = Vexil_Start(start);
-    EXPECT_TRUE(server->Start(xServerInitialise()));
-    TraceLog::Clear();
-    return server;
-  }
+  xLanguageServer* Started(std::vector<std::string> directives = {}) { return StartedFake(kName, std::move(directives)); }
 
   template <typename P>
   static P At(int line, int character) {

@@ -2,13 +2,14 @@
 // exports, and the messages the connection sent, taken from its "Sent" trace lines.
 #pragma once
 
+#include <gtest/gtest.h>
 
 #include <string>
 #include <vector>
 
-#include "vexil_test/support.h"
 #include "transport_test_support.h"
 #include "vexil/host/language_server.h"
+#include "vexil_test/support.h"
 
 namespace connection_test {
 
@@ -40,6 +41,17 @@ inline void Dispose(const std::string& name) {
   vexil_test::KillProcess(server->Id());
   transport_test::WaitFor([&] { return !server->IsRunning(); });
   server->Exit();
+}
+
+// Registers the fake server under `name` with these directives and starts it, at the
+// messages level with a 2 s time-out; the trace starts empty after the start.
+inline xLanguageServer* StartedFake(const char* name, std::vector<std::string> directives) {
+  xServerStart start = transport_test::FakeStart(std::move(directives), 2000, LSP::TraceLevel::Messages);
+  start.name = name;
+  xLanguageServer* server = Vexil_Start(start);
+  EXPECT_TRUE(server->Start(xServerInitialise()));
+  TraceLog::Clear();
+  return server;
 }
 
 }  // namespace connection_test
