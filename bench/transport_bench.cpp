@@ -13,6 +13,7 @@
 #include "bench_replies.h"
 #include "fake_server.h"
 #include "transport/pipe_io.h"
+#include "vexil/host/language_server.h"
 #include "vexil/protocol/feature_params.h"
 #include "vexil/protocol/feature_results.h"
 
@@ -84,6 +85,22 @@ void RoundTrip_hover_floor(benchmark::State& state) {
   Bare<LSP::TextDocumentPositionParams>(state, "textDocument/hover", HoverFile());
 }
 
+// The host's view: a registered connection, initialized, asked for hovers through its
+// interface, as an IDE asks while the user moves the mouse.
+void RoundTrip_hover_connection(benchmark::State& state) {
+  xServerStart start;
+  start.executable = VEXIL_FAKE_SERVER;
+  start.argument1 = "result-file=" + HoverFile();
+  start.timeout = 5000;
+  start.name = "bench-hover";
+  xLanguageServer* server = Vexil_Start(start);
+  if (!server->Start(xServerInitialise())) return state.SkipWithError("the connection did not start");
+  auto params = AtPosition<LSP::TextDocumentPositionParams>();
+  for (auto _ : state) benchmark::DoNotOptimize(server->TextDocument_Hover(&params).contents.value.data());
+  server->Shutdown();
+  if (!server->Exit()) state.SkipWithError("the connection did not exit");
+}
+
 void RoundTrip_completion_vexil(benchmark::State& state) {
   ThroughServer<LSP::CompletionList, LSP::CompletionParams>(state, "textDocument/completion", CompletionFile());
 }
@@ -98,6 +115,7 @@ void Figure(benchmark::internal::Benchmark* benchmark) {
 
 BENCHMARK(RoundTrip_hover_vexil)->Apply(Figure);
 BENCHMARK(RoundTrip_hover_floor)->Apply(Figure);
+BENCHMARK(RoundTrip_hover_connection)->Apply(Figure);
 BENCHMARK(RoundTrip_completion_vexil)->Apply(Figure);
 BENCHMARK(RoundTrip_completion_floor)->Apply(Figure);
 

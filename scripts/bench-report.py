@@ -17,6 +17,7 @@ FIGURES = [
     ("framing, 64 KiB bodies", "Framing_vexil/65536", ["Framing_floor/65536"], "rate", None),
     ("framing, 16 MiB bodies", "Framing_vexil/16777216", ["Framing_floor/16777216"], "rate", (">=", 0.5)),
     ("hover round trip", "RoundTrip_hover_vexil", ["RoundTrip_hover_floor"], "time", ("<=", 1.2)),
+    ("hover through the connection", "RoundTrip_hover_connection", ["RoundTrip_hover_floor"], "time", ("<=", 1.2)),
     ("1 MiB completion round trip", "RoundTrip_completion_vexil",
      ["RoundTrip_completion_floor", "Json_completion_floor"], "time", ("<=", 2.0)),
     ("1 MiB completion into the model", "Json_completion_vexil", ["Json_completion_floor"], "time", None),
