@@ -53,10 +53,12 @@ using transport_test::WaitFor;
 
 constexpr char kName[] = "diagnostics";
 constexpr char kUri[] = "file:///work/a.cpp";
+// Each scripted result holds a blank outside its strings, so that Windows launches quote
+// the argument whole instead of taking its quotation marks as the caller's own quoting.
 constexpr char kProvider[] =
-    R"(result=initialize:{"capabilities":{"diagnosticProvider":{"interFileDependencies":false,"workspaceDiagnostics":false}}})";
+    R"(result=initialize:{"capabilities": {"diagnosticProvider":{"interFileDependencies":false,"workspaceDiagnostics":false}}})";
 constexpr char kFullReport[] =
-    R"(result=textDocument/diagnostic:{"kind":"full","resultId":"r7","items":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":3}},"severity":2,"code":12,"source":"json","message":"Trailing comma"}]})";
+    R"(result=textDocument/diagnostic:{"kind": "full","resultId":"r7","items":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":3}},"severity":2,"code":12,"source":"json","message":"Trailing comma"}]})";
 
 
 bool EndsWith(const std::string& text, const std::string& end) {
@@ -145,7 +147,7 @@ TEST_F(ConnectionDiagnostics, PullingStoresAFullReportAndSendsItsIdBack) {
 
 TEST_F(ConnectionDiagnostics, AnUnchangedReportReturnsTheStoredList) {
   xLanguageServer* server =
-      Started({"diagnose", kProvider, R"(result=textDocument/diagnostic:{"kind":"unchanged","resultId":"r1"})"});
+      Started({"diagnose", kProvider, R"(result=textDocument/diagnostic:{"kind": "unchanged","resultId":"r1"})"});
   int before = server->DiagnosticsVersion();
   auto open = Opened("error\n");
   server->TextDocument_DidOpen(&open);
@@ -177,7 +179,7 @@ __attribute__((no_sanitize("vptr"))) void UseAsOlderHost(older_host::OlderLangua
 // A host compiled against the interface without the diagnostics slots still reaches every
 // operation it knows at its old place.
 TEST_F(ConnectionDiagnostics, AHostBuiltBeforeTheNewSlotsStillWorks) {
-  xServerStart start = FakeStart({R"(result=textDocument/hover:{"contents":"old host"})"}, 2000,
+  xServerStart start = FakeStart({R"(result=textDocument/hover:{"contents": "old host"})"}, 2000,
                                  LSP::TraceLevel::Messages);
   start.name = kName;
   auto open = Opened("int a;\n");
