@@ -4,10 +4,43 @@
 
 #include <windows.h>
 
+#include <string>
+
 #include <Poco/Exception.h>
 #include <Poco/Process.h>
 
 namespace vexil {
+namespace {
+
+std::wstring Utf16(const std::string& text) {
+  if (text.empty()) return {};
+  const int size = MultiByteToWideChar(CP_UTF8, 0, text.data(), static_cast<int>(text.size()), nullptr, 0);
+  std::wstring wide(static_cast<std::size_t>(size), L'\0');
+  MultiByteToWideChar(CP_UTF8, 0, text.data(), static_cast<int>(text.size()), wide.data(), size);
+  return wide;
+}
+
+// Why the system refused to create the process. By the time the library's exception is
+// caught the thread's last error is often overwritten (the first exception a thread throws
+// sets up the unwinder, which resets it), so the creation is asked for again, suspended,
+// and the system's answer taken at once. Should it succeed this time, the probe is ended.
+DWORD RepeatedLaunchError(const std::string& executable, const std::string& directory) {
+  std::wstring commandLine = L"\"" + Utf16(executable) + L"\"";
+  const std::wstring where = Utf16(directory);
+  STARTUPINFOW startup{};
+  startup.cb = sizeof startup;
+  PROCESS_INFORMATION probe{};
+  if (!CreateProcessW(nullptr, commandLine.data(), nullptr, nullptr, FALSE, CREATE_SUSPENDED | CREATE_NO_WINDOW,
+                      nullptr, where.empty() ? nullptr : where.c_str(), &startup, &probe)) {
+    return GetLastError();
+  }
+  TerminateProcess(probe.hProcess, 1);
+  CloseHandle(probe.hThread);
+  CloseHandle(probe.hProcess);
+  return ERROR_SUCCESS;
+}
+
+}  // namespace
 
 struct xProcess::Child {
   explicit Child(const Poco::ProcessHandle& handle) : handle(handle) {}
@@ -19,7 +52,13 @@ xProcess::~xProcess() = default;
 
 void xProcess::Launch(const std::string& executable, const std::vector<std::string>& arguments,
                       const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err) {
-  child_ = std::make_unique<Child>(Poco::Process::launch(executable, arguments, directory, in, out, err));
+  try {
+    child_ = std::make_unique<Child>(Poco::Process::launch(executable, arguments, directory, in, out, err));
+  } catch (const Poco::SystemException&) {
+    // LastSystemErrorText() in the caller's handler then names the real cause.
+    SetLastError(RepeatedLaunchError(executable, directory));
+    throw;
+  }
 }
 
 bool xProcess::IsRunning() {

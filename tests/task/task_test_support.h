@@ -2,9 +2,6 @@
 // for trace lines and for processes to be gone, on conditions with generous deadlines.
 #pragma once
 
-#include <signal.h>
-
-#include <cerrno>
 #include <chrono>
 #include <fstream>
 #include <functional>
@@ -76,11 +73,11 @@ inline bool ModifyUntilTraced(const std::string& path, const std::string& title,
   return false;
 }
 
-// Gone means ended and collected: a zombie still answers kill(pid, 0).
+// Gone means ended and collected: a zombie still counts as existing.
 inline bool WaitUntilGone(int pid) {
   const auto end = std::chrono::steady_clock::now() + kDeadline;
   while (std::chrono::steady_clock::now() < end) {
-    if (kill(pid, 0) == -1 && errno == ESRCH) return true;
+    if (!vexil_test::ProcessExists(pid)) return true;
     std::this_thread::sleep_for(std::chrono::milliseconds(20));
   }
   return false;

@@ -1,6 +1,5 @@
-// Watcher commands as real child processes: one that runs on and ends, ones that end at
-// once, one that outlives its time-out, a missing program, and file names the shell
-// would read as commands.
+// Watcher commands through /bin/sh: one that runs on and ends, ones that end at once, one
+// that outlives its time-out, a missing program, and names the shell would interpret.
 #include <gtest/gtest.h>
 #include <signal.h>
 
@@ -9,37 +8,18 @@
 #include <memory>
 #include <string>
 
-#include "task/watcher_event.h"
-#include "task_test_support.h"
+#include "watcher_cmd_fixture.h"
 
 namespace {
 
 using namespace tasktest;
-using vexil::xFileTags;
-using vexil::xWatcherEvent;
 
-const char* const kTask = "build";
-
-class WatcherCommand : public ::testing::Test {
- protected:
-  void SetUp() override { watchtest::ResetRecording(); }
-
-  std::unique_ptr<xWatcherEvent> Event(const std::string& file, const xWatcherOptions& options) {
-    return std::make_unique<xWatcherEvent>(kTask, xFileTags(dir_ / file), options);
-  }
-
-  // A `sleep 30` given `timeout` ms; returns once its time-out has been reported.
-  std::unique_ptr<xWatcherEvent> TimedOutSleep(int timeout) {
-    xWatcherOptions options = Options("30", timeout, false);
-    options.executable = "sleep";
-    auto event = Event("a.cpp", options);
-    EXPECT_TRUE(event->Start());
-    EXPECT_TRUE(WaitForLine(Error("\nWatcher Command: 'build' => Timed out waiting for watcher task to complete.\n")));
-    return event;
-  }
-
-  watchtest::TempDir dir_;
-};
+// `sleep 30` given `timeout` ms.
+xWatcherOptions Sleep30(int timeout) {
+  xWatcherOptions options = Options("30", timeout, false);
+  options.executable = "sleep";
+  return options;
+}
 
 TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   // Still running at the 100 ms look, ended long before its 10 s.
@@ -82,7 +62,7 @@ TEST_F(WatcherCommand, CommandsThatEndAtOnceGetNoWaitingThread) {
 }
 
 TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceItEnds) {
-  auto event = TimedOutSleep(500);
+  auto event = TimedOut(Sleep30(500));
   const int pid = event->Command().Id();
   ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
   EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
@@ -104,7 +84,7 @@ TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceIt
 
 TEST_F(WatcherCommand, ChildGivenUpOnIsCollectedWhileItsCommandIsStillKept) {
   // A task keeps a timed-out command until the next change, which may never come.
-  auto event = TimedOutSleep(300);
+  auto event = TimedOut(Sleep30(300));
   const int pid = event->Command().Id();
   ASSERT_GT(pid, 0);
   kill(pid, SIGKILL);
@@ -124,9 +104,7 @@ TEST_F(WatcherCommand, MissingProgramIsALaunchFailure) {
 }
 
 TEST_F(WatcherCommand, FileNamesTheShellWouldInterpretAreNeverRun) {
-  const std::string refusal =
-      "\nWatcher Command: 'build' => Refused to run: the file name contains characters the command interpreter "
-      "would interpret.\n";
+  const std::string refusal = kRefusal;
   const std::string pwned = dir_ / "pwned";
   for (const char* name : {"x;touch pwned;.cpp", "x$(touch pwned).cpp", "x`touch pwned`.cpp", "x|touch pwned.cpp",
                            "x&&touch pwned&&.cpp", "x\ntouch pwned\n.cpp", "x'.cpp", "x\".cpp", "x>pwned.cpp",

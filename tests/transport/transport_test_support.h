@@ -3,6 +3,8 @@
 #pragma once
 
 
+#include <gtest/gtest.h>
+
 #include <chrono>
 #include <functional>
 #include <mutex>
@@ -145,6 +147,12 @@ inline bool WaitFor(const std::function<bool()>& condition, std::chrono::millise
   }
   return true;
 }
+
+// Each test of a server's start reads only its own trace lines.
+class ServerStart : public ::testing::Test {
+ protected:
+  void SetUp() override { TraceLog::Clear(); }
+};
 
 // Ends a fake server this test started, by its process id.
 inline void KillServer(vexil::xServer& server) {

@@ -1,0 +1,43 @@
+// Starting and closing the fake server on every platform: a server that ends at once is a
+// failed start, and the destructor never waits for what the server left holding its pipes.
+#include <gtest/gtest.h>
+
+#include <chrono>
+#include <memory>
+
+#include "transport_test_support.h"
+
+namespace {
+
+using namespace std::chrono_literals;
+using namespace transport_test;
+using Texts = std::vector<std::string>;
+
+TEST_F(ServerStart, ProcessThatExitsAtOnceIsAFailedStartWithItsOutput) {
+  xServerStart start = FakeStart({"stdout=banner\\n;exit=0"}, 200, LSP::TraceLevel::Messages);
+  vexil::xServer server(start);
+  EXPECT_FALSE(server.Start());
+  EXPECT_EQ(TraceLog::Texts(), (Texts{"banner\n", kFailedStart, kCheckDetails, kHint}));
+  EXPECT_FALSE(server.HaveErrors());
+}
+
+TEST_F(ServerStart, DestructorReturnsPromptlyWhileServerAndGrandchildHoldThePipes) {
+  auto server = std::make_unique<vexil::xServer>(FakeStart({"grandchild=0;hang"}));
+  ASSERT_TRUE(server->Start());
+  const int id = server->Id();
+  auto closing = std::chrono::steady_clock::now();
+  server.reset();
+  EXPECT_LT(std::chrono::steady_clock::now() - closing, 2s);
+  EXPECT_TRUE(vexil_test::ProcessExists(id)) << "the destructor never ends the server";
+  vexil_test::KillProcess(id);
+
+  // The server is gone but what it left behind keeps the pipes for 20 s more: neither
+  // the failed start nor the destructor may wait for it.
+  auto orphaned = std::make_unique<vexil::xServer>(FakeStart({"grandchild=20000;exit=0"}));
+  closing = std::chrono::steady_clock::now();
+  EXPECT_FALSE(orphaned->Start());
+  orphaned.reset();
+  EXPECT_LT(std::chrono::steady_clock::now() - closing, 2s);
+}
+
+}  // namespace

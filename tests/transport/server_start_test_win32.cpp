@@ -1,0 +1,106 @@
+// Launching and closing the server on Windows: directly and through cmd.exe, launch
+// failures with the system's own reason text and its working directory.
+#include <gtest/gtest.h>
+#include <windows.h>
+
+#include <string>
+
+#include "transport_test_support.h"
+
+namespace {
+
+using namespace transport_test;
+using Texts = std::vector<std::string>;
+
+// The build knows the fake by a path with forward slashes (a Unix one under wine), which
+// cmd.exe would read as switches: hand it over in the system's own form.
+std::string FakeServerPath() {
+  char buffer[MAX_PATH];
+  const DWORD size = GetFullPathNameA(VEXIL_FAKE_SERVER, sizeof buffer, buffer, nullptr);
+  return size > 0 && size < sizeof buffer ? std::string(buffer, size) : VEXIL_FAKE_SERVER;
+}
+
+std::string CurrentDirectory() {
+  char buffer[MAX_PATH];
+  const DWORD size = GetCurrentDirectoryA(sizeof buffer, buffer);
+  return std::string(buffer, size);
+}
+
+// What the system's message table says about `code`, as the failed start quotes it.
+std::string ReasonLine(DWORD code) {
+  char* text = nullptr;
+  FormatMessageA(FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS,
+                 nullptr, code, MAKELANGID(LANG_NEUTRAL, SUBLANG_DEFAULT), reinterpret_cast<char*>(&text), 0,
+                 nullptr);
+  std::string reason = text ? text : "";
+  LocalFree(text);
+  return "\nError Reason: " + reason + "\n";
+}
+
+std::string WorkingDirectoryOf(vexil::xServer& server) {
+  TextResult result;
+  Ask(server, "fake/cwd", "", result);
+  return result.cwd;
+}
+
+// Standard error is traced while a reply is awaited, and the two pipes keep no common
+// order: ask until the line has come through.
+bool ErrorLineArrives(vexil::xServer& server, const std::string& line) {
+  return WaitFor([&] {
+    WorkingDirectoryOf(server);
+    return TraceLog::Count("Reply: " + line + "\n") == 1;
+  });
+}
+
+TEST_F(ServerStart, LaunchesDirectlyAndThroughCmdExeInItsOwnDirectory) {
+  vexil_test::TempDirectory directory;
+  const std::string before = CurrentDirectory();
+  xServerStart direct = FakeStart({"stderr=direct\\n"});
+  direct.executable = FakeServerPath();
+  direct.directory = directory.Path().string();
+  vexil::xServer server(direct);
+  ASSERT_TRUE(server.Start());
+  EXPECT_EQ(TraceLog::Texts("Verbose")[0], " Executable: " + direct.executable + "\n");
+  EXPECT_EQ(CurrentDirectory(), before);
+  EXPECT_EQ(WorkingDirectoryOf(server), direct.directory);
+  EXPECT_TRUE(ErrorLineArrives(server, "direct"));
+
+  TraceLog::Clear();
+  xServerStart command = FakeStart({"", "stderr=through\\n"}, 0);
+  command.useCommand = true;
+  command.executable = FakeServerPath();
+  vexil::xServer interpreted(command);
+  ASSERT_TRUE(interpreted.Start());
+  EXPECT_EQ(TraceLog::Texts("Verbose"),
+            (Texts{" Executable: cmd.exe\n", "  Directory: \n",
+                   "  Arguments: /C " + command.executable + " stderr=through\\n \n", "Use Command: Yes\n",
+                   "     Timout: 200 (milliseconds)\n\n"}));
+  // The pipes reach the server through the interpreter, both ways.
+  EXPECT_EQ(WorkingDirectoryOf(interpreted), before);
+  EXPECT_TRUE(ErrorLineArrives(interpreted, "through"));
+}
+
+TEST_F(ServerStart, LaunchFailuresQuoteTheSystemsReasonAndGiveTheHintOnce) {
+  struct Case {
+    std::string executable, directory;
+    DWORD code;
+  } cases[] = {
+      {"C:\\nonexistent\\server.exe", "", ERROR_FILE_NOT_FOUND},
+      {"no-such-language-server-here", "", ERROR_FILE_NOT_FOUND},
+      {FakeServerPath(), "C:\\nonexistent\\dir", ERROR_DIRECTORY},
+  };
+  for (const Case& c : cases) {
+    TraceLog::Clear();
+    xServerStart start = FakeStart({}, 200, LSP::TraceLevel::Messages);
+    start.executable = c.executable;
+    start.directory = c.directory;
+    vexil::xServer server(start);
+    EXPECT_FALSE(server.Start()) << c.executable;
+    EXPECT_TRUE(server.HaveErrors());
+    const std::string error = "Error: " + std::string(server.ErrorMessage()) + "\n\n";
+    EXPECT_EQ(TraceLog::Texts(), (Texts{error, kHint, ReasonLine(c.code), kFailedStart, kCheckDetails}))
+        << c.executable;
+  }
+}
+
+}  // namespace

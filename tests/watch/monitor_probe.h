@@ -1,0 +1,148 @@
+// Records what a change monitor's three handlers were given and lets a test wait for a
+// change, a set of changes or a watch's failure, on every platform's backend.
+#pragma once
+
+#include <gtest/gtest.h>
+
+#include <algorithm>
+#include <cstdint>
+#include <set>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "watch/change_monitor.h"
+#include "watch_fixture.h"
+
+namespace watchtest {
+
+using vexil::ChangeBatch;
+using vexil::ChangeMonitor;
+using Change = std::pair<std::string, unsigned>;
+
+constexpr unsigned kAdded = 1, kRemoved = 2, kOld = 4, kNew = 5;
+
+// A directory's name in a batch ends in the platform's own separator.
+#ifdef _WIN32
+constexpr char kDirectoryMark = '\\';
+#else
+constexpr char kDirectoryMark = '/';
+#endif
+inline std::string DirectoryName(const std::string& name) { return name + kDirectoryMark; }
+
+// Everything the monitor's three handlers were given.
+class Probe {
+ public:
+  vexil::MonitorHandlers Handlers() {
+    return {[this](std::int64_t id, const ChangeBatch& batch) {
+              shared_.Update([&] { batches_.emplace_back(id, batch); });
+            },
+            [this](std::int64_t id) { shared_.Update([&] { watchErrors_.push_back(id); }); },
+            [this](const std::string& text) { shared_.Update([&] { errorTexts_.push_back(text); }); }};
+  }
+
+  bool WaitFor(std::int64_t id, const Change& change) {
+    return shared_.WaitUntil([&] { return SawLocked(id, change); });
+  }
+  bool WaitForAll(std::int64_t id, const std::vector<Change>& changes) {
+    return shared_.WaitUntil([&] {
+      for (const Change& change : changes)
+        if (!SawLocked(id, change)) return false;
+      return true;
+    });
+  }
+  bool WaitForWatchError(std::int64_t id) {
+    return shared_.WaitUntil([&] { return FailedLocked(id); });
+  }
+  // Until `count` distinct names arrived for `id`, or `id` was declared broken.
+  bool WaitUntilSettled(std::int64_t id, std::size_t count) {
+    return shared_.WaitUntil([&] { return FailedLocked(id) || NamesLocked(id).size() >= count; });
+  }
+  bool Saw(std::int64_t id, const Change& change) {
+    return shared_.Read([&] { return SawLocked(id, change); });
+  }
+  // Did one batch carry all of `changes`?
+  bool SawInOneBatch(std::int64_t id, const std::vector<Change>& changes) {
+    return shared_.Read([&] {
+      for (const auto& [batchId, batch] : batches_) {
+        bool all = batchId == id;
+        for (const Change& change : changes) all = all && batch.count(change);
+        if (all) return true;
+      }
+      return false;
+    });
+  }
+  std::size_t EventsFor(std::int64_t id) {
+    return shared_.Read([&] {
+      std::size_t count = 0;
+      for (const auto& entry : batches_) count += entry.first == id ? entry.second.size() : 0;
+      return count;
+    });
+  }
+  std::vector<std::string> ErrorTexts() { return shared_.Read([&] { return errorTexts_; }); }
+  std::vector<std::int64_t> WatchErrors() { return shared_.Read([&] { return watchErrors_; }); }
+  std::set<std::string> NamesFor(std::int64_t id) {
+    return shared_.Read([&] { return NamesLocked(id); });
+  }
+ private:
+  bool FailedLocked(std::int64_t id) const {
+    return std::find(watchErrors_.begin(), watchErrors_.end(), id) != watchErrors_.end();
+  }
+  std::set<std::string> NamesLocked(std::int64_t id) const {
+    std::set<std::string> names;
+    for (const auto& [batchId, batch] : batches_)
+      for (const Change& change : batch)
+        if (batchId == id) names.insert(change.first);
+    return names;
+  }
+  bool SawLocked(std::int64_t id, const Change& change) const {
+    for (const auto& [batchId, batch] : batches_)
+      if (batchId == id && batch.count(change)) return true;
+    return false;
+  }
+
+  Shared shared_;
+  std::vector<std::pair<std::int64_t, ChangeBatch>> batches_;
+  std::vector<std::int64_t> watchErrors_;
+  std::vector<std::string> errorTexts_;
+};
+
+// Holds the worker inside its first batch until Release(), so that the changes made
+// meanwhile pile up for the next read: they arrive together, or overflow it.
+class WorkerGate {
+ public:
+  // `handlers` whose event handler waits at the gate before it passes a batch on.
+  vexil::MonitorHandlers Wrap(vexil::MonitorHandlers handlers) {
+    auto pass = handlers.event;
+    handlers.event = [this, pass](std::int64_t id, const ChangeBatch& batch) {
+      gate_.Update([&] { held_ = true; });
+      gate_.WaitUntil([&] { return open_; });
+      pass(id, batch);
+    };
+    return handlers;
+  }
+  // Watches `root` as `id` and returns once a first change there holds the worker.
+  void HoldIn(ChangeMonitor& monitor, const TempDir& root, std::int64_t id) {
+    ASSERT_TRUE(monitor.AddWatch(root.Path().string(), id));
+    Touch(root / "first");
+    ASSERT_TRUE(gate_.WaitUntil([&] { return held_; }));
+  }
+  void Release() {
+    gate_.Update([&] { open_ = true; });
+  }
+
+ private:
+  Shared gate_;
+  bool held_ = false;
+  bool open_ = false;
+};
+
+// A change in another watch is queued behind everything before it, and a read's batches
+// go out in id order: once the fence (with the highest id) has arrived, anything the other
+// watches were going to report has been reported too.
+inline void Fence(Probe& probe, const TempDir& fenceRoot, std::int64_t fenceId, const std::string& name) {
+  Touch(fenceRoot / name);
+  ASSERT_TRUE(probe.WaitFor(fenceId, {name, kAdded})) << name;
+}
+
+}  // namespace watchtest
