@@ -80,6 +80,7 @@ windows: windows-deps
 # started once here, do not inherit (and hold open) the output pipes of the tests.
 test-windows: windows
 	$(WINE_ENV) wineserver -k >/dev/null 2>&1 || true
+	mkdir -p $(WINDOWS_BUILD)/wineprefix
 	$(WINE_ENV) wineserver -p
 	$(WINE_ENV) wineboot -i >/dev/null 2>&1 || true
 	$(WINE_ENV) $(CTEST) --test-dir $(WINDOWS_BUILD); status=$$?; $(WINE_ENV) wineserver -k; exit $$status
