@@ -2,15 +2,13 @@
 // order, nesting, string lengths) is what a real server sends.
 #include "bench_replies.h"
 
-#include <unistd.h>
-
 #include <cstdlib>
-#include <filesystem>
 #include <fstream>
 #include <sstream>
 #include <stdexcept>
 
 #include "json/rapidjson.h"
+#include "vexil_test/support.h"
 
 namespace bench {
 namespace {
@@ -72,17 +70,8 @@ std::string Reply(int id, const std::string& result) {
 
 std::string TemporaryFile(const std::string& name, const std::string& text) {
   // Removed with everything in it when the process ends.
-  struct Directory {
-    Directory() {
-      std::string pattern = (std::filesystem::temp_directory_path() / "vexil-bench-XXXXXX").string();
-      if (!mkdtemp(pattern.data())) throw std::runtime_error("cannot create a temporary directory");
-      path = pattern;
-    }
-    ~Directory() { std::filesystem::remove_all(path); }
-    std::filesystem::path path;
-  };
-  static const Directory directory;
-  const std::string path = (directory.path / name).string();
+  static const vexil_test::TempDirectory directory;
+  const std::string path = directory / name;
   std::ofstream(path, std::ios::binary) << text;
   return path;
 }

@@ -13,6 +13,7 @@
 #include <string>
 #include <thread>
 
+#include "vexil_test/support.h"
 #include "watch/change_monitor.h"
 
 namespace {
@@ -20,20 +21,10 @@ namespace {
 namespace fs = std::filesystem;
 using Clock = std::chrono::steady_clock;
 
-class TempDir {
+class TempDir : public vexil_test::TempDirectory {
  public:
-  // In memory where possible, so that creating files does not hide the watcher's cost.
-  TempDir() {
-    const fs::path base = fs::is_directory("/dev/shm") ? fs::path("/dev/shm") : fs::temp_directory_path();
-    std::string pattern = (base / "vexil-bench-XXXXXX").string();
-    path_ = mkdtemp(pattern.data());
-  }
-  ~TempDir() { fs::remove_all(path_); }
-  std::string operator/(const std::string& name) const { return (path_ / name).string(); }
-  std::string Path() const { return path_.string(); }
-
- private:
-  fs::path path_;
+  TempDir() : TempDirectory(vexil_test::MemoryBackedBase()) {}
+  std::string Path() const { return TempDirectory::Path().string(); }
 };
 
 // Counts what a watcher reported; the measuring thread waits for a total.

@@ -8,6 +8,7 @@
 #include <string>
 
 #include "e2e_support.h"
+#include "vexil_test/support.h"
 
 namespace {
 
@@ -61,9 +62,8 @@ TEST(CommandLine, LspWritesOneJsonObjectPerQueryAndDiffsForRenames) {
 
 // pylsp announces no diagnostic provider, so the command waits for its publication.
 TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormat) {
-  char directory[] = "/tmp/vexil-cli-XXXXXX";
-  ASSERT_NE(mkdtemp(directory), nullptr);
-  std::string file = std::string(directory) + "/broken.py";
+  const vexil_test::TempDirectory directory;
+  const std::string file = directory / "broken.py";
   { std::ofstream(file) << "import os\n\nprint(undefined_name)\n"; }
   Outcome run = Vexil("lsp -- pylsp --diagnostics " + file);
   EXPECT_EQ(run.status, 0) << run.output;
@@ -71,8 +71,6 @@ TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormat) {
       << run.output;
   EXPECT_NE(run.output.find(file + ":1:1: warning: 'os' imported but unused [pyflakes]\n"), std::string::npos)
       << run.output;
-  std::remove(file.c_str());
-  rmdir(directory);
 }
 
 TEST(CommandLine, ExitStatusTellsFailureFromBadUsage) {

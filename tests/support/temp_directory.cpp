@@ -22,6 +22,11 @@ TempDirectory::TempDirectory(const std::filesystem::path& base) {
   throw std::runtime_error("cannot create a temporary directory under " + parent.string());
 }
 
+std::filesystem::path MemoryBackedBase() {
+  std::error_code error;
+  return std::filesystem::is_directory("/dev/shm", error) ? std::filesystem::path("/dev/shm") : std::filesystem::path();
+}
+
 TempDirectory::~TempDirectory() {
   std::error_code ignored;
   std::filesystem::remove_all(path_, ignored);

@@ -22,10 +22,9 @@ namespace fs = std::filesystem;
 // Long enough that only a real loss or hang runs into it.
 constexpr std::chrono::seconds kDeadline{30};
 
-// In memory where possible: fast file creation is what exposes the monitor's races.
 class TempDir : public vexil_test::TempDirectory {
  public:
-  TempDir() : TempDirectory(fs::is_directory("/dev/shm") ? fs::path("/dev/shm") : fs::path()) {}
+  TempDir() : TempDirectory(vexil_test::MemoryBackedBase()) {}
 };
 
 inline void Touch(const std::string& path) { std::ofstream(path).put('x'); }

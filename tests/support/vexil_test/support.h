@@ -22,6 +22,10 @@ class TempDirectory {
   std::filesystem::path path_;
 };
 
+// /dev/shm where it exists, else empty (the system's temporary directory): in memory,
+// creating files is fast enough to expose a watcher's races and not hide its cost.
+std::filesystem::path MemoryBackedBase();
+
 // Ends the process `id` at once, as a crash would.
 void KillProcess(int id);
 // Whether the process `id` still exists (an exited but unreaped child counts as existing).
