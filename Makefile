@@ -14,7 +14,9 @@ WINE_ENV         = WINEPREFIX=$(abspath $(WINDOWS_BUILD))/wineprefix WINEARCH=wi
 FUZZ_BUILD   ?= build-fuzz
 FUZZ_SECONDS ?= 60
 
-.PHONY: all deps configure build test demo bench asan tsan fuzz clean windows-deps windows test-windows
+STRESS_RUNS ?= 10
+
+.PHONY: all deps configure build test stress demo bench asan tsan fuzz clean windows-deps windows test-windows
 
 all: build
 
@@ -29,6 +31,11 @@ build: configure
 
 test: build
 	$(CTEST) --test-dir $(BUILD)
+
+# The whole suite STRESS_RUNS times, four tests at a time whatever the cores: the load under
+# which a test that races its own threads shows itself. Fails when any run failed.
+stress: build
+	scripts/stress.sh $(BUILD) $(STRESS_RUNS) 4
 
 # clangd and pylsp over the example projects, and a watcher over a temporary directory.
 demo: build
