@@ -169,7 +169,7 @@ TEST_F(ClangdSession, ChangedTextIsWhatTheServerAnswersAboutUntilShutdownAndExit
   EXPECT_FALSE(server->HaveErrors());
 
   EXPECT_TRUE(server->Shutdown());
-  EXPECT_TRUE(server->Exit());
+  EXPECT_TRUE(Exits(*server));
   EXPECT_EQ(Vexil_Have("clangd-session"), nullptr);
 }
 

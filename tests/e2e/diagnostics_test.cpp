@@ -62,7 +62,7 @@ void ExpectErrorThenFix(const Project& project, const char* name, const char* la
   EXPECT_NE(server->DiagnosticsVersion(), before);
 
   EXPECT_TRUE(server->Shutdown());
-  EXPECT_TRUE(server->Exit());
+  EXPECT_TRUE(Exits(*server));
 }
 
 TEST(Diagnostics, ClangdReportsATypeErrorAndClearsItAfterTheFix) {

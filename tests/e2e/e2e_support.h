@@ -125,4 +125,14 @@ inline bool Kill(xLanguageServer& server) {
   return true;
 }
 
+// Exit gives a server about a second to end and, when it has not, returns false and leaves
+// the connection usable: on a loaded machine a host (and a test) asks again.
+inline bool Exits(xLanguageServer& server) {
+  auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(30);
+  while (!server.Exit()) {
+    if (std::chrono::steady_clock::now() > deadline) return false;
+  }
+  return true;
+}
+
 }  // namespace e2e

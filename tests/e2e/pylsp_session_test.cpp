@@ -66,7 +66,7 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   EXPECT_FALSE(server->HaveErrors());
 
   EXPECT_TRUE(server->Shutdown());
-  EXPECT_TRUE(server->Exit());
+  EXPECT_TRUE(Exits(*server));
   EXPECT_EQ(Vexil_Have("pylsp-session"), nullptr);
 }
 

@@ -64,10 +64,10 @@ TEST(ServerFailures, TwoServersAtOnceEachAnswerForTheirOwnProject) {
     EXPECT_NE(HoverText(*pylsp, python, "main.py", "print(clamp(", 6).find("clamp(value, low, high)"), std::string::npos);
   }
   EXPECT_TRUE(pylsp->Shutdown());
-  EXPECT_TRUE(pylsp->Exit());
+  EXPECT_TRUE(Exits(*pylsp));
   EXPECT_EQ(HoverText(*clangd, cpp, "main.cpp", "Report(rectangle)", 0).find("function Report"), 0u);
   EXPECT_TRUE(clangd->Shutdown());
-  EXPECT_TRUE(clangd->Exit());
+  EXPECT_TRUE(Exits(*clangd));
 }
 
 TEST(ServerFailures, AServerStartsAgainUnderItsNameAfterExit) {
@@ -79,7 +79,7 @@ TEST(ServerFailures, AServerStartsAgainUnderItsNameAfterExit) {
     Open(*server, project, "main.cpp");
     EXPECT_NE(HoverText(*server, project, "main.cpp", "shapes::Clamp(", 8).find("function Clamp"), std::string::npos);
     EXPECT_TRUE(server->Shutdown());
-    EXPECT_TRUE(server->Exit());
+    EXPECT_TRUE(Exits(*server));
     EXPECT_EQ(Vexil_Have("again"), nullptr);
   }
 }
