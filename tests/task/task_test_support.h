@@ -73,14 +73,19 @@ inline bool ModifyUntilTraced(const std::string& path, const std::string& title,
   return false;
 }
 
-// Gone means ended and collected: a zombie still counts as existing.
-inline bool WaitUntilGone(int pid) {
+// For a state nothing signals, such as a thread's end or a process's.
+inline bool PollUntil(const std::function<bool()>& condition) {
   const auto end = std::chrono::steady_clock::now() + kDeadline;
   while (std::chrono::steady_clock::now() < end) {
-    if (!vexil_test::ProcessExists(pid)) return true;
+    if (condition()) return true;
     std::this_thread::sleep_for(std::chrono::milliseconds(20));
   }
   return false;
+}
+
+// Gone means ended and collected: a zombie still counts as existing.
+inline bool WaitUntilGone(int pid) {
+  return PollUntil([pid] { return !vexil_test::ProcessExists(pid); });
 }
 
 }  // namespace tasktest

@@ -32,7 +32,7 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   EXPECT_TRUE(Traced(Message("built a.cpp\n")));
   EXPECT_TRUE(event->Command().Completed());
   EXPECT_FALSE(event->Command().HaveErrors());
-  EXPECT_TRUE(event->Finished());
+  EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));  // the notice comes just before the thread's end
   for (const char* text : {"Watcher Event starting....\n\n", " Executable: /bin/sh\n",
                            "  Arguments: -c echo built a.cpp; sleep 1 \n", "Use Command: Yes\n",
                            "     Timout: 10000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"}) {
@@ -68,7 +68,7 @@ TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceIt
   EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
   EXPECT_TRUE(event->Command().HaveErrors());
   EXPECT_FALSE(event->Command().Completed());
-  EXPECT_TRUE(event->Finished());
+  EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));
   ASSERT_EQ(kill(pid, 0), 0) << "the child is never killed by the library";
 
   // The reader was stopped although the child holds the pipe open: a reader that
