@@ -95,7 +95,7 @@ TEST(CommandLine, TaskRunsItsCommandForAnEditedFileAndEndsOnInterrupt) {
       "dir=$(mktemp -d); echo x > \"$dir/a.cpp\"; echo x > \"$dir/a.txt\"; "
       "'" VEXIL_CLI "' task --ext cpp --run 'echo hit $F' --shell \"$dir\" > \"$dir/out\" 2>&1 & pid=$!; "
       "for i in $(seq 150); do echo y >> \"$dir/a.cpp\"; echo y >> \"$dir/a.txt\"; "
-      "grep -q 'hit a.cpp' \"$dir/out\" && break; sleep 0.2; done; "
+      "grep -q 'hit a.cpp' \"$dir/out\" && grep -q 'Ignoring changes' \"$dir/out\" && break; sleep 0.2; done; "
       "kill -INT $pid; wait $pid; echo \"status=$?\"; cat \"$dir/out\"; rm -rf \"$dir\"";
   Outcome run = Shell(script);
   EXPECT_NE(run.output.find("status=0\n"), std::string::npos) << run.output;
