@@ -172,7 +172,8 @@ TEST(ChangeMonitor, OverlappingRootsShareDirectoriesAndRemovalKeepsTheOther) {
   TempDir root, fence;
   fs::create_directories(root / "sub/deeper");
   Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
+  WorkerGate gate;
+  ChangeMonitor monitor(gate.Wrap(probe.Handlers()));
   ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 1));
   ASSERT_TRUE(monitor.AddWatch(root / "sub", 2));
   ASSERT_TRUE(monitor.AddWatch(fence.Path().string(), 3));
@@ -186,8 +187,11 @@ TEST(ChangeMonitor, OverlappingRootsShareDirectoriesAndRemovalKeepsTheOther) {
   EXPECT_TRUE(probe.WaitForAll(2, {{"deeper/f", kOld}, {"g", kNew}}));
 
   // Into the inner root from the outer one: a rename for one, an arrival for the other.
-  Touch(root / "top");
+  // The worker, woken by the new file, is held while it moves: both halves of the move
+  // are then queued before its next read, however the machine schedules it.
+  ASSERT_NO_FATAL_FAILURE(gate.HoldOn(root / "top"));
   fs::rename(root / "top", root / "sub/top");
+  gate.Release();
   EXPECT_TRUE(probe.WaitForAll(1, {{"top", kOld}, {"sub/top", kNew}}));
   EXPECT_TRUE(probe.WaitFor(2, {"top", kAdded}));
 

@@ -107,8 +107,8 @@ class Probe {
   std::vector<std::string> errorTexts_;
 };
 
-// Holds the worker inside its first batch until Release(), so that the changes made
-// meanwhile pile up for the next read: they arrive together, or overflow it.
+// Holds the worker inside a batch until Release(), so that the changes made meanwhile
+// pile up for the next read: they arrive together, or overflow it.
 class WorkerGate {
  public:
   // `handlers` whose event handler waits at the gate before it passes a batch on.
@@ -124,7 +124,13 @@ class WorkerGate {
   // Watches `root` as `id` and returns once a first change there holds the worker.
   void HoldIn(ChangeMonitor& monitor, const TempDir& root, std::int64_t id) {
     ASSERT_TRUE(monitor.AddWatch(root.Path().string(), id));
-    Touch(root / "first");
+    HoldOn(root / "first");
+  }
+  // Creates the watched file `path` and returns once the worker holds in a batch: the one
+  // reporting `path` at the latest.
+  void HoldOn(const std::string& path) {
+    gate_.Update([&] { open_ = held_ = false; });
+    Touch(path);
     ASSERT_TRUE(gate_.WaitUntil([&] { return held_; }));
   }
   void Release() {
@@ -134,7 +140,7 @@ class WorkerGate {
  private:
   Shared gate_;
   bool held_ = false;
-  bool open_ = false;
+  bool open_ = true;
 };
 
 // A change in another watch is queued behind everything before it, and a read's batches
