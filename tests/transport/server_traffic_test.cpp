@@ -183,7 +183,7 @@ TEST_F(ServerTraffic, StandardErrorLinesAreTracedAtVerboseLevelWhileWaiting) {
 }
 
 TEST_F(ServerTraffic, BigAndSplitFramesArriveWhole) {
-  auto server = Started();
+  auto server = Started(30000);  // 4 MB through a sanitized build on a busy machine
   TextResult big;
   Ask(*server, "fake/echo", R"({"size":4000000})", big);
   EXPECT_EQ(big.data.size(), 4000000u);
