@@ -19,6 +19,8 @@
 namespace cli {
 namespace {
 
+constexpr int kExitAttempts = 10;
+
 xServerStart StartRecord(const SessionOptions& options) {
   xServerStart start;
   start.trace = &TraceToStderr;
@@ -75,7 +77,12 @@ bool Session::Start() {
 
 bool Session::Stop() {
   server_->Shutdown();
-  return server_->Exit();
+  // Each Exit gives the server about a second to end; an interpreter on a busy machine can
+  // take longer, so the server counts as stuck only when several of them went by.
+  for (int attempt = 0; attempt < kExitAttempts; ++attempt) {
+    if (server_->Exit()) return true;
+  }
+  return false;
 }
 
 std::string Session::Document(const std::string& path) {
