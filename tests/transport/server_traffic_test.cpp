@@ -200,7 +200,7 @@ TEST_F(ServerTraffic, WriteAndReadAfterTheServerDied) {
   LSP::NotificationMessage dummy("fake/none", &exitNow);
   LSP::RequestMessage die("fake/exit", &exitNow);
   server->Write(die);
-  EXPECT_TRUE(WaitFor([&] { return !server->IsRunning(); }, 2s));
+  EXPECT_TRUE(WaitFor([&] { return !server->IsRunning(); }));
 
   TraceLog::Clear();
   LSP::RequestMessage late("fake/echo", &exitNow);
