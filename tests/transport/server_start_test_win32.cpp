@@ -43,15 +43,6 @@ std::string WorkingDirectoryOf(vexil::xServer& server) {
   return result.cwd;
 }
 
-// Standard error is traced while a reply is awaited, and the two pipes keep no common
-// order: ask until the line has come through.
-bool ErrorLineArrives(vexil::xServer& server, const std::string& line) {
-  return WaitFor([&] {
-    WorkingDirectoryOf(server);
-    return TraceLog::Count("Reply: " + line + "\n") == 1;
-  });
-}
-
 TEST_F(ServerStart, LaunchesDirectlyAndThroughCmdExeInItsOwnDirectory) {
   vexil_test::TempDirectory directory;
   const std::string before = CurrentDirectory();

@@ -148,6 +148,16 @@ inline bool WaitFor(const std::function<bool()>& condition, std::chrono::millise
   return true;
 }
 
+// Standard error is traced while a reply is awaited, and the two pipes keep no common
+// order: ask until `line` has come through, once.
+inline bool ErrorLineArrives(vexil::xServer& server, const std::string& line) {
+  return WaitFor([&] {
+    TextResult result;
+    Ask(server, "fake/echo", "", result);
+    return TraceLog::Count("Reply: " + line + "\n") == 1;
+  });
+}
+
 // Each test of a server's start reads only its own trace lines.
 class ServerStart : public ::testing::Test {
  protected:
