@@ -66,6 +66,7 @@ TEST_F(ServerStart, LaunchesDirectlyAndThroughCmdExeInItsOwnDirectory) {
             (Texts{" Executable: cmd.exe\n", "  Directory: \n",
                    "  Arguments: /C " + command.executable + " stderr=through\\n \n", "Use Command: Yes\n",
                    "     Timout: 200 (milliseconds)\n\n"}));
+  interpreted.Timeout(30000);  // cmd.exe under wine on a busy machine can take longer than 200 ms
   // The pipes reach the server through the interpreter, both ways.
   EXPECT_EQ(WorkingDirectoryOf(interpreted), before);
   EXPECT_TRUE(ErrorLineArrives(interpreted, "through"));
