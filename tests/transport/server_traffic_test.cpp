@@ -259,6 +259,7 @@ struct Misbehaviour {
   std::function<void(vexil::xServer&)> call;
   Texts traced;
   Next next;
+  int timeout = 200;
 };
 
 std::function<void(vexil::xServer&)> Answered(const std::string& params, bool read = true) {
@@ -276,7 +277,8 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
   const Misbehaviour rows[] = {
       {"asks while the host writes a big text, then writes more than a pipe holds", {},
        [](vexil::xServer& server) {
-         FakeParams asking(R"({"ask":["window/workDoneProgress/create"],"chatter":2000})");
+         // The server asks only once the host's write has filled its input.
+         FakeParams asking(R"({"delay":500,"ask":["window/workDoneProgress/create"],"chatter":2000})");
          LSP::RequestMessage request("fake/echo", &asking);
          server.Write(request);
          WriteBigText(server);
@@ -285,7 +287,7 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
          server.Read(request.id, response);
          EXPECT_EQ(result.answers, 1u);
        },
-       {}, Next::Works},
+       {}, Next::Works, 2000},  // every later reply lists the big text the server received
       {"stops reading", {"hang"}, WriteBigText, {writeTimeout}, Next::FailsFast},
       {"asks and never reads the answers", {"send=window/workDoneProgress/create:3000", "hang"}, Answered("", false),
        {writeTimeout}, Next::FailsFast},
@@ -320,7 +322,7 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
   };
   for (const Misbehaviour& row : rows) {
     SCOPED_TRACE(row.name);
-    vexil::xServer server(FakeStart(row.directives, 200, LSP::TraceLevel::Messages));
+    vexil::xServer server(FakeStart(row.directives, row.timeout, LSP::TraceLevel::Messages));
     server.Start();
     TraceLog::Clear();
     // Writes get 5 s and waits at most 3 s here: a hang is told apart by far.
