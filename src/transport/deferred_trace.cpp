@@ -7,22 +7,21 @@
 namespace vexil {
 
 void DeferredTrace::Message(const char* format, ...) {
-  if (!tracer_.Messages()) return;
   va_list args;
   va_start(args, format);
-  Keep("Message", format, args);
+  Keep(tracer_.Messages(), "Message", format, args);
   va_end(args);
 }
 
 void DeferredTrace::Error(const char* format, ...) {
-  if (!tracer_.Callback()) return;
   va_list args;
   va_start(args, format);
-  Keep("Error", format, args);
+  Keep(tracer_.Callback() != nullptr, "Error", format, args);
   va_end(args);
 }
 
-void DeferredTrace::Keep(const char* title, const char* format, va_list args) {
+void DeferredTrace::Keep(bool wanted, const char* title, const char* format, va_list args) {
+  if (!wanted) return;
   char buffer[kTraceBufferSize];
   std::vsnprintf(buffer, sizeof buffer, format, args);
   std::lock_guard<std::mutex> lock(mutex_);

@@ -37,7 +37,8 @@ class DeferredTrace {
     std::string text;
   };
 
-  void Keep(const char* title, const char* format, va_list args);
+  // Formats and keeps the line when the level admits it (`wanted`).
+  void Keep(bool wanted, const char* title, const char* format, va_list args);
 
   const Tracer tracer_;
   std::mutex mutex_;
