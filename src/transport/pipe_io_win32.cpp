@@ -23,7 +23,7 @@ class WriteWatch {
   WriteWatch(std::chrono::steady_clock::time_point deadline, const std::atomic<bool>* stop)
       : deadline_(deadline), stop_(stop) {
     thread_ = OpenThread(THREAD_TERMINATE, FALSE, GetCurrentThreadId());
-    if (thread_ && !CreateTimerQueueTimer(&timer_, nullptr, &WriteWatch::Look, this, kWriteStepMs, kWriteStepMs,
+    if (thread_ && !CreateTimerQueueTimer(&timer_, nullptr, &WriteWatch::OnTimer, this, kWriteStepMs, kWriteStepMs,
                                           WT_EXECUTEDEFAULT)) {
       timer_ = nullptr;
     }
@@ -41,7 +41,7 @@ class WriteWatch {
   PipeWrite Verdict() const { return verdict_; }
 
  private:
-  static void CALLBACK Look(void* self, BOOLEAN) { static_cast<WriteWatch*>(self)->Look(); }
+  static void CALLBACK OnTimer(void* self, BOOLEAN) { static_cast<WriteWatch*>(self)->Look(); }
 
   void Look() {
     if (stop_ && *stop_) {
