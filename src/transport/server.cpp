@@ -1,5 +1,5 @@
-// The server's life: built from the host's record, launched with its two readers,
-// reported on when the launch fails, and closed without ever killing the process.
+// The server's life: built from the host's record, launched with fresh pipes, readers and
+// writer each time, reported on when the launch fails, and closed without ever killing it.
 #include "transport/server.h"
 
 #include <algorithm>
