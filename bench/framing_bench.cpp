@@ -39,7 +39,9 @@ Stream Frames(std::size_t bodySize) {
 class Writer {
  public:
   Writer(const Poco::Pipe& pipe, const std::string& bytes)
-      : thread_([&pipe, &bytes] { vexil::WriteAll(pipe, bytes.data(), bytes.size()); }) {}
+      : thread_([&pipe, &bytes] {
+          vexil::WriteAll(pipe, bytes.data(), bytes.size(), std::chrono::steady_clock::now() + std::chrono::minutes(1));
+        }) {}
   ~Writer() { thread_.join(); }
 
  private:

@@ -23,7 +23,7 @@ xReader::~xReader() = default;
 
 bool xReader::Parse(const std::string& text) {
   JsonDocument& document = document_->document;
-  document.Parse(text.c_str(), text.size());
+  document.Parse<rapidjson::kParseIterativeFlag>(text.c_str(), text.size());
   if (!document.HasParseError()) {
     error_.clear();
     return true;

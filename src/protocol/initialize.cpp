@@ -2,6 +2,7 @@
 // of the initialize result. Member order is fixed; empty texts and lists are left out.
 #include "vexil/protocol/initialize.h"
 
+#include "json/json_depth.h"
 #include "json/rapidjson.h"
 #include "protocol/json_arrays.h"
 
@@ -10,11 +11,12 @@ namespace LSP {
 void InitializationOptions::Write(xWriter& writer) {
   if (text.empty()) return;
   JsonDocument document;
-  document.Parse(text.c_str(), text.size());
-  // A host's faulty configuration must not keep the server from starting: it is dropped.
+  document.Parse<rapidjson::kParseIterativeFlag>(text.c_str(), text.size());
+  // A host's faulty configuration must not keep the server from starting: it is dropped,
+  // and so is one nested too deep to be written out safely.
   if (document.HasParseError() || !document.IsObject()) return;
   auto member = document.FindMember(Name());
-  if (member != document.MemberEnd()) writer.Raw(Name(), member->value);
+  if (member != document.MemberEnd() && NestedWithin(member->value, kNestingLimit)) writer.Raw(Name(), member->value);
 }
 
 void ClientInfo::Write(xWriter& writer) {

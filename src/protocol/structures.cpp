@@ -4,6 +4,7 @@
 
 #include <string>
 
+#include "json/json_depth.h"
 #include "protocol/json_arrays.h"
 
 namespace LSP {
@@ -142,25 +143,35 @@ void TextDocumentContentChangeEvent::Write(xWriter& writer) {
   writer.RequiredString("text", text);
 }
 
-void SymbolInformation::Read(const xObject& value) {
-  name = value.String("name");
-  kind = value.Int("kind");
-  deprecated = value.Bool("deprecated");
-  containerName = value.String("containerName");
-  location.Read(value.Object("location"));
+namespace {
+
+// Reads `symbol` and its children, the symbol being `depth` levels deep. Trees deeper
+// than the nesting limit are malformed: reading one recursively could exhaust the stack.
+void ReadSymbol(SymbolInformation& symbol, const xObject& value, int depth) {
+  if (depth > kNestingLimit) {
+    ThrowFormatted("children\nFailed to read JSON object: nested deeper than %d levels", kNestingLimit);
+  }
+  symbol.name = value.String("name");
+  symbol.kind = value.Int("kind");
+  symbol.deprecated = value.Bool("deprecated");
+  symbol.containerName = value.String("containerName");
+  symbol.location.Read(value.Object("location"));
   // The hierarchical document-symbol form has "range" instead of a location; its
   // document is the requested one, which the enclosing list fills in.
-  if (!value.HasObject("location") && value.HasObject("range")) location.range.Read(value.Object("range"));
-  // Children are read leniently: document-symbol trees nest to any depth, and
-  // anything that is not an object is passed over.
+  if (!value.HasObject("location") && value.HasObject("range")) symbol.location.range.Read(value.Object("range"));
+  // Children are read leniently: anything that is not an object is passed over.
   xObject list = value.Object("children");
   if (!list.IsArray()) return;
   for (const JsonValue& element : list.Value().GetArray()) {
     if (!element.IsObject()) continue;
-    children.emplace_back();
-    children.back().Read(xObject(element));
+    symbol.children.emplace_back();
+    ReadSymbol(symbol.children.back(), xObject(element), depth + 1);
   }
 }
+
+}  // namespace
+
+void SymbolInformation::Read(const xObject& value) { ReadSymbol(*this, value, 1); }
 
 void SymbolInformation::Write(xWriter& writer) {
   writer.String("name", name);

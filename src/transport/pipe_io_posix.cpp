@@ -1,12 +1,15 @@
-// Pipe traffic on POSIX: poll() gives readers a wake-up to check their stop flag, and
-// writes block SIGPIPE for the writing thread so a dead server cannot kill the host.
+// Pipe traffic on POSIX: poll() gives readers a wake-up to check their stop flag, writes
+// go to a non-blocking descriptor so a deadline can end them, and SIGPIPE is blocked for
+// the writing thread so a dead server cannot kill the host.
 #include "transport/pipe_io.h"
 
+#include <fcntl.h>
 #include <poll.h>
 #include <signal.h>
 #include <time.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cerrno>
 
 #include <Poco/Exception.h>
@@ -71,15 +74,31 @@ std::size_t ReadSome(const Poco::Pipe& pipe, char* buffer, std::size_t size) {
   }
 }
 
-void WriteAll(const Poco::Pipe& pipe, const char* data, std::size_t size) {
+PipeWrite WriteAll(const Poco::Pipe& pipe, const char* data, std::size_t size,
+                   std::chrono::steady_clock::time_point deadline, const std::atomic<bool>* stop) {
+  const int descriptor = pipe.writeHandle();
+  if (descriptor < 0) return PipeWrite::Failed;
+  // Only our end is made non-blocking: the server's end of the pipe is its own.
+  int flags = fcntl(descriptor, F_GETFL);
+  if (flags < 0 || (!(flags & O_NONBLOCK) && fcntl(descriptor, F_SETFL, flags | O_NONBLOCK) < 0)) {
+    return PipeWrite::Failed;
+  }
   SigpipeBlock block;
   while (size > 0) {
-    ssize_t count = write(pipe.writeHandle(), data, size);
-    if (count < 0 && errno == EINTR) continue;
-    if (count < 0) throw Poco::WriteFileException("anonymous pipe");
-    data += count;
-    size -= static_cast<std::size_t>(count);
+    ssize_t count = write(descriptor, data, size);
+    if (count > 0) {
+      data += count;
+      size -= static_cast<std::size_t>(count);
+      continue;
+    }
+    if (count < 0 && errno != EINTR && errno != EAGAIN && errno != EWOULDBLOCK) return PipeWrite::Failed;
+    if (stop && *stop) return PipeWrite::Stopped;
+    auto left = std::chrono::duration_cast<std::chrono::milliseconds>(deadline - std::chrono::steady_clock::now());
+    if (left.count() <= 0) return PipeWrite::TimedOut;
+    pollfd watched{descriptor, POLLOUT, 0};
+    poll(&watched, 1, static_cast<int>(std::min<long long>(left.count(), kWriteStepMs)));
   }
+  return PipeWrite::Written;
 }
 
 }  // namespace vexil

@@ -69,6 +69,11 @@ void xPipeReader::Deliver(std::string unit) { messages_.Push(std::move(unit)); }
 void xPipeReader::RecordException(const std::string& text) {
   std::lock_guard<std::mutex> lock(textMutex_);
   errors_ += "Exception: " + (text.empty() ? std::string("Unknown exception") : text) + "\n";
+  if (errors_.size() <= kErrorsLimit) return;
+  // The newest lines tell what goes wrong now; keep whole lines where there are any.
+  std::size_t cut = errors_.size() - kErrorsLimit;
+  std::size_t lineStart = errors_.find('\n', cut - 1);
+  errors_.erase(0, lineStart < errors_.size() - 1 ? lineStart + 1 : cut);
 }
 
 void xPipeReader::DispatchMessage(const std::string& body) {

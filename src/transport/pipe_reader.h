@@ -40,7 +40,8 @@ class xPipeReader : public Poco::Runnable {
   const std::string& Name() const { return name_; }
   // Stray output since the last completed message; emptied by taking it.
   std::string TakeOutput();
-  // One "Exception: <text>\n" line per read failure; never cleared.
+  // One "Exception: <text>\n" line per read failure, never cleared: the newest lines up
+  // to kErrorsLimit bytes.
   std::string Errors() const;
   MessageQueue& Messages() { return messages_; }
   // Must be set before the thread starts.
@@ -51,6 +52,7 @@ class xPipeReader : public Poco::Runnable {
   // Only notifications and late replies pile up unread: a request's own reply is taken
   // while the host waits for it.
   static constexpr std::size_t kQueueLimit = std::size_t{64} << 20;
+  static constexpr std::size_t kErrorsLimit = std::size_t{64} << 10;
 
  protected:
   xPipeReader(const char* name, Poco::Pipe pipe, std::size_t queueLimit);

@@ -20,8 +20,9 @@ class xProcess {
 
   // Launches `executable` with `arguments` in `directory` (the host's own directory when
   // empty; the host's current directory is never changed). Null pipes leave the stream
-  // as the host has it; `out` and `err` may be the same pipe. The child's ends are
-  // closed here once the child holds them. Replaces any earlier child.
+  // as the host has it; a pipe given must be open, or the launch fails. `out` and `err`
+  // may be the same pipe. The child's ends are closed here once the child holds them.
+  // Replaces any earlier child, which is abandoned (see Abandon).
   // Throws Poco::Exception when the launch fails, with the OS error code left for
   // LastSystemErrorText().
   void Launch(const std::string& executable, const std::vector<std::string>& arguments,

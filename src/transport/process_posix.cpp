@@ -106,7 +106,11 @@ class SpawnSetup {
   SpawnSetup(const SpawnSetup&) = delete;
   SpawnSetup& operator=(const SpawnSetup&) = delete;
 
-  void Redirect(int from, int to) { posix_spawn_file_actions_adddup2(&actions_, from, to); }
+  // A closed pipe would leave the child the host's own stream.
+  void Redirect(int from, int to, const std::string& executable) {
+    int failure = from < 0 ? EBADF : posix_spawn_file_actions_adddup2(&actions_, from, to);
+    if (failure != 0) Fail<Poco::IOException>("Cannot redirect the standard streams of: " + executable, failure);
+  }
 
   // The child gets only its three streams, starts in `directory`, and has the default
   // signal handling whatever the launching thread has blocked or ignored.
@@ -146,9 +150,9 @@ void xProcess::Launch(const std::string& executable, const std::vector<std::stri
                       const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err) {
   CheckLaunchable(executable, directory);
   SpawnSetup setup;
-  if (in) setup.Redirect(in->readHandle(), STDIN_FILENO);
-  if (out) setup.Redirect(out->writeHandle(), STDOUT_FILENO);
-  if (err) setup.Redirect(err->writeHandle(), STDERR_FILENO);
+  if (in) setup.Redirect(in->readHandle(), STDIN_FILENO, executable);
+  if (out) setup.Redirect(out->writeHandle(), STDOUT_FILENO, executable);
+  if (err) setup.Redirect(err->writeHandle(), STDERR_FILENO, executable);
   setup.Finish(directory);
 
   std::vector<char*> argv;
@@ -167,7 +171,7 @@ void xProcess::Launch(const std::string& executable, const std::vector<std::stri
   if (out) out->close(Poco::Pipe::CLOSE_WRITE);
   if (err) err->close(Poco::Pipe::CLOSE_WRITE);
 
-  if (child_) child_->Running();
+  Abandon();
   child_ = std::make_unique<Child>();
   child_->pid = pid;
 }

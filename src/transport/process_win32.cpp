@@ -52,6 +52,12 @@ xProcess::~xProcess() = default;
 
 void xProcess::Launch(const std::string& executable, const std::vector<std::string>& arguments,
                       const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err) {
+  // A closed pipe would leave the child the host's own stream.
+  if ((in && in->readHandle() == INVALID_HANDLE_VALUE) || (out && out->writeHandle() == INVALID_HANDLE_VALUE) ||
+      (err && err->writeHandle() == INVALID_HANDLE_VALUE)) {
+    SetLastError(ERROR_INVALID_HANDLE);
+    throw Poco::IOException("Cannot redirect the standard streams of: " + executable);
+  }
   try {
     child_ = std::make_unique<Child>(Poco::Process::launch(executable, arguments, directory, in, out, err));
   } catch (const Poco::SystemException&) {

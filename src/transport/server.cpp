@@ -1,12 +1,14 @@
-// The server's life: built from the host's record, launched with its two readers,
-// reported on when the launch fails, and closed without ever killing the process.
+// The server's life: built from the host's record, launched with fresh pipes, readers and
+// writer each time, reported on when the launch fails, and closed without ever killing it.
 #include "transport/server.h"
 
+#include <algorithm>
 #include <sstream>
 
 #include <Poco/Thread.h>
 
 #include "transport/launch_report.h"
+#include "transport/server_streams.h"
 
 namespace vexil {
 
@@ -24,8 +26,7 @@ constexpr long kStartupGraceMs = 150;
 
 xServer::xServer(const xServerStart& start)
     : tracer_(start.trace, start.level),
-      outReader_("stdout", outPipe_),
-      errReader_(errPipe_),
+      deferred_(tracer_),
       timeout_(kDefaultTimeoutMs),
       useCommand_(start.useCommand),
       directory_(start.directory) {
@@ -42,10 +43,13 @@ xServer::xServer(const xServerStart& start)
     AddArgument(*argument);
   }
   Timeout(start.timeout);
-  outReader_.SetDispatch([this](LSP::xReader& message) { Dispatch(message); });
+  diagnostics_.OnDrop([this](const std::string& uri) { deferred_.Message("Diagnostics Dropped: %s\n", uri.c_str()); });
 }
 
-void xServer::Timeout(int milliseconds) { timeout_ = milliseconds < 1 ? kDefaultTimeoutMs : milliseconds; }
+void xServer::Timeout(int milliseconds) {
+  timeout_ = milliseconds < 1 ? kDefaultTimeoutMs : milliseconds;
+  writeLimitMs_ = std::max(timeout_, kMinimumWriteMs);
+}
 
 void xServer::WorkspaceFolders(const std::vector<LSP::WorkspaceFolder>& folders) {
   std::lock_guard<std::mutex> lock(foldersMutex_);
@@ -56,11 +60,14 @@ xServer::~xServer() {
   tracer_.Verbose("Closing language server.....\n");
   Cancel();
   tracer_.Verbose("Closing pipes.....\n");
-  CloseInput();
+  if (streams_) streams_->CloseInput();
   tracer_.Verbose("Waiting for threads to end....\n");
-  JoinReaders();
+  if (streams_) streams_->JoinReaders();
+  deferred_.Deliver();
   tracer_.Verbose("Language server close complete.\n\n");
 }
+
+bool xServer::IsRunning() { return process_.IsRunning() && !(streams_ && streams_->input.TimedOut()); }
 
 bool xServer::Start() {
   std::string reason;
@@ -84,8 +91,7 @@ bool xServer::Start() {
 }
 
 void xServer::Cancel() {
-  outReader_.Stop();
-  errReader_.Stop();
+  if (streams_) streams_->StopReaders();
 }
 
 void xServer::Exception(const Poco::Exception& e) { RecordException(e.message()); }
@@ -103,25 +109,15 @@ const char* xServer::Join(const std::vector<std::string>& list, const char* sepa
   return joined_.c_str();
 }
 
-void xServer::CloseInput() {
-  // The reader's thread may be answering a server request through this pipe.
-  std::lock_guard<std::mutex> lock(writeMutex_);
-  inPipe_.close(Poco::Pipe::CLOSE_WRITE);
-}
-
-void xServer::JoinReaders() {
-  // The readers poll, so they end on their stop flags even when a process that
-  // inherited the pipes keeps them open; only then are the reading ends closed.
-  outThread_.Join();
-  errThread_.Join();
-  outPipe_.close(Poco::Pipe::CLOSE_READ);
-  errPipe_.close(Poco::Pipe::CLOSE_READ);
-}
-
 bool xServer::Launch() {
-  process_.Launch(executable_, arguments_, directory_, &inPipe_, &outPipe_, &errPipe_);
-  errThread_.Start(errReader_);
-  outThread_.Start(outReader_);
+  // The earlier launch's threads end before anything new starts; a server that
+  // outlived its closed input is left to end by itself.
+  streams_.reset();
+  streams_ = std::make_unique<ServerStreams>(deferred_);
+  ServerStreams& streams = *streams_;
+  streams.outReader.SetDispatch([this, &streams](LSP::xReader& message) { Dispatch(streams, message); });
+  process_.Launch(executable_, arguments_, directory_, &streams.inPipe, &streams.outPipe, &streams.errPipe);
+  streams.Start();
   if (tracer_.Messages()) TraceStrayOutput();
   Poco::Thread::sleep(kStartupGraceMs);
   bool running = IsRunning();
@@ -134,9 +130,7 @@ void xServer::ReportFailedStart(const std::string& reason, bool hint) {
     TraceEarlyErrorLines();
     TraceStrayOutput();
   }
-  Cancel();
-  CloseInput();
-  JoinReaders();
+  if (streams_) streams_->Close();
   if (!reason.empty()) tracer_.Error("\nError Reason: %s%s", reason.c_str(), reason.back() == '\n' ? "" : "\n");
   tracer_.Error(
       "The language server failed to start. Make sure the langauge server has been correctly installed.\n\n");
@@ -152,7 +146,8 @@ void xServer::TraceLaunchDetails() {
 }
 
 void xServer::TraceStrayOutput() {
-  xPipeReader* readers[] = {&errReader_, &outReader_};
+  if (!streams_) return;
+  xPipeReader* readers[] = {&streams_->errReader, &streams_->outReader};
   for (xPipeReader* reader : readers) {
     std::string output = reader->TakeOutput();
     if (!output.empty()) tracer_.Text(TraceType::Line, "Message", output.c_str());
@@ -164,7 +159,7 @@ void xServer::TraceEarlyErrorLines() {
   // "not found") tell why it did not start.
   std::string lines;
   std::string line;
-  while (errReader_.Messages().TryPop(line)) lines += line + "\n";
+  while (streams_ && streams_->errReader.Messages().TryPop(line)) lines += line + "\n";
   if (!lines.empty()) tracer_.Text(TraceType::Line, "Message", lines.c_str());
 }
 

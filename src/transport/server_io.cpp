@@ -1,18 +1,30 @@
-// The server's traffic: framing and writing messages (one write path, under one lock),
-// waiting for a reply by its id, and reading it into the caller's response.
+// The server's traffic: framing messages and handing them to the input writer, waiting
+// for a reply by its id, reading it into the caller's response, and answering the
+// server's own requests from the output reader's thread.
+#include <algorithm>
 #include <chrono>
 #include <climits>
 #include <memory>
 #include <stdexcept>
 
-#include "transport/pipe_io.h"
 #include "transport/server.h"
 #include "transport/server_requests.h"
+#include "transport/server_streams.h"
 
 namespace vexil {
 namespace {
 
+using Clock = std::chrono::steady_clock;
+
 constexpr std::chrono::milliseconds kTick{100};
+// However often ignored messages extend the countdown, a wait ends after this many times
+// the countdown's own length: a server that streams progress without answering would
+// otherwise keep the host waiting for ever.
+constexpr int kWaitCapFactor = 10;
+
+std::string Framed(const std::string& body) {
+  return "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
+}
 
 // Adds a line feed to a traced text that lacks one.
 const char* LineEnd(const std::string& text) { return !text.empty() && text.back() == '\n' ? "" : "\n"; }
@@ -31,7 +43,11 @@ bool IsDiagnosticsPublication(const LSP::xObject& message) {
 
 }  // namespace
 
-void xServer::Write(LSP::RequestMessage& message) { WriteMessage(message); }
+void xServer::Write(LSP::RequestMessage& message) {
+  lastRequestId_ = message.id;
+  lastRequestMethod_ = message.method;
+  WriteMessage(message);
+}
 
 void xServer::Write(LSP::NotificationMessage& message) { WriteMessage(message); }
 
@@ -52,16 +68,20 @@ void xServer::Write(const char* text, int length, bool isRequest) {
 }
 
 void xServer::Transmit(const std::string& body, bool reportReaderErrors) {
-  std::string framed = "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
-  std::lock_guard<std::mutex> lock(writeMutex_);
+  deferred_.Deliver();
+  std::string framed = Framed(body);
   tracer_.Message("\nSent: %s\n", framed.c_str());
   if (reportReaderErrors) ReportReaderErrors();
-  WriteAll(inPipe_, framed.data(), framed.size());
+  if (!streams_) return;
+  // A failed write is silent; one that missed its deadline was reported by the writer.
+  streams_->input.Send(std::move(framed), writeLimitMs_);
+  deferred_.Deliver();
 }
 
 void xServer::ReportReaderErrors() const {
   // Never cleared: once a reader has failed, every later write says so again.
-  const xPipeReader* readers[] = {&outReader_, &errReader_};
+  if (!streams_) return;
+  const xPipeReader* readers[] = {&streams_->outReader, &streams_->errReader};
   for (const xPipeReader* reader : readers) {
     std::string errors = reader->Errors();
     if (!errors.empty()) tracer_.Error("\nWrite Error: %s\n", errors.c_str());
@@ -77,13 +97,17 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
   lastWaitTicks_ = 0;
   if (!IsRunning()) return "";
   int countdown = timeout_ / 100 + 1;
+  const Clock::time_point cap = Clock::now() + kWaitCapFactor * countdown * kTick;
+  MessageQueue& replies = streams_->outReader.Messages();
   std::string text;
   while (countdown >= 1) {
     DrainErrorLines();
-    MessageQueue::Wait wait;
+    MessageQueue::Wait wait = MessageQueue::Wait::TimedOut;
     // Only a wait in which nothing arrived uses a tick; the reader's end (the server
     // closed its output) ends the wait at once, since no reply can come any more.
-    while ((wait = outReader_.Messages().WaitPop(text, kTick)) == MessageQueue::Wait::TimedOut) {
+    for (auto left = cap - Clock::now(); left > Clock::duration::zero(); left = cap - Clock::now()) {
+      auto step = std::min(std::chrono::duration_cast<std::chrono::milliseconds>(left), kTick);
+      if ((wait = replies.WaitPop(text, step)) != MessageQueue::Wait::TimedOut) break;
       ++lastWaitTicks_;
       if (--countdown == 0) break;
     }
@@ -106,8 +130,9 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
 }
 
 void xServer::DrainErrorLines() {
+  deferred_.Deliver();
   std::string line;
-  while (errReader_.Messages().TryPop(line)) {
+  while (streams_->errReader.Messages().TryPop(line)) {
     tracer_.Verbose("Reply: %s%s", line.c_str(), LineEnd(line));
   }
 }
@@ -115,13 +140,15 @@ void xServer::DrainErrorLines() {
 void xServer::ReportTimeOut() {
   if (!tracer_.Callback()) return;
   tracer_.Error("Reply: Timed out waiting for reply......\n");
-  tracer_.Error("Output: %s\n", outReader_.TakeOutput().c_str());
+  tracer_.Error("Output: %s\n", streams_->outReader.TakeOutput().c_str());
   tracer_.Error("%s", kTraceLevelHint);
 }
 
 void xServer::CancelRequest(int id) {
-  // Only numbered requests can be cancelled, and only a running server can hear it.
+  // Only numbered requests can be cancelled, and only a running server can hear it. The
+  // protocol has no way to cancel "initialize".
   if (id < 1 || !IsRunning()) return;
+  if (id == lastRequestId_ && lastRequestMethod_ == "initialize") return;
   try {
     LSP::CancelParams params(id);
     LSP::NotificationMessage cancel("$/cancelRequest", &params);
@@ -185,16 +212,30 @@ void xServer::Read(int id, LSP::ResponseMessage& response) {
   }
 }
 
-void xServer::Dispatch(LSP::xReader& message) {
+xServer::Answer xServer::Respond(LSP::xReader& message) {
   LSP::xObject root = message.Root();
-  if (IsDiagnosticsPublication(root)) return StoreDiagnostics(root);
-  if (!IsServerRequest(root)) return;
-  std::vector<LSP::WorkspaceFolder> folders;
-  {
-    std::lock_guard<std::mutex> lock(foldersMutex_);
-    folders = folders_;
+  if (IsDiagnosticsPublication(root)) {
+    StoreDiagnostics(root);
+    return {};
   }
-  Transmit(AnswerServerRequest(root, folders), false);
+  if (!IsServerRequest(root)) return {};
+  std::vector<LSP::WorkspaceFolder> folders = Folders();
+  return {root.Object("method").GetString(), AnswerServerRequest(root, folders)};
+}
+
+void xServer::Dispatch(ServerStreams& streams, LSP::xReader& message) {
+  Answer answer = Respond(message);
+  if (answer.body.empty()) return;
+  // Queued, never written here: this thread must go on draining the server's output
+  // whatever the server does with its input.
+  std::string framed = Framed(answer.body);
+  deferred_.Message("\nSent: %s\n", framed.c_str());
+  streams.input.Answer(std::move(framed), writeLimitMs_, answer.method);
+}
+
+std::vector<LSP::WorkspaceFolder> xServer::Folders() {
+  std::lock_guard<std::mutex> lock(foldersMutex_);
+  return folders_;
 }
 
 void xServer::StoreDiagnostics(const LSP::xObject& notification) {
@@ -205,7 +246,7 @@ void xServer::StoreDiagnostics(const LSP::xObject& notification) {
     published.Read(notification.Object("params"));
     diagnostics_.Publish(published);
   } catch (const std::exception& e) {
-    tracer_.Error("Diagnostics Error: %s\n", e.what());
+    deferred_.Error("Diagnostics Error: %s\n", e.what());
   }
 }
 

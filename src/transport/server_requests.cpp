@@ -11,6 +11,7 @@ namespace vexil {
 namespace {
 
 constexpr int kMethodNotFound = -32601;
+const char* const kInvalidRequest = R"({"jsonrpc":"2.0","id":null,"error":{"code":-32600,"message":"Invalid Request"}})";
 
 // Requests whose answer carries nothing: the client accepts and has nothing to add.
 bool AnsweredWithNull(const std::string& method) {
@@ -24,7 +25,8 @@ bool AnsweredWithNull(const std::string& method) {
 
 // The client has no settings of its own: null for each item asked for.
 void WriteNullSettings(LSP::xWriter& writer, const LSP::xObject& request) {
-  LSP::xObject items = request.Object("params").Object("items");
+  LSP::xObject params = request.Object("params");
+  LSP::xObject items = params.IsObject() ? params.Object("items") : LSP::xObject();
   rapidjson::SizeType count = items.IsArray() ? items.Value().Size() : 0;
   writer.StartArray("result");
   for (rapidjson::SizeType i = 0; i < count; ++i) writer.RawValue("null", LSP::JsonType::Null);
@@ -38,11 +40,15 @@ bool IsServerRequest(const LSP::xObject& message) {
 }
 
 std::string AnswerServerRequest(const LSP::xObject& request, std::vector<LSP::WorkspaceFolder>& folders) {
+  // Only a number or a string can be sent back as it came; anything else (an array
+  // nested a million levels deep included) is not a request.
+  const LSP::JsonValue& id = request.Object("id").Value();
+  if (!id.IsNumber() && !id.IsString()) return kInvalidRequest;
   std::string method = request.Object("method").GetString();
   LSP::xWriter writer;
   writer.StartObject();
   writer.String("jsonrpc", "2.0");
-  writer.Raw("id", request.Object("id").Value());
+  writer.Raw("id", id);
   if (AnsweredWithNull(method) || (method == "workspace/workspaceFolders" && folders.empty())) {
     writer.Null("result");
   } else if (method == "workspace/workspaceFolders") {

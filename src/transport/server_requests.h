@@ -15,7 +15,8 @@ namespace vexil {
 bool IsServerRequest(const LSP::xObject& message);
 
 // The JSON text of our response to `request`, carrying its id back unchanged;
-// "workspace/workspaceFolders" is answered with `folders` (null when there are none).
+// "workspace/workspaceFolders" is answered with `folders` (null when there are none). An
+// id that is neither a number nor a string gets the JSON-RPC "Invalid Request" error.
 std::string AnswerServerRequest(const LSP::xObject& request, std::vector<LSP::WorkspaceFolder>& folders);
 
 }  // namespace vexil

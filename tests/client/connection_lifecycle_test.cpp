@@ -93,6 +93,7 @@ TEST_F(ConnectionLifecycle, AnInitializeThatNeverAnswersStillCountsAsInitialized
   EXPECT_TRUE(server->Start(Init()));
   EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), 1);
   EXPECT_NE(SentBody("initialized"), "");
+  EXPECT_EQ(SentBody("$/cancelRequest"), "");  // the protocol cannot cancel initialize
 }
 
 TEST_F(ConnectionLifecycle, AnErrorReplyFailsInitializeWithTheServersText) {
@@ -103,7 +104,7 @@ TEST_F(ConnectionLifecycle, AnErrorReplyFailsInitializeWithTheServersText) {
   EXPECT_EQ(SentBody("initialized"), "");
 }
 
-TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyAndExitEmptiesTheRegistry) {
+TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyARelaunchWorksAndExitEmptiesTheRegistry) {
   // A 20 s host time-out: waiting for anything but the shutdown reply would last that long.
   xLanguageServer* server = Connection({}, 20000);
   ASSERT_TRUE(server->Start(Init()));
@@ -118,6 +119,16 @@ TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyAndExitEmptiesTheRegistry) {
   EXPECT_TRUE(server->Start(Init()));
   EXPECT_EQ(server->Id(), process);
   EXPECT_NE(SentBody("initialize"), "");
+
+  // Killed: a new Start launches it again, with pipes of its own, on the same connection.
+  vexil_test::KillProcess(process);
+  ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
+  EXPECT_TRUE(server->Start(Init()));
+  EXPECT_NE(server->Id(), process);
+  LSP::TextDocumentPositionParams params;
+  server->TextDocument_Hover(&params);
+  EXPECT_FALSE(server->HaveErrors());
+  EXPECT_FALSE(TraceLog::Contains("Timed out"));
 
   EXPECT_TRUE(server->Shutdown());
   EXPECT_TRUE(server->Exit());

@@ -1,41 +1,12 @@
 // A reply text parsed by xReader and read into every result class, as the transport does
-// with a server's answer. Type errors are thrown and caught by the transport; anything
-// else (a crash, a sanitizer report, another kind of exception) is a fault.
+// with a server's answer.
 #include <cstdint>
-#include <exception>
 #include <string>
 
-#include "vexil/protocol/feature_results.h"
-#include "vexil/protocol/initialize.h"
-#include "vexil/protocol/message.h"
-#include "vexil/protocol/structures.h"
-
-namespace {
-
-void ReadInto(LSP::xReader& reader, LSP::Result& result) {
-  LSP::ResponseMessage response(&result);
-  try {
-    response.Read(reader);
-  } catch (const std::exception&) {
-  }
-}
-
-}  // namespace
+#include "read_results.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
   LSP::xReader reader;
-  if (!reader.Parse(std::string(reinterpret_cast<const char*>(data), size))) return 0;
-  LSP::Hover hover;
-  LSP::SignatureHelp signatureHelp;
-  LSP::CompletionList completion;
-  LSP::LocationsList locations;
-  LSP::SymbolInformationList symbols("file:///a.c");
-  LSP::DocumentFormattingList formatting;
-  LSP::WorkspaceEdit edit;
-  LSP::InitializeResult initialize;
-  for (LSP::Result* result : std::initializer_list<LSP::Result*>{&hover, &signatureHelp, &completion, &locations,
-                                                                 &symbols, &formatting, &edit, &initialize}) {
-    ReadInto(reader, *result);
-  }
+  if (reader.Parse(std::string(reinterpret_cast<const char*>(data), size))) fuzz::ReadIntoEveryResult(reader);
   return 0;
 }

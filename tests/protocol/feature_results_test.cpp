@@ -138,6 +138,18 @@ TEST(SymbolInformationList, HierarchicalSymbolsTakeTheRequestedDocumentAndTheirR
   EXPECT_EQ(workspace.items[0].location.uri, "");
   EXPECT_EQ(workspace.items[0].location.range.start.line, -1);
   EXPECT_EQ(ThrownText([&] { ReadResult("{}", workspace); }), "Expecting a array JSON object but found 3 JSON object .");
+
+  // Reading nests as deep as the tree: 1,000 levels read, deeper ones are malformed.
+  for (int depth : {1000, 1001, 300000}) {
+    std::string tree;
+    for (int level = 0; level < depth; ++level) tree += R"({"name":"s","kind":5,"children":[)";
+    for (int level = 0; level < depth; ++level) tree += "]}";
+    LSP::SymbolInformationList nested("file:///deep.css");
+    std::string thrown = ThrownText([&] { ReadResult("[" + tree + "]", nested); });
+    EXPECT_EQ(thrown.find("Failed to read JSON object: nested deeper than 1000 levels") != std::string::npos,
+              depth > 1000)
+        << depth << ": " << thrown;
+  }
 }
 
 TEST(DocumentFormattingList, ReadsEditsAsAnArrayOnly) {

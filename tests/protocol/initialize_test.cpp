@@ -53,6 +53,13 @@ TEST(InitializationOptions, OnlyTheWrappedMemberOfValidJsonReachesTheServer) {
   EXPECT_EQ(OptionsWritten(R"({"initializationOptions":"text"})"), R"("initializationOptions":"text",)");
   EXPECT_EQ(OptionsWritten(R"({"initializationOptions":null})"), R"("initializationOptions":null,)");
   EXPECT_EQ(OptionsWritten(R"( { "initializationOptions" : { "b" : true } } )"), R"("initializationOptions":{"b":true},)");
+  // Options are written out recursively: nesting beyond 1,000 levels is dropped.
+  for (std::size_t depth : {1000, 1001, 300000}) {
+    std::string nested = std::string(depth, '[') + std::string(depth, ']');
+    EXPECT_EQ(OptionsWritten(R"({"initializationOptions":)" + nested + "}"),
+              depth > 1000 ? "" : R"("initializationOptions":)" + nested + ",")
+        << depth;
+  }
 }
 
 TEST(ClientInfo, WritesNameAndVersionUnderItsKeyLeavingOutEmptyTexts) {

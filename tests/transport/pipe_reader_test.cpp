@@ -9,8 +9,6 @@
 #include <thread>
 #include <vector>
 
-#include <Poco/Exception.h>
-
 #include "transport/pipe_io.h"
 #include "transport/pipe_reader.h"
 #include "transport/reader_thread.h"
@@ -25,7 +23,9 @@ std::string Frame(const std::string& body) {
   return "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
 }
 
-void Send(const Poco::Pipe& pipe, const std::string& bytes) { vexil::WriteAll(pipe, bytes.data(), bytes.size()); }
+void Send(const Poco::Pipe& pipe, const std::string& bytes) {
+  ASSERT_EQ(vexil::WriteAll(pipe, bytes.data(), bytes.size(), std::chrono::steady_clock::now() + 60s), vexil::PipeWrite::Written);
+}
 
 // A reader over a fresh pipe, running on its own thread; stopped and joined at the end.
 template <typename Reader>
@@ -82,7 +82,10 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
   Poco::Pipe pipe;
   vexil::xPipeReader reader("stdout", pipe);
   std::vector<std::string> seen;  // written on the reader's thread, read after the join
-  reader.SetDispatch([&](LSP::xReader& message) { seen.push_back(message.Root().String("method")); });
+  reader.SetDispatch([&](LSP::xReader& message) {
+    seen.push_back(message.Root().String("method"));
+    if (seen.back() == "fake/fail") throw std::runtime_error(std::string(100, 'e') + std::to_string(seen.size()));
+  });
   vexil::ReaderThread thread;  // the hook must be set before the thread starts
   thread.Start(reader);
   const std::vector<std::string> bodies = {
@@ -93,9 +96,20 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
   };
   for (const std::string& body : bodies) Send(pipe, Frame(body));
   for (const std::string& body : bodies) EXPECT_EQ(Pop(reader), body);
+  // A failing hook is recorded as a read error; the record keeps its newest lines.
+  const std::string failing = Frame(R"({"jsonrpc":"2.0","method":"fake/fail"})");
+  std::string failures;
+  for (int i = 0; i < 1000; ++i) failures += failing;
+  Send(pipe, failures);
   pipe.close(Poco::Pipe::CLOSE_WRITE);
   thread.Join();
-  EXPECT_EQ(seen, (std::vector<std::string>{"window/logMessage", "workspace/configuration"}));
+  EXPECT_EQ(std::vector<std::string>(seen.begin(), seen.begin() + 2),
+            (std::vector<std::string>{"window/logMessage", "workspace/configuration"}));
+  std::string errors = reader.Errors();
+  EXPECT_LE(errors.size(), vexil::xPipeReader::kErrorsLimit);
+  EXPECT_GT(errors.size(), vexil::xPipeReader::kErrorsLimit / 2);
+  EXPECT_EQ(errors.rfind("Exception: ", 0), 0u);
+  EXPECT_EQ(errors.substr(errors.size() - 6), "e1002\n");
 }
 
 TEST(PipeReader, ErrorReaderQueuesLinesAndKeepsNoOutput) {
@@ -162,11 +176,28 @@ TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
   EXPECT_EQ(Newest(out.reader.Messages()), R"({"id":1})");
 }
 
-TEST(PipeIo, WritingToAPipeNobodyReadsFailsWithoutSignallingTheProcess) {
-  Poco::Pipe pipe;
-  pipe.close(Poco::Pipe::CLOSE_READ);
-  EXPECT_THROW(Send(pipe, "Content-Length: 2\r\n\r\n{}"), Poco::WriteFileException);
-  EXPECT_THROW(Send(pipe, "again"), Poco::WriteFileException);  // still alive to try twice
+TEST(PipeIo, BoundedWritesEndByTheirCauseWithoutSignallingTheProcess) {
+  const std::string big(std::size_t{4} << 20, 'x');  // more than any pipe holds
+  struct Row {
+    const char* name;
+    bool readerGone, stopped;
+    std::chrono::milliseconds limit;
+    vexil::PipeWrite expected;
+  } rows[] = {
+      {"reader gone", true, false, 60s, vexil::PipeWrite::Failed},
+      {"nobody reads", false, false, 300ms, vexil::PipeWrite::TimedOut},
+      {"stop requested", false, true, 60s, vexil::PipeWrite::Stopped},
+  };
+  for (const Row& row : rows) {
+    Poco::Pipe pipe;
+    if (row.readerGone) pipe.close(Poco::Pipe::CLOSE_READ);
+    std::atomic<bool> stop{row.stopped};
+    for (int attempt = 0; attempt < 2; ++attempt) {  // still alive to try twice
+      auto begin = std::chrono::steady_clock::now();
+      EXPECT_EQ(vexil::WriteAll(pipe, big.data(), big.size(), begin + row.limit, &stop), row.expected) << row.name;
+      EXPECT_LT(std::chrono::steady_clock::now() - begin, 30s) << row.name;
+    }
+  }
 }
 
 }  // namespace

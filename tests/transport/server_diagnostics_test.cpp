@@ -1,5 +1,6 @@
 // Publications stored as they arrive: while the host waits for nothing, in a burst that
-// only the newest per document survives, cleared by empty lists, and dropped when malformed.
+// only the newest per document survives, cleared by empty lists, bounded in memory, and
+// dropped when malformed.
 #include <gtest/gtest.h>
 
 #include <string>
@@ -71,6 +72,23 @@ TEST_F(ServerDiagnostics, ABurstKeepsOnlyTheNewestListOfEachDocument) {
     ASSERT_EQ(diagnostics.size(), 1u) << Doc(document);
     EXPECT_EQ(diagnostics[0].message, "pass 9") << Doc(document);
   }
+}
+
+TEST_F(ServerDiagnostics, PastTheLimitTheDocumentsLongestWithoutAPublicationAreDropped) {
+  vexil::xServer server(FakeStart({}, 2000, LSP::TraceLevel::Messages));
+  ASSERT_TRUE(server.Start());
+  const std::string twelveMiB = R"(,"count":1,"padding":12582912})";
+  Publish(server, R"({"documents":2,"count":2,"padding":12582912})");
+  Publish(server, R"({"from":0)" + twelveMiB);  // the first document is the newest again
+  Publish(server, R"({"from":2)" + twelveMiB);  // 36 MiB: the second one gives way
+  ASSERT_TRUE(ReachesVersion(server, 4));
+  EXPECT_TRUE(server.Diagnostics().Of(Doc(1)).empty());
+  EXPECT_EQ(server.Diagnostics().Of(Doc(0)).size(), 1u);
+  EXPECT_EQ(server.Diagnostics().Of(Doc(2)).size(), 1u);
+  EXPECT_LE(server.Diagnostics().Bytes(), vexil::DiagnosticsStore::kByteLimit);
+  Publish(server, R"({"count":0})");  // the reader's lines are traced by the host's next exchange
+  EXPECT_EQ(TraceLog::Count("Diagnostics Dropped: " + Doc(1) + "\n"), 1);
+  EXPECT_FALSE(TraceLog::Contains("Diagnostics Dropped: " + Doc(0)));
 }
 
 TEST_F(ServerDiagnostics, AMalformedPublicationIsDroppedWithoutFailingTheReader) {

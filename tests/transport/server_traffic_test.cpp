@@ -1,8 +1,14 @@
 // Requests and replies against the fake server: tick counting, ignored messages, error
-// replies by id, server requests answered, dead servers, and big or split frames.
+// replies by id, server requests answered, dead servers, big or split frames, servers
+// that misbehave in every way that once hung or crashed the host, and a blocking callback.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
+#include <condition_variable>
+#include <filesystem>
+#include <functional>
+#include <mutex>
 #include <string>
 #include <thread>
 
@@ -230,8 +236,156 @@ TEST_F(ServerTraffic, AServerThatDiesWhileAwaitedEndsTheWaitAtOnce) {
 
   // Killed in the middle of a frame: what it had sent of the header is the stray output.
   auto crashing = Started(30000);
-  Ask(*crashing, "fake/crash", "", result);
+  Ask(*crashing, "fake/crash", R"({"delay":500})", result);
   EXPECT_EQ(TraceLog::Count("Output: Content-Length: \n"), 1);
+}
+
+// A didOpen whose text is more than any pipe holds.
+void WriteBigText(vexil::xServer& server) {
+  FakeParams text(R"({"textDocument":{"text":")" + std::string(std::size_t{1} << 20, 'x') + R"("}})");
+  LSP::NotificationMessage open("textDocument/didOpen", &text);
+  server.Write(open);
+}
+
+enum class Next { Works, TimesOut, FailsFast };
+
+// A server that misbehaves, the call that once hung or crashed the host on it, the lines
+// that call traces once each, and what becomes of the next request.
+struct Misbehaviour {
+  const char* name;
+  std::vector<std::string> directives;
+  std::function<void(vexil::xServer&)> call;
+  Texts traced;
+  Next next;
+  int timeout = 200;
+};
+
+std::function<void(vexil::xServer&)> Answered(const std::string& params, bool read = true) {
+  return [params, read](vexil::xServer& server) {
+    TextResult result;
+    Ask(server, "fake/echo", params, result);
+    EXPECT_EQ(result.read, read);
+  };
+}
+
+TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
+  vexil_test::TempDirectory scratch;
+  const std::string writeTimeout = "Write Timeout: the server read nothing for 5000 ms; its input is closed.\n";
+  const std::string deep = R"({"deep":{"depth":300000,"in":")";
+  const Misbehaviour rows[] = {
+      {"asks while the host writes a big text, then writes more than a pipe holds", {},
+       [](vexil::xServer& server) {
+         // The server asks only once the host's write has filled its input.
+         FakeParams asking(R"({"delay":500,"ask":["window/workDoneProgress/create"],"chatter":2000})");
+         LSP::RequestMessage request("fake/echo", &asking);
+         server.Write(request);
+         WriteBigText(server);
+         TextResult result;
+         LSP::ResponseMessage response(&result);
+         server.Read(request.id, response);
+         EXPECT_EQ(result.answers, 1u);
+       },
+       {}, Next::Works, 2000},  // every later reply lists the big text the server received
+      {"stops reading", {"hang"}, WriteBigText, {writeTimeout}, Next::FailsFast},
+      {"asks and never reads the answers", {"send=window/workDoneProgress/create:3000", "hang"}, Answered("", false),
+       {writeTimeout}, Next::FailsFast},
+      {"streams progress and never answers in time", {}, Answered(R"({"trickle":3500})", false),
+       {"Reply: Timed out waiting for reply......\n"}, Next::Works},
+      // 600 KB frames, parsed up to three times, take their time under the sanitizers.
+      {"nests a notification 300,000 deep", {}, Answered(deep + R"(notification"}})"), {}, Next::Works, 2000},
+      {"nests a request's id 300,000 deep", {}, Answered(deep + R"(id"}})"),
+       {Sent(R"({"jsonrpc":"2.0","id":null,"error":{"code":-32600,"message":"Invalid Request"}})")}, Next::Works, 2000},
+      {"nests a reply 300,000 deep", {}, Answered(deep + R"(result"}})", false), {}, Next::Works, 2000},
+      {"closed its input, then asks", {"close-stdin", "send=window/workDoneProgress/create:1", "hang"},
+       [](vexil::xServer& server) {
+         FakeParams none("");
+         LSP::NotificationMessage note("fake/note", &none);
+         EXPECT_TRUE(WaitFor([&] {
+           server.Write(note);  // the failed answer is traced by the host's next exchange
+           return TraceLog::Contains("Answer Failed");
+         }));
+       },
+       {"Answer Failed: window/workDoneProgress/create: the server's input is closed\n"}, Next::TimesOut},
+      {"died: Start launches it again", {},
+       [](vexil::xServer& server) {
+         KillServer(server);
+         EXPECT_TRUE(server.Start());
+       },
+       {}, Next::Works},
+      {"failed to start: Start launches it again", {"fail-once=" + scratch / "failed"},
+       [](vexil::xServer& server) {
+         EXPECT_FALSE(server.IsRunning());
+         EXPECT_TRUE(server.Start());
+       },
+       {}, Next::Works},
+  };
+  for (const Misbehaviour& row : rows) {
+    SCOPED_TRACE(row.name);
+    vexil::xServer server(FakeStart(row.directives, row.timeout, LSP::TraceLevel::Messages));
+    server.Start();
+    TraceLog::Clear();
+    // Writes get 5 s and waits at most 3 s here: a hang is told apart by far.
+    auto begin = std::chrono::steady_clock::now();
+    row.call(server);
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, 40s);
+    for (const std::string& line : row.traced) EXPECT_EQ(TraceLog::Count(line), 1) << line;
+
+    TraceLog::Clear();
+    begin = std::chrono::steady_clock::now();
+    TextResult result;
+    Ask(server, "fake/echo", "", result);
+    EXPECT_LT(std::chrono::steady_clock::now() - begin, 30s);
+    EXPECT_EQ(result.read, row.next == Next::Works);
+    EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), row.next == Next::TimesOut ? 1 : 0);
+    if (row.next == Next::FailsFast) {
+      EXPECT_STREQ(server.ErrorMessage(), "A server read was requested but the server is not running.");
+    }
+    EXPECT_FALSE(TraceLog::Contains("Write Error"));  // a failed answer is no reader error
+    const std::vector<std::string>& directives = row.directives;
+    if (std::find(directives.begin(), directives.end(), "hang") != directives.end()) vexil_test::KillProcess(server.Id());
+  }
+}
+
+// A host that hands each line to another thread (its UI thread) and waits until that
+// thread has taken it; the other thread takes lines only once the server got its answer.
+class HandedOverLines {
+ public:
+  static void Callback(TraceType, const char*, const char*) {
+    std::unique_lock<std::mutex> lock(mutex_);
+    taken_.wait(lock, [] { return open_; });
+  }
+  static void Open(bool open) {
+    std::lock_guard<std::mutex> lock(mutex_);
+    open_ = open;
+    taken_.notify_all();
+  }
+
+ private:
+  static inline std::mutex mutex_;
+  static inline std::condition_variable taken_;
+  static inline bool open_ = true;
+};
+
+TEST_F(ServerTraffic, ACallbackThatWaitsForAnotherThreadHoldsUpNothingElse) {
+  vexil_test::TempDirectory scratch;
+  const std::string answered = scratch / "answered";
+  // The server asks once the host is inside its callback, and goes on only once answered.
+  xServerStart start = FakeStart({"pause=500", "send=window/workDoneProgress/create:1", "await=1",
+                                  "flood-done=" + answered},
+                                 2000, LSP::TraceLevel::Messages);
+  start.trace = &HandedOverLines::Callback;
+  vexil::xServer server(start);
+  ASSERT_TRUE(server.Start());
+  HandedOverLines::Open(false);
+  std::thread uiThread([&] {
+    WaitFor([&] { return std::filesystem::exists(answered); }, 30s);
+    HandedOverLines::Open(true);
+  });
+  FakeParams none("");
+  LSP::NotificationMessage note("fake/note", &none);
+  server.Write(note);  // its "Sent" line blocks until the server has been answered
+  uiThread.join();
+  EXPECT_TRUE(std::filesystem::exists(answered));
 }
 
 }  // namespace

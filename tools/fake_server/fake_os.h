@@ -14,6 +14,8 @@ constexpr int kStderr = 2;
 void PrepareProcess(const char* self, unsigned lifetimeSeconds);
 // Reads up to `size` bytes of standard input; 0 or less at end of input.
 long ReadInput(char* buffer, unsigned size);
+// Closes standard input, so that the client's writes fail.
+void CloseInput();
 // Writes to standard output (kStdout) or error (kStderr); the count written, or 0 or less.
 long WriteOutput(int stream, const char* bytes, unsigned size);
 std::string CurrentDirectory();

@@ -27,6 +27,8 @@ void PrepareProcess(const char* path, unsigned lifetimeSeconds) {
 
 long ReadInput(char* buffer, unsigned size) { return static_cast<long>(read(STDIN_FILENO, buffer, size)); }
 
+void CloseInput() { close(STDIN_FILENO); }
+
 long WriteOutput(int stream, const char* bytes, unsigned size) { return static_cast<long>(write(stream, bytes, size)); }
 
 std::string CurrentDirectory() {

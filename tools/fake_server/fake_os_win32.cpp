@@ -24,6 +24,8 @@ void PrepareProcess(const char*, unsigned lifetimeSeconds) {
 
 long ReadInput(char* buffer, unsigned size) { return _read(0, buffer, size); }
 
+void CloseInput() { _close(0); }
+
 long WriteOutput(int stream, const char* bytes, unsigned size) { return _write(stream, bytes, size); }
 
 std::string CurrentDirectory() {

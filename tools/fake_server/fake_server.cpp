@@ -17,18 +17,27 @@
 //   flood-stdout=BYTES        write that many bytes of text without any header to stdout
 //   flood-notifications=N     send N notifications
 //   flood-done=PATH           create PATH once every flood above is written
+//   send=METHOD:N             send N requests METHOD to the client (ids 0 to N-1), reading nothing
+//   await=N                   read until N answers from the client have come
+//   close-stdin               close standard input, so that the client's writes fail
+//   pause=MS                  wait MS milliseconds before the next directive
+//   fail-once=PATH            exit with code 1 unless PATH exists, creating it
 //   diagnose                  publish diagnostics of opened and changed documents (below)
 // Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/crash" (half a
-// frame, then killed), "fake/cwd", "fake/received" (the notifications seen so far),
+// frame, then killed after params.delay ms), "fake/cwd", "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
 // params: delay (ms), stderr, garbage (raw stdout text), notifications (count), stale
-// (ids answered first), ask (methods sent to the client, each answer awaited),
-// askSameId, error {code, message, id: "same"|"null"|"none"|number}, unparsable,
-// size (bytes of "data" in the result), split (write the answer in pieces of this size).
+// (ids answered first), ask (methods sent to the client, each answer awaited), chatter
+// (notifications sent after each asked method, before its answer is read), askSameId,
+// error {code, message, id: "same"|"null"|"none"|number}, unparsable, size (bytes of "data"
+// in the result), split (write the answer in pieces of this size), trickle (ms of one
+// notification every 50 ms before answering), deep {depth, in: "notification"|"id"|"result"}
+// (arrays nested depth levels deep as a notification's params, a request's id or the result).
 // The notification "fake/publish" makes the server publish diagnostics at once, while the
 // client waits for nothing: params.count publications, one document after another of
-// params.documents ("file:///fake/doc<N>.cpp"); publication K for a document reports
-// "pass K" on line K with code "fake<K>", or nothing when params.empty is true.
+// params.documents ("file:///fake/doc<N>.cpp", N from params.from); publication K for a document reports
+// "pass K" (and params.padding dots) on line K with code "fake<K>", or nothing when
+// params.empty is true.
 // With the start-up directive "diagnose", after each didOpen and each whole-text didChange
 // the server publishes, like a real one, an error "found error" (code "fake-error") for
 // every line of the text that holds "error".
@@ -129,6 +138,26 @@ void Flood(int descriptor, const std::string& pattern, long long total) {
   }
 }
 
+// Arrays nested `depth` levels deep.
+std::string Nested(int depth) { return std::string(static_cast<std::size_t>(depth), '[') + std::string(static_cast<std::size_t>(depth), ']'); }
+
+std::string Request(const std::string& id, const std::string& method) {
+  return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"method\":" + Quote(method) +
+         ",\"params\":{\"items\":[{\"section\":\"a\"},{\"section\":\"b\"}]}}";
+}
+
+// Reads until the client's answer to one of our requests; its notifications on the way
+// are kept as received. Ends the server when the input ends.
+std::string ReadAnswer() {
+  std::string body;
+  while (fake::ReadMessage(body)) {
+    Json message;
+    if (message.Parse(body.c_str()).HasParseError() || !message.IsObject() || !message.HasMember("method")) return body;
+    received.push_back(body);
+  }
+  std::_Exit(0);
+}
+
 void SendNotifications(int count) {
   for (int i = count; i > 0; --i) {
     Send("{\"jsonrpc\":\"2.0\",\"method\":\"fake/progress\",\"params\":{\"left\":" + std::to_string(i) + "}}");
@@ -158,6 +187,19 @@ void StartUp(const std::string& directive, Options& options) {
   else if (key == "flood-stdout") Flood(fake::kStdout, "progress: indexing file 17 of 2000\n", std::atoll(value.c_str()));
   else if (key == "flood-notifications") SendNotifications(std::atoi(value.c_str()));
   else if (key == "flood-done") std::ofstream(value).put('\n');
+  else if (key == "send") {
+    auto [method, count] = MethodAndValue(value);
+    for (int id = 0; id < std::atoi(count.c_str()); ++id) Send(Request(std::to_string(id), method));
+  }
+  else if (key == "await") {
+    for (int i = std::atoi(value.c_str()); i > 0; --i) ReadAnswer();
+  }
+  else if (key == "close-stdin") fake::CloseInput();
+  else if (key == "pause") Pause(std::atoi(value.c_str()));
+  else if (key == "fail-once" && !std::ifstream(value)) {
+    std::ofstream(value).put('\n');
+    std::_Exit(1);
+  }
 }
 
 bool Refused(const std::string& method) {
@@ -180,12 +222,9 @@ std::vector<std::string> AskClient(const std::string& method, const rapidjson::V
   std::vector<std::string> answers;
   int next = 0;
   for (const std::string& asked : methods) {
-    std::string id = sameId ? requestId : std::to_string(next++);
-    Send("{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"method\":" + Quote(asked) +
-         ",\"params\":{\"items\":[{\"section\":\"a\"},{\"section\":\"b\"}]}}");
-    std::string answer;
-    if (!fake::ReadMessage(answer)) std::_Exit(0);
-    answers.push_back(answer);
+    Send(Request(sameId ? requestId : std::to_string(next++), asked));
+    SendNotifications(IntParam(params, "chatter"));
+    answers.push_back(ReadAnswer());
   }
   return answers;
 }
@@ -218,9 +257,17 @@ std::string Result(const std::string& method, const rapidjson::Value& params, co
   return result.str();
 }
 
+// The "in" member of the params' deep script; empty when there is none.
+std::string DeepIn(const rapidjson::Value& params) {
+  return params.HasMember("deep") && params["deep"].IsObject() ? StringParam(params["deep"], "in") : "";
+}
+
 std::string Answer(const std::string& method, const rapidjson::Value& params, const std::string& id,
                    const std::vector<std::string>& answers, const Options& options) {
   if (params.HasMember("unparsable")) return "this is not json";
+  if (DeepIn(params) == "result") {
+    return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"result\":" + Nested(IntParam(params["deep"], "depth")) + "}";
+  }
   if (Refused(method)) {
     return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"error\":{\"code\":-32603,\"message\":" + Quote("refused " + method) + "}}";
   }
@@ -248,6 +295,17 @@ void Prelude(const std::string& method, const rapidjson::Value& params) {
   if (params.HasMember("stderr")) fake::WriteRaw(fake::kStderr, fake::Unescape(StringParam(params, "stderr")));
   if (params.HasMember("garbage")) fake::WriteRaw(fake::kStdout, fake::Unescape(StringParam(params, "garbage")));
   SendNotifications(IntParam(params, "notifications"));
+  for (int left = IntParam(params, "trickle"); left > 0; left -= 50) {
+    SendNotifications(1);
+    Pause(50);
+  }
+  std::string deepIn = DeepIn(params);
+  if (deepIn == "notification") {
+    Send("{\"jsonrpc\":\"2.0\",\"method\":\"fake/deep\",\"params\":{\"value\":" + Nested(IntParam(params["deep"], "depth")) + "}}");
+  } else if (deepIn == "id") {
+    Send(Request(Nested(IntParam(params["deep"], "depth")), "window/workDoneProgress/create"));
+    ReadAnswer();
+  }
   if (params.HasMember("stale") && params["stale"].IsArray()) {
     for (const rapidjson::Value& stale : params["stale"].GetArray()) {
       Send("{\"jsonrpc\":\"2.0\",\"id\":" + Text(stale) + ",\"result\":null}");
@@ -255,11 +313,11 @@ void Prelude(const std::string& method, const rapidjson::Value& params) {
   }
 }
 
-std::string PublishedDiagnostic(int pass) {
+std::string PublishedDiagnostic(int pass, int padding) {
   std::string line = std::to_string(pass);
   return "{\"range\":{\"start\":{\"line\":" + line + ",\"character\":0},\"end\":{\"line\":" + line +
          ",\"character\":4}},\"severity\":" + std::to_string(pass % 2 + 1) + ",\"code\":\"fake" + line +
-         "\",\"source\":\"fake\",\"message\":\"pass " + line + "\"}";
+         "\",\"source\":\"fake\",\"message\":\"pass " + line + std::string(static_cast<std::size_t>(padding), '.') + "\"}";
 }
 
 void SendPublication(const std::string& uri, const std::string& diagnostics) {
@@ -271,8 +329,8 @@ void Publish(const rapidjson::Value& params) {
   int documents = std::max(1, IntParam(params, "documents"));
   bool empty = params.HasMember("empty") && params["empty"].IsTrue();
   for (int i = 0; i < IntParam(params, "count"); ++i) {
-    std::string uri = "file:///fake/doc" + std::to_string(i % documents) + ".cpp";
-    SendPublication(uri, empty ? "" : PublishedDiagnostic(i / documents));
+    std::string uri = "file:///fake/doc" + std::to_string(IntParam(params, "from") + i % documents) + ".cpp";
+    SendPublication(uri, empty ? "" : PublishedDiagnostic(i / documents, IntParam(params, "padding")));
   }
 }
 
@@ -313,6 +371,7 @@ void HandleRequest(const std::string& method, const rapidjson::Value& params, co
   if (method == "fake/exit") std::_Exit(IntParam(params, "code"));
   if (method == "fake/crash") {
     fake::WriteRaw(fake::kStdout, "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
+    Pause(IntParam(params, "delay"));
     fake::Crash();
   }
   Prelude(method, params);

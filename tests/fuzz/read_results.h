@@ -1,0 +1,35 @@
+// Reads one parsed reply into every result class, as the transport does with a server's
+// answer. Type errors are thrown and caught by the transport; anything else (a crash, a
+// sanitizer report, another kind of exception) is a fault.
+#pragma once
+
+#include <exception>
+#include <initializer_list>
+
+#include "vexil/protocol/feature_results.h"
+#include "vexil/protocol/initialize.h"
+#include "vexil/protocol/message.h"
+#include "vexil/protocol/structures.h"
+
+namespace fuzz {
+
+inline void ReadIntoEveryResult(LSP::xReader& reader) {
+  LSP::Hover hover;
+  LSP::SignatureHelp signatureHelp;
+  LSP::CompletionList completion;
+  LSP::LocationsList locations;
+  LSP::SymbolInformationList symbols("file:///a.c");
+  LSP::DocumentFormattingList formatting;
+  LSP::WorkspaceEdit edit;
+  LSP::InitializeResult initialize;
+  for (LSP::Result* result : std::initializer_list<LSP::Result*>{&hover, &signatureHelp, &completion, &locations,
+                                                                 &symbols, &formatting, &edit, &initialize}) {
+    LSP::ResponseMessage response(result);
+    try {
+      response.Read(reader);
+    } catch (const std::exception&) {
+    }
+  }
+}
+
+}  // namespace fuzz
