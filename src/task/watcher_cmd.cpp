@@ -16,6 +16,8 @@ namespace {
 constexpr int kDefaultTimeoutMs = 5000;
 // The child is looked at this often; the time-out is honoured to this grain.
 constexpr int kPollMs = 100;
+// While a finished child's last output is read, it is traced this often.
+constexpr int kDrainStepMs = 10;
 
 bool AnyInterpreted(const std::vector<std::string>& values) {
   return std::any_of(values.begin(), values.end(), InterpreterWouldInterpret);
@@ -25,7 +27,7 @@ bool AnyInterpreted(const std::vector<std::string>& values) {
 
 xWatcherCmd::xWatcherCmd(const std::string& name, const xFileTags& tags, const xWatcherOptions& options)
     : tracer_(options.trace, options.level),
-      reader_("stdout", outPipe_),
+      reader_(outPipe_),
       useCommand_(options.useCommand),
       timeout_(options.timeout < 1 ? kDefaultTimeoutMs : options.timeout),
       name_(name),
@@ -191,17 +193,25 @@ void xWatcherCmd::RecordException(const std::string& text) {
   }
   if (!tracer_.Callback()) return;
   tracer_.Error("Error: %s\n\n", text.c_str());
-  const std::string output = reader_.TakeOutput();
+  std::string output, line;
+  for (std::size_t count = reader_.LinesHeld(); count > 0 && reader_.TakeLine(line); --count) output += line + "\n";
   if (!output.empty()) tracer_.Error("%s\n\n", output.c_str());
 }
 
 void xWatcherCmd::TraceOutput() {
-  // Taken at every level, so that unreported output does not pile up.
-  const std::string output = reader_.TakeOutput();
-  if (!output.empty() && tracer_.Messages()) tracer_.Text(TraceType::Line, "Message", output.c_str());
+  // Taken at every level, so that unreported output does not hold the child up. Only the
+  // lines there now: a child that writes on must not keep the poll from looking at it.
+  std::string line;
+  for (std::size_t count = reader_.LinesHeld(); count > 0 && reader_.TakeLine(line); --count)
+    if (tracer_.Messages()) tracer_.Message("%s\n", line.c_str());
 }
 
-void xWatcherCmd::DrainOutput() { readerThread_.TryJoin(ReaderGrace()); }
+void xWatcherCmd::DrainOutput() {
+  const auto end = std::chrono::steady_clock::now() + ReaderGrace();
+  // A reader waiting for its lines to be taken would otherwise never get to the end.
+  while (!readerThread_.TryJoin(std::chrono::milliseconds(kDrainStepMs)) && std::chrono::steady_clock::now() < end)
+    TraceOutput();
+}
 
 bool xWatcherCmd::WaitPollInterval() {
   std::unique_lock<std::mutex> lock(waitMutex_);
