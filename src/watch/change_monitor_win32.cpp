@@ -12,7 +12,6 @@
 #include <cstdint>
 #include <map>
 #include <mutex>
-#include <optional>
 #include <thread>
 #include <utility>
 
@@ -205,7 +204,9 @@ class CompletionPortBackend final : public MonitorBackend {
   using Watches = std::map<OVERLAPPED*, std::unique_ptr<WatchInfo>>;
 
   void Drain(OVERLAPPED* aborted);
-  void HandleCompletion(DWORD bytes, OVERLAPPED* overlapped, Deliveries& deliveries);
+  // Parses a completion under the lock; true when the watch reads on once it is delivered.
+  bool HandleCompletion(DWORD bytes, OVERLAPPED* overlapped, Deliveries& deliveries);
+  void ReadAgain(OVERLAPPED* overlapped);
   bool IssueRead(WatchInfo& watch);
   void Parse(const WatchInfo& watch, Deliveries& deliveries) const;
   bool AnyStopping();
@@ -309,11 +310,13 @@ void CompletionPortBackend::Run() {
     }
     if (key == WakeKey()) break;
     Deliveries deliveries;
+    bool readAgain = false;
     {
       std::lock_guard<std::mutex> lock(mutex_);
-      HandleCompletion(bytes, overlapped, deliveries);
+      readAgain = HandleCompletion(bytes, overlapped, deliveries);
     }
     Deliver(deliveries);
+    if (readAgain) ReadAgain(overlapped);
   }
   LoopEnded();
   if (!error || (failed && StopRequested())) return Drain(failed);
@@ -345,26 +348,39 @@ void CompletionPortBackend::Drain(OVERLAPPED* aborted) {
   }
 }
 
-void CompletionPortBackend::HandleCompletion(DWORD bytes, OVERLAPPED* overlapped, Deliveries& deliveries) {
+bool CompletionPortBackend::HandleCompletion(DWORD bytes, OVERLAPPED* overlapped, Deliveries& deliveries) {
   const auto found = watches_.find(overlapped);
   if (found == watches_.end()) {
     deliveries.push_back({Delivery::Kind::Text, 0, {}, "WatchInfo was not found for filesystem event.\n"});
-    return;
+    return false;
   }
   WatchInfo& watch = *found->second;
   if (watch.state == WatchState::Reading) watch.state = WatchState::Idle;
   if (watch.state == WatchState::Stopping) {
     watches_.erase(found);
-    return;
+    return false;
   }
   if (bytes == 0) {  // the buffer overflowed: changes were lost, so the watch goes quiet
     deliveries.push_back({Delivery::Kind::WatchError, watch.id, {}, {}});
-    return;
+    return false;
   }
   Parse(watch, deliveries);
-  if (IssueRead(watch)) return;
-  deliveries.push_back({Delivery::Kind::WatchError, watch.id, {}, {}});
-  watches_.erase(found);
+  return true;
+}
+
+// After the handler, as a read's changes were always handled before the next read: what
+// happens meanwhile waits in the system's buffer and comes as one batch.
+void CompletionPortBackend::ReadAgain(OVERLAPPED* overlapped) {
+  Deliveries deliveries;
+  {
+    std::lock_guard<std::mutex> lock(mutex_);
+    const auto found = watches_.find(overlapped);
+    // Removed meanwhile, or closed by a destruction that has begun.
+    if (found == watches_.end() || StopRequested() || IssueRead(*found->second)) return;
+    deliveries.push_back({Delivery::Kind::WatchError, found->second->id, {}, {}});
+    watches_.erase(found);
+  }
+  Deliver(deliveries);
 }
 
 // The records of one buffer in order; an old name directly followed by its new name is one
@@ -373,26 +389,23 @@ void CompletionPortBackend::Parse(const WatchInfo& watch, Deliveries& deliveries
   BatchList batches;
   const std::wstring root = Widen(watch.root);
   const bool extended = kernel32.ReadDirectoryChangesEx() != nullptr;
-  std::optional<std::string> renamedFrom;  // an old name, whose new name may come next
+  std::string oldName;  // an old name whose new name may come next
+  bool haveOld = false;
   for (const BYTE* at = watch.buffer; at;) {
     Notice notice = extended ? ReadExtended(at) : ReadPlain(at, root);
     std::string name = EntryName(root, notice);
-    if (renamedFrom && notice.action == kActionRenamedNew) {
-      batches.AddRename(std::move(*renamedFrom), name);
-      renamedFrom.reset();
+    if (haveOld && notice.action == kActionRenamedNew) {
+      batches.AddRename(std::move(oldName), name);
       AddNewContent(watch.options, name, batches);
     } else {
-      if (renamedFrom) batches.Add(std::move(*renamedFrom), kActionRenamedOld);
-      renamedFrom.reset();
-      if (notice.action == kActionRenamedOld) {
-        renamedFrom = std::move(name);
-      } else {
-        AddChange(watch.options, std::move(name), notice.action, batches);
-      }
+      if (haveOld) batches.Add(std::move(oldName), kActionRenamedOld);
+      if (notice.action == kActionRenamedOld) oldName = std::move(name);
+      if (notice.action != kActionRenamedOld) AddChange(watch.options, std::move(name), notice.action, batches);
     }
+    haveOld = notice.action == kActionRenamedOld;
     at = notice.next == 0 ? nullptr : at + notice.next;
   }
-  if (renamedFrom) batches.Add(std::move(*renamedFrom), kActionRenamedOld);
+  if (haveOld) batches.Add(std::move(oldName), kActionRenamedOld);
   batches.MoveInto(watch.id, deliveries);
 }
 
