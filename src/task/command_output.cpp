@@ -63,6 +63,11 @@ bool CommandOutputReader::Hold(std::string line) {
   std::unique_lock<std::mutex> lock(mutex_);
   while (!lines_.empty() && heldBytes_ + Cost(line) > kHeldLimit) {
     if (Stopping()) return false;
+    if (backlog_) {
+      lock.unlock();
+      backlog_();
+      lock.lock();
+    }
     taken_.wait_for(lock, std::chrono::milliseconds(kStopPollMs));
   }
   lines_.push_back(std::move(line));

@@ -5,6 +5,7 @@
 #include <condition_variable>
 #include <cstddef>
 #include <deque>
+#include <functional>
 #include <mutex>
 #include <string>
 
@@ -29,6 +30,10 @@ class CommandOutputReader : public xPipeReader {
 
   explicit CommandOutputReader(Poco::Pipe pipe);
 
+  // Called on the reader's thread whenever the backlog is full and the reader waits for
+  // room. Must be set before the thread starts.
+  void SetBacklogHandler(std::function<void()> handler) { backlog_ = std::move(handler); }
+
   // Reads to the end of the output, whose last line then counts even without a line end.
   void run() override;
   // Lines held now; taking that many never waits for a command that writes on.
@@ -50,6 +55,7 @@ class CommandOutputReader : public xPipeReader {
   std::condition_variable taken_;
   std::deque<std::string> lines_;
   std::size_t heldBytes_ = 0;
+  std::function<void()> backlog_;
 };
 
 }  // namespace vexil

@@ -39,6 +39,7 @@ xWatcherCmd::xWatcherCmd(const std::string& name, const xFileTags& tags, const x
   } else {
     executable_ = options.executable;
   }
+  reader_.SetBacklogHandler([this] { OutputWaiting(); });
   // One argument, blanks and all: through the interpreter it is the command line.
   const TagExpansion expansion = ExpandTags(options.arguments, tags);
   refused_ = useCommand_ && AnyInterpreted(expansion.inserted);
@@ -47,6 +48,9 @@ xWatcherCmd::xWatcherCmd(const std::string& name, const xFileTags& tags, const x
 
 xWatcherCmd::~xWatcherCmd() {
   if (!cancelled_) Cancel();
+  // Stopped, the reader ends within one look at its stop flag; it must not call back into
+  // this command once its members are going.
+  readerThread_.Join();
   tracer_.Verbose("Watcher command close complete.\n\n");
   std::lock_guard<std::mutex> lock(processMutex_);
   process_.Abandon();
@@ -214,8 +218,25 @@ void xWatcherCmd::DrainOutput() {
 }
 
 bool xWatcherCmd::WaitPollInterval() {
+  const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(kPollMs);
   std::unique_lock<std::mutex> lock(waitMutex_);
-  return !waitChanged_.wait_for(lock, std::chrono::milliseconds(kPollMs), [this] { return stopWaiting_; });
+  while (waitChanged_.wait_until(lock, end, [this] { return stopWaiting_ || outputWaiting_; })) {
+    if (stopWaiting_) return false;
+    // The child waits for room in the backlog: trace it now, not at the next poll.
+    outputWaiting_ = false;
+    lock.unlock();
+    TraceOutput();
+    lock.lock();
+  }
+  return true;
+}
+
+void xWatcherCmd::OutputWaiting() {
+  {
+    std::lock_guard<std::mutex> lock(waitMutex_);
+    outputWaiting_ = true;
+  }
+  waitChanged_.notify_all();
 }
 
 std::chrono::milliseconds xWatcherCmd::ReaderGrace() const { return std::chrono::milliseconds(timeout_ / 3); }

@@ -71,8 +71,11 @@ class xWatcherCmd : public Poco::Runnable {
   // Gives the reader up to a third of the time-out to read to the end of a finished
   // child's output, tracing it meanwhile, so that its last lines are traced too.
   void DrainOutput();
-  // False when StopWaiting was called before the poll interval passed.
+  // False when StopWaiting was called before the poll interval passed. Traces the output
+  // meanwhile whenever the reader has no room for more.
   bool WaitPollInterval();
+  // Called by the reader when its backlog is full.
+  void OutputWaiting();
   std::chrono::milliseconds ReaderGrace() const;
 
   std::string joined_;
@@ -99,6 +102,7 @@ class xWatcherCmd : public Poco::Runnable {
   std::mutex waitMutex_;
   std::condition_variable waitChanged_;
   bool stopWaiting_ = false;
+  bool outputWaiting_ = false;
 };
 
 }  // namespace vexil

@@ -2,17 +2,11 @@
 // for trace lines and for processes to be gone, on conditions with generous deadlines.
 #pragma once
 
-#include <fcntl.h>
-#include <sys/resource.h>
-#include <unistd.h>
-
-#include <algorithm>
 #include <chrono>
 #include <fstream>
 #include <functional>
 #include <string>
 #include <thread>
-#include <vector>
 
 #include "../watch/watch_callbacks.h"
 #include "vexil/task/watcher_options.h"
@@ -78,29 +72,6 @@ inline bool ModifyUntilTraced(const std::string& path, const std::string& title,
   }
   return false;
 }
-
-// Descriptors held open as an IDE holds them, numbered past select()'s limit of 1024, with
-// the soft limit raised as far as the hard one allows. Held() is 0 when the hard limit is lower.
-class ManyDescriptors {
- public:
-  explicit ManyDescriptors(int count) {
-    rlimit limit{};
-    if (getrlimit(RLIMIT_NOFILE, &limit) != 0 || limit.rlim_max < static_cast<rlim_t>(count) + 64) return;
-    limit.rlim_cur = std::max<rlim_t>(limit.rlim_cur, static_cast<rlim_t>(count) + 64);
-    if (setrlimit(RLIMIT_NOFILE, &limit) != 0) return;
-    while (static_cast<int>(held_.size()) < count) held_.push_back(open("/dev/null", O_RDONLY | O_CLOEXEC));
-  }
-  ~ManyDescriptors() {
-    for (const int fd : held_) close(fd);
-  }
-  ManyDescriptors(const ManyDescriptors&) = delete;
-  ManyDescriptors& operator=(const ManyDescriptors&) = delete;
-
-  std::size_t Held() const { return held_.size(); }
-
- private:
-  std::vector<int> held_;
-};
 
 // Gone means ended and collected: a zombie still counts as existing.
 inline bool WaitUntilGone(int pid) {

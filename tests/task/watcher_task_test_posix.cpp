@@ -1,10 +1,12 @@
 // Watcher tasks over real temporary directories: changed files with watched extensions
 // run the command, others are ignored, and the registry, disabling and release behave.
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <signal.h>
-
+#include <sys/resource.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <chrono>
 #include <filesystem>
 #include <fstream>
@@ -19,6 +21,29 @@
 namespace {
 
 using namespace tasktest;
+
+// Descriptors held open as an IDE holds them, numbered past select()'s limit of 1024, with
+// the soft limit raised as far as the hard one allows. Held() is 0 when the hard limit is lower.
+class ManyDescriptors {
+ public:
+  explicit ManyDescriptors(int count) {
+    rlimit limit{};
+    if (getrlimit(RLIMIT_NOFILE, &limit) != 0 || limit.rlim_max < static_cast<rlim_t>(count) + 64) return;
+    limit.rlim_cur = std::max<rlim_t>(limit.rlim_cur, static_cast<rlim_t>(count) + 64);
+    if (setrlimit(RLIMIT_NOFILE, &limit) != 0) return;
+    while (static_cast<int>(held_.size()) < count) held_.push_back(open("/dev/null", O_RDONLY | O_CLOEXEC));
+  }
+  ~ManyDescriptors() {
+    for (const int fd : held_) close(fd);
+  }
+  ManyDescriptors(const ManyDescriptors&) = delete;
+  ManyDescriptors& operator=(const ManyDescriptors&) = delete;
+
+  std::size_t Held() const { return held_.size(); }
+
+ private:
+  std::vector<int> held_;
+};
 
 class WatcherTaskTest : public ::testing::Test {
  protected:
