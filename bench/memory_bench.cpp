@@ -1,6 +1,7 @@
 // Resident memory while the host is idle and a server floods it: 200 MB of stderr log
 // lines, 50 MB of header-less stdout and 100,000 notifications, then one request that
-// must still be answered. Growth is sampled through the flood, so the peak is what counts.
+// must still be answered; and while a watcher command floods its trace. Growth is sampled
+// through each flood, so the peak is what counts.
 #include <benchmark/benchmark.h>
 #include <unistd.h>
 
@@ -14,6 +15,7 @@
 
 #include "bench_replies.h"
 #include "fake_server.h"
+#include "task/watcher_event.h"
 
 namespace {
 
@@ -87,5 +89,35 @@ void Memory_abusive_server(benchmark::State& state) {
 }
 
 BENCHMARK(Memory_abusive_server)->Iterations(1)->UseRealTime()->Unit(benchmark::kSecond);
+
+// A watcher command whose output promises a 900 MB frame, then writes a 1 MiB line and
+// 200 MB of short lines while the host traces them: what the host holds for it must stay
+// small, and every line must arrive.
+std::atomic<long> commandLines{0};
+
+void Memory_command_output(benchmark::State& state) {
+  xWatcherOptions options;
+  options.trace = [](TraceType, const char* title, const char*) {
+    if (std::string(title) == "Message") ++commandLines;
+  };
+  options.level = LSP::TraceLevel::Messages;
+  options.timeout = 600000;
+  options.useCommand = true;
+  options.arguments =
+      "printf 'Content-Length: 900000000\\r\\n\\r\\n'; head -c 1048576 /dev/zero | tr '\\0' x; echo; "
+      "yes 'a line of command output' | head -n 8000000";
+  for (auto _ : state) {
+    commandLines = 0;
+    const double baseline = ResidentMiB();
+    PeakSampler sampler;
+    vexil::xWatcherEvent event("bench", vexil::xFileTags("/tmp/a.cpp"), options);
+    event.Start();
+    while (!event.Finished()) std::this_thread::sleep_for(std::chrono::milliseconds(20));
+    state.counters["peak_growth_MiB"] = sampler.Peak() - baseline;
+    state.counters["lines_traced"] = static_cast<double>(commandLines);
+  }
+}
+
+BENCHMARK(Memory_command_output)->Iterations(1)->UseRealTime()->Unit(benchmark::kSecond);
 
 }  // namespace

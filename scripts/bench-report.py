@@ -30,6 +30,8 @@ MEMORY = [
     ("flood while idle: growth after it", "Memory_abusive_server", "idle_growth_MiB", 128, "MiB"),
     ("next request answered (1 = yes)", "Memory_abusive_server", "next_reply_ok", None, ""),
     ("next request's reply time", "Memory_abusive_server", "next_reply_ms", None, "ms"),
+    ("command output flood: peak growth", "Memory_command_output", "peak_growth_MiB", 16, "MiB"),
+    ("command output lines traced", "Memory_command_output", "lines_traced", None, ""),
 ]
 
 UNIT_SECONDS = {"ns": 1e-9, "us": 1e-6, "ms": 1e-3, "s": 1.0}

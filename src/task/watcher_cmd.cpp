@@ -16,6 +16,8 @@ namespace {
 constexpr int kDefaultTimeoutMs = 5000;
 // The child is looked at this often; the time-out is honoured to this grain.
 constexpr int kPollMs = 100;
+// While a finished child's last output is read, it is traced this often.
+constexpr int kDrainStepMs = 10;
 
 bool AnyInterpreted(const std::vector<std::string>& values) {
   return std::any_of(values.begin(), values.end(), InterpreterWouldInterpret);
@@ -25,7 +27,7 @@ bool AnyInterpreted(const std::vector<std::string>& values) {
 
 xWatcherCmd::xWatcherCmd(const std::string& name, const xFileTags& tags, const xWatcherOptions& options)
     : tracer_(options.trace, options.level),
-      reader_("stdout", outPipe_),
+      reader_(outPipe_),
       useCommand_(options.useCommand),
       timeout_(options.timeout < 1 ? kDefaultTimeoutMs : options.timeout),
       name_(name),
@@ -37,6 +39,7 @@ xWatcherCmd::xWatcherCmd(const std::string& name, const xFileTags& tags, const x
   } else {
     executable_ = options.executable;
   }
+  reader_.SetBacklogHandler([this] { OutputWaiting(); });
   // One argument, blanks and all: through the interpreter it is the command line.
   const TagExpansion expansion = ExpandTags(options.arguments, tags);
   refused_ = useCommand_ && AnyInterpreted(expansion.inserted);
@@ -45,6 +48,9 @@ xWatcherCmd::xWatcherCmd(const std::string& name, const xFileTags& tags, const x
 
 xWatcherCmd::~xWatcherCmd() {
   if (!cancelled_) Cancel();
+  // Stopped, the reader ends within one look at its stop flag; it must not call back into
+  // this command once its members are going.
+  readerThread_.Join();
   tracer_.Verbose("Watcher command close complete.\n\n");
   std::lock_guard<std::mutex> lock(processMutex_);
   process_.Abandon();
@@ -191,21 +197,46 @@ void xWatcherCmd::RecordException(const std::string& text) {
   }
   if (!tracer_.Callback()) return;
   tracer_.Error("Error: %s\n\n", text.c_str());
-  const std::string output = reader_.TakeOutput();
+  std::string output, line;
+  for (std::size_t count = reader_.LinesHeld(); count > 0 && reader_.TakeLine(line); --count) output += line + "\n";
   if (!output.empty()) tracer_.Error("%s\n\n", output.c_str());
 }
 
 void xWatcherCmd::TraceOutput() {
-  // Taken at every level, so that unreported output does not pile up.
-  const std::string output = reader_.TakeOutput();
-  if (!output.empty() && tracer_.Messages()) tracer_.Text(TraceType::Line, "Message", output.c_str());
+  // Taken at every level, so that unreported output does not hold the child up. Only the
+  // lines there now: a child that writes on must not keep the poll from looking at it.
+  std::string line;
+  for (std::size_t count = reader_.LinesHeld(); count > 0 && reader_.TakeLine(line); --count)
+    if (tracer_.Messages()) tracer_.Message("%s\n", line.c_str());
 }
 
-void xWatcherCmd::DrainOutput() { readerThread_.TryJoin(ReaderGrace()); }
+void xWatcherCmd::DrainOutput() {
+  const auto end = std::chrono::steady_clock::now() + ReaderGrace();
+  // A reader waiting for its lines to be taken would otherwise never get to the end.
+  while (!readerThread_.TryJoin(std::chrono::milliseconds(kDrainStepMs)) && std::chrono::steady_clock::now() < end)
+    TraceOutput();
+}
 
 bool xWatcherCmd::WaitPollInterval() {
+  const auto end = std::chrono::steady_clock::now() + std::chrono::milliseconds(kPollMs);
   std::unique_lock<std::mutex> lock(waitMutex_);
-  return !waitChanged_.wait_for(lock, std::chrono::milliseconds(kPollMs), [this] { return stopWaiting_; });
+  while (waitChanged_.wait_until(lock, end, [this] { return stopWaiting_ || outputWaiting_; })) {
+    if (stopWaiting_) return false;
+    // The child waits for room in the backlog: trace it now, not at the next poll.
+    outputWaiting_ = false;
+    lock.unlock();
+    TraceOutput();
+    lock.lock();
+  }
+  return true;
+}
+
+void xWatcherCmd::OutputWaiting() {
+  {
+    std::lock_guard<std::mutex> lock(waitMutex_);
+    outputWaiting_ = true;
+  }
+  waitChanged_.notify_all();
 }
 
 std::chrono::milliseconds xWatcherCmd::ReaderGrace() const { return std::chrono::milliseconds(timeout_ / 3); }

@@ -14,8 +14,8 @@
 #include <Poco/Runnable.h>
 
 #include "host/trace_line.h"
+#include "task/command_output.h"
 #include "task/file_tags.h"
-#include "transport/pipe_reader.h"
 #include "transport/process.h"
 #include "transport/reader_thread.h"
 #include "vexil/task/watcher_options.h"
@@ -66,19 +66,22 @@ class xWatcherCmd : public Poco::Runnable {
   void ReportEnd();
   void ReportTimeOut();
   void RecordException(const std::string& text);
-  // Traces what the child wrote since the last look, under "Message".
+  // Traces the lines the child wrote since the last look, one "Message" each.
   void TraceOutput();
   // Gives the reader up to a third of the time-out to read to the end of a finished
-  // child's output, so its last lines are traced.
+  // child's output, tracing it meanwhile, so that its last lines are traced too.
   void DrainOutput();
-  // False when StopWaiting was called before the poll interval passed.
+  // False when StopWaiting was called before the poll interval passed. Traces the output
+  // meanwhile whenever the reader has no room for more.
   bool WaitPollInterval();
+  // Called by the reader when its backlog is full.
+  void OutputWaiting();
   std::chrono::milliseconds ReaderGrace() const;
 
   std::string joined_;
   Tracer tracer_;
   Poco::Pipe outPipe_;  // the child's standard output and standard error together
-  xPipeReader reader_;
+  CommandOutputReader reader_;
   bool cancelled_ = false;
   ReaderThread readerThread_;
   mutable std::mutex processMutex_;  // the child is looked at from the task's and the run thread
@@ -99,6 +102,7 @@ class xWatcherCmd : public Poco::Runnable {
   std::mutex waitMutex_;
   std::condition_variable waitChanged_;
   bool stopWaiting_ = false;
+  bool outputWaiting_ = false;
 };
 
 }  // namespace vexil

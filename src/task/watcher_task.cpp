@@ -9,6 +9,9 @@
 namespace LSP {
 namespace {
 
+// The task whose event runs on this thread, if any.
+thread_local const WatcherTask* eventOf = nullptr;
+
 // Extensions are compared in lower case, as the host adds them.
 std::string LowerCase(std::string text) {
   for (char& c : text) c = static_cast<char>(std::tolower(static_cast<unsigned char>(c)));
@@ -55,12 +58,14 @@ void WatcherTask::Enable() {
 }
 
 void WatcherTask::Release() {
+  if (RefusedInOwnEvent("Release")) return;
   Stop();
   vexil::UnregisterTask(this);
   delete this;
 }
 
 void WatcherTask::Start() {
+  if (RefusedInOwnEvent("Start")) return;
   if (Options().disabled) {
     tracer_.Verbose("Watcher Task: '%s' => Ignoring disabled watcher.\n", name_.c_str());
     return;
@@ -70,6 +75,7 @@ void WatcherTask::Start() {
 }
 
 void WatcherTask::Stop() {
+  if (RefusedInOwnEvent("Stop")) return;
   for (auto& directory : directories_) directory->Stop();
 }
 
@@ -91,6 +97,17 @@ void WatcherTask::OnFileAdded(const std::string& path) {
   if (!IsWatched(LowerCase(tags.EXT))) return;
   TraceAdded(tags, Options());
   tracer_.Text(TraceType::Notice, name_.c_str(), "An onFileAdded event.\n");
+}
+
+WatcherTask::InEvent::InEvent(const WatcherTask* task) : outer_(eventOf) { eventOf = task; }
+
+WatcherTask::InEvent::~InEvent() { eventOf = outer_; }
+
+bool WatcherTask::RefusedInOwnEvent(const char* operation) {
+  if (eventOf != this) return false;
+  tracer_.Error("Watcher Task: '%s' => %s refused: called from the task's own callback, it would wait for itself.\n",
+                name_.c_str(), operation);
+  return true;
 }
 
 xWatcherOptions WatcherTask::Options() {

@@ -1,5 +1,5 @@
 // LSP::WatcherTask, the implementation of a named watcher task, and LSP::WatcherDirectory,
-// one watched directory of it on the process library's directory watcher.
+// one watched directory of it on the platform's directory watch.
 #pragma once
 
 #include <functional>
@@ -9,9 +9,8 @@
 #include <string>
 #include <vector>
 
-#include <Poco/DirectoryWatcher.h>
-
 #include "host/trace_line.h"
+#include "task/directory_watch.h"
 #include "task/watcher_event.h"
 #include "vexil/task/watcher_task.h"
 
@@ -33,14 +32,14 @@ class WatcherDirectory {
   void Stop();
 
  private:
-  void OnModified(const void* sender, const Poco::DirectoryWatcher::DirectoryEvent& event);
-  void OnAdded(const void* sender, const Poco::DirectoryWatcher::DirectoryEvent& event);
-  // Reports what a handler throws instead of letting it reach the watcher's thread.
+  void ReportUnwatchable(const std::string& reason) const;
+  // Runs a handler as the task's own event, and reports what it throws instead of letting
+  // it reach the watcher's thread.
   void Guarded(const std::function<void()>& handle);
 
   WatcherTask* task_;
   std::string directory_;
-  std::unique_ptr<Poco::DirectoryWatcher> watcher_;
+  std::unique_ptr<vexil::DirectoryWatch> watch_;
 };
 
 class WatcherTask : public xWatcherTask {
@@ -63,7 +62,22 @@ class WatcherTask : public xWatcherTask {
   void OnFileAdded(const std::string& path);
   const vexil::Tracer& Trace() const { return tracer_; }
 
+  // Marks the calling thread as running one of this task's events while it lives.
+  class InEvent {
+   public:
+    explicit InEvent(const WatcherTask* task);
+    ~InEvent();
+    InEvent(const InEvent&) = delete;
+    InEvent& operator=(const InEvent&) = delete;
+
+   private:
+    const WatcherTask* outer_;
+  };
+
  private:
+  // True, and reported, when `operation` is called from one of this task's own events: it
+  // would wait for the event's thread, which is the caller's.
+  bool RefusedInOwnEvent(const char* operation);
   xWatcherOptions Options();
   // Whether `extension` (in lower case, with its dot) is watched.
   bool IsWatched(const std::string& extension);

@@ -164,8 +164,14 @@ void LineSplitter::Feed(const char* data, std::size_t size, std::vector<std::str
   }
 }
 
+void LineSplitter::Finish(std::vector<std::string>& lines) {
+  if (carriageReturn_ || !line_.empty()) lines.push_back(std::move(line_));
+  line_.clear();
+  carriageReturn_ = false;
+}
+
 void LineSplitter::Append(const char* begin, const char* end) {
-  std::size_t room = kLineLimit - line_.size();
+  std::size_t room = lineLimit_ - line_.size();
   line_.append(begin, std::min(room, static_cast<std::size_t>(end - begin)));
 }
 

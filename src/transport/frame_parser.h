@@ -53,11 +53,16 @@ class LineSplitter {
   // A longer line keeps its start: one endless line must not grow the host.
   static constexpr std::size_t kLineLimit = std::size_t{64} << 10;
 
+  explicit LineSplitter(std::size_t lineLimit = kLineLimit) : lineLimit_(lineLimit) {}
+
   void Feed(const char* data, std::size_t size, std::vector<std::string>& lines);
+  // At the end of the stream: the last line too, when no line end followed it.
+  void Finish(std::vector<std::string>& lines);
 
  private:
   void Append(const char* begin, const char* end);
 
+  std::size_t lineLimit_;
   std::string line_;
   bool carriageReturn_ = false;
 };

@@ -1,5 +1,5 @@
 // Watches directory trees with one platform notification channel and one worker thread,
-// and reports batches of created, removed and renamed names per watch to three handlers.
+// and reports batches of created, removed, renamed (and, on request, modified) names per watch.
 #pragma once
 
 #include <cstdint>
@@ -7,6 +7,7 @@
 #include <memory>
 #include <set>
 #include <string>
+#include <system_error>
 #include <utility>
 
 namespace vexil {
@@ -22,14 +23,31 @@ enum ChangeAction : unsigned {
 
 // Names relative to the watch's root, directories with a trailing separator, ordered by
 // (name, action) so that one name changed twice the same way within a batch counts once.
+// A rename comes as a batch of its own holding just its old (4) and its new name (5); the
+// other changes of one read are gathered between the renames, in the order they happened.
 using ChangeBatch = std::set<std::pair<std::string, unsigned>>;
 
-// The three callbacks. They run on the worker thread, except the error text of a failed
-// add, which runs on the caller's thread; they must not call back into the monitor.
+// The three callbacks. They run on the worker thread, outside the monitor's lock, except
+// the error text of a failed add, which runs on the caller's thread. A handler may add and
+// remove watches, and may even destroy the monitor: the worker then ends once the handler
+// has returned, without waiting for itself, and calls nothing more.
 struct MonitorHandlers {
   std::function<void(std::int64_t id, const ChangeBatch& batch)> event;
   std::function<void(std::int64_t id)> watchError;
   std::function<void(const std::string& message)> errorText;
+};
+
+// How one watch looks at its root. The watchers a host starts use the defaults; the other
+// settings serve the library's own users (watcher tasks, and whoever needs to know that a
+// file's content changed).
+struct WatchOptions {
+  // The whole tree below the root, or only the root's own entries.
+  bool recursive = true;
+  // Also report, as kActionModified, every file whose content at a name is new: written to
+  // (and closed after writing), or put there by a rename or a move into the tree, which is
+  // how editors save atomically. Directories are never reported as modified. A name written
+  // in several steps may be reported once per read that saw a step.
+  bool modifications = false;
 };
 
 class MonitorBackend;
@@ -39,22 +57,29 @@ class ChangeMonitor {
   // Never throws for a channel that cannot be created: ErrorText() says so instead, and
   // such a monitor refuses every add. A thread that cannot start throws.
   explicit ChangeMonitor(MonitorHandlers handlers);
-  // Stops every watch and joins the worker: no handler runs once this has returned.
+  // Stops every watch and joins the worker: no handler runs once this has returned. From
+  // inside a handler it cannot join: the worker ends as soon as that handler returns.
   ~ChangeMonitor();
   ChangeMonitor(const ChangeMonitor&) = delete;
   ChangeMonitor& operator=(const ChangeMonitor&) = delete;
 
   // Empty when construction succeeded.
   const std::string& ErrorText() const { return errorText_; }
-  // Watches `root` and its whole subtree under `id`; false (reported) when it cannot.
-  bool AddWatch(const std::string& root, std::int64_t id);
-  // Stops one watch; its handlers are not called for it afterwards.
+  // Watches `root` (and, by default, its whole subtree) under `id`. False, reported through
+  // the error-text handler and with the cause in `failure` when given, when it cannot.
+  bool AddWatch(const std::string& root, std::int64_t id, const WatchOptions& options = {},
+                std::error_code* failure = nullptr);
+  // Stops one watch; its handlers are not called for it once this has returned (unless it
+  // is called from one of them, which then finishes first).
   void RemoveWatch(std::int64_t id);
+  // True on the worker thread, that is, inside a handler.
+  bool InHandler() const;
 
  private:
-  MonitorHandlers handlers_;
   std::string errorText_;
-  std::unique_ptr<MonitorBackend> backend_;
+  // A copy of the error-text handler, for adds refused when there is no worker.
+  std::function<void(const std::string& message)> reportAddFailure_;
+  std::shared_ptr<MonitorBackend> backend_;
 };
 
 }  // namespace vexil

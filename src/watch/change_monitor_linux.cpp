@@ -6,10 +6,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <atomic>
 #include <cerrno>
 #include <mutex>
-#include <thread>
 #include <utility>
 
 #include "watch/inotify_tree.h"
@@ -20,86 +18,72 @@ namespace {
 
 // One read takes as much as one Windows notification buffer: 64 KiB.
 constexpr std::size_t kReadBufferSize = 65536;
-
-class UniqueFd {
- public:
-  explicit UniqueFd(int fd) : fd_(fd) {}
-  UniqueFd(UniqueFd&& other) noexcept : fd_(std::exchange(other.fd_, -1)) {}
-  ~UniqueFd() {
-    if (fd_ >= 0) close(fd_);
-  }
-  UniqueFd(const UniqueFd&) = delete;
-  UniqueFd& operator=(const UniqueFd&) = delete;
-
-  int Get() const { return fd_; }
-  bool Valid() const { return fd_ >= 0; }
-
- private:
-  int fd_;
-};
+// How long a move out waits for its other half before it counts as a removal. The kernel
+// queues both halves at once, so only a read that fell between them ever waits this long.
+constexpr int kMoveOutWaitMs = 20;
 
 // A watch stays listed after an overflow, silent, as the Windows backend keeps it.
 enum class WatchState { Active, Silent };
 
+enum class Wait { Read, Quiet, Woken, Failed };
+
 class InotifyBackend final : public MonitorBackend {
  public:
-  InotifyBackend(const MonitorHandlers& handlers, UniqueFd inotify, UniqueFd wake)
-      : handlers_(handlers),
+  InotifyBackend(MonitorHandlers handlers, UniqueFd inotify, UniqueFd wake)
+      : MonitorBackend(std::move(handlers)),
         inotify_(std::move(inotify)),
         wake_(std::move(wake)),
-        tree_(inotify_.Get(), handlers) {
-    worker_ = std::thread([this] { Run(); });
-  }
+        tree_(inotify_.Get()) {}
 
-  ~InotifyBackend() override {
+ protected:
+  void Run() override;
+  void Wake() override {
     const std::uint64_t one = 1;
     // An eventfd write only fails when the counter would overflow, which one write cannot do.
     [[maybe_unused]] const ssize_t written = write(wake_.Get(), &one, sizeof one);
-    worker_.join();
   }
-
-  bool Running() const override { return !stopped_; }
-  bool Add(const std::string& root, std::int64_t id) override;
-  void Remove(std::int64_t id) override;
+  std::error_code AddWatch(const std::string& root, std::int64_t id, const WatchOptions& options) override;
+  void RemoveWatch(std::int64_t id) override;
 
  private:
-  void Run();
-  // Waits for and reads one buffer of events; 0 or the errno that broke the channel.
-  int ReadOnce(char* buffer, std::size_t& length);
-  void Dispatch(const ReadOutcome& outcome);
+  // Waits up to `timeoutMs` (-1: for good) for a buffer of events and reads it.
+  Wait ReadOnce(char* buffer, std::size_t& length, int timeoutMs, int& error);
+  void Collect(ReadOutcome outcome, Deliveries& deliveries);
   std::vector<std::int64_t> WatchIds() const;
 
-  const MonitorHandlers& handlers_;
   UniqueFd inotify_;
   UniqueFd wake_;
-  std::atomic<bool> stopped_{false};
   std::mutex mutex_;  // over tree_ and watches_
   InotifyTree tree_;
   std::map<std::int64_t, WatchState> watches_;
-  std::thread worker_;
 };
 
-bool InotifyBackend::Add(const std::string& root, std::int64_t id) {
+std::error_code InotifyBackend::AddWatch(const std::string& root, std::int64_t id, const WatchOptions& options) {
   struct stat status;
   if (stat(root.c_str(), &status) != 0) {
-    handlers_.errorText(CannotOpenDirectory(errno));
-    return false;
+    const int error = errno;
+    ReportNow(CannotOpenDirectory(error));
+    return {error, std::generic_category()};
   }
   if (!S_ISDIR(status.st_mode)) {
-    handlers_.errorText(NotADirectory(root));
-    return false;
+    ReportNow(NotADirectory(root));
+    return std::make_error_code(std::errc::not_a_directory);
   }
-  std::lock_guard<std::mutex> lock(mutex_);
-  if (stopped_) return false;
-  if (const int error = tree_.AddRoot(root, id)) {
-    handlers_.errorText(CannotOpenDirectory(error));
-    return false;
+  ReadOutcome outcome;
+  int error = 0;
+  {
+    std::lock_guard<std::mutex> lock(mutex_);
+    if (!Running()) return std::make_error_code(std::errc::operation_canceled);
+    error = tree_.AddRoot(root, id, options, outcome);
+    if (!error) watches_[id] = WatchState::Active;
   }
-  watches_[id] = WatchState::Active;
-  return true;
+  for (const std::string& text : outcome.errors) ReportNow(text);
+  if (!error) return {};
+  ReportNow(CannotOpenDirectory(error));
+  return {error, std::generic_category()};
 }
 
-void InotifyBackend::Remove(std::int64_t id) {
+void InotifyBackend::RemoveWatch(std::int64_t id) {
   std::lock_guard<std::mutex> lock(mutex_);
   tree_.Remove(id);
   watches_.erase(id);
@@ -107,49 +91,65 @@ void InotifyBackend::Remove(std::int64_t id) {
 
 void InotifyBackend::Run() {
   std::vector<char> buffer(kReadBufferSize);
+  bool holding = false;
   int error = 0;
   for (;;) {
     std::size_t length = 0;
-    error = ReadOnce(buffer.data(), length);
-    if (error || length == 0) break;
-    std::lock_guard<std::mutex> lock(mutex_);
-    Dispatch(tree_.Translate(buffer.data(), length));
+    const Wait wait = ReadOnce(buffer.data(), length, holding ? kMoveOutWaitMs : -1, error);
+    if (wait == Wait::Woken || wait == Wait::Failed) break;
+    Deliveries deliveries;
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      Collect(tree_.Translate(buffer.data(), length), deliveries);
+      holding = tree_.Holding();
+    }
+    Deliver(deliveries);
   }
-  stopped_ = true;
+  LoopEnded();
   if (!error) return;
-  std::lock_guard<std::mutex> lock(mutex_);
-  ReportChannelFailure(handlers_, static_cast<unsigned long>(error), WatchIds());
+  Deliveries deliveries;
+  {
+    std::lock_guard<std::mutex> lock(mutex_);
+    ReportChannelFailure(static_cast<unsigned long>(error), WatchIds(), deliveries);
+  }
+  Deliver(deliveries);
 }
 
-int InotifyBackend::ReadOnce(char* buffer, std::size_t& length) {
+Wait InotifyBackend::ReadOnce(char* buffer, std::size_t& length, int timeoutMs, int& error) {
   for (;;) {
     pollfd waits[2] = {{wake_.Get(), POLLIN, 0}, {inotify_.Get(), POLLIN, 0}};
-    if (poll(waits, 2, -1) < 0) {
-      if (errno == EINTR) continue;
-      return errno;
+    const int ready = poll(waits, 2, timeoutMs);
+    if (ready < 0 && errno == EINTR) continue;
+    if (ready < 0) {
+      error = errno;
+      return Wait::Failed;
     }
-    if (waits[0].revents) return 0;  // woken to stop: length stays 0
+    if (waits[0].revents) return Wait::Woken;
+    if (ready == 0) return Wait::Quiet;
     const ssize_t got = read(inotify_.Get(), buffer, kReadBufferSize);
     if (got > 0) {
       length = static_cast<std::size_t>(got);
-      return 0;
+      return Wait::Read;
     }
-    if (got < 0 && errno != EINTR && errno != EAGAIN) return errno;
+    if (got < 0 && errno != EINTR && errno != EAGAIN) {
+      error = errno;
+      return Wait::Failed;
+    }
   }
 }
 
 // Batches first, so that a watch's last changes reach the host before it is declared gone.
-void InotifyBackend::Dispatch(const ReadOutcome& outcome) {
-  for (const auto& [id, batch] : outcome.batches)
-    if (!batch.empty()) handlers_.event(id, batch);
+void InotifyBackend::Collect(ReadOutcome outcome, Deliveries& deliveries) {
+  for (std::string& text : outcome.errors) deliveries.push_back({Delivery::Kind::Text, 0, {}, std::move(text)});
+  for (auto& [id, batches] : outcome.batches) batches.MoveInto(id, deliveries);
   for (std::int64_t id : outcome.rootsGone) {
-    handlers_.watchError(id);
+    deliveries.push_back({Delivery::Kind::WatchError, id, {}, {}});
     watches_.erase(id);
   }
   if (!outcome.overflow) return;
   for (auto& [id, state] : watches_) {
     if (state == WatchState::Silent) continue;
-    handlers_.watchError(id);
+    deliveries.push_back({Delivery::Kind::WatchError, id, {}, {}});
     tree_.Remove(id);
     state = WatchState::Silent;
   }
@@ -163,15 +163,14 @@ std::vector<std::int64_t> InotifyBackend::WatchIds() const {
 
 }  // namespace
 
-std::unique_ptr<MonitorBackend> CreateMonitorBackend(const MonitorHandlers& handlers,
-                                                     std::string& errorText) {
+std::shared_ptr<MonitorBackend> CreateMonitorBackend(MonitorHandlers handlers, std::string& errorText) {
   UniqueFd inotify(inotify_init1(IN_NONBLOCK | IN_CLOEXEC));
   UniqueFd wake(eventfd(0, EFD_NONBLOCK | EFD_CLOEXEC));
   if (!inotify.Valid() || !wake.Valid()) {
     errorText = kChannelNotCreated;
     return nullptr;
   }
-  return std::make_unique<InotifyBackend>(handlers, std::move(inotify), std::move(wake));
+  return std::make_shared<InotifyBackend>(std::move(handlers), std::move(inotify), std::move(wake));
 }
 
 }  // namespace vexil

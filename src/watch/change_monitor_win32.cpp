@@ -154,51 +154,72 @@ Notice ReadPlain(const BYTE* at, const std::wstring& root) {
 enum class WatchState : std::uint8_t { Idle = 0, Reading = 1, Stopping = 2 };
 
 struct WatchInfo {
-  WatchInfo(std::string root, UniqueHandle directory, std::int64_t id)
-      : root(std::move(root)), directory(std::move(directory)), id(id) {}
+  WatchInfo(std::string root, UniqueHandle directory, std::int64_t id, const WatchOptions& options)
+      : root(std::move(root)), directory(std::move(directory)), id(id), options(options) {}
 
   std::unique_ptr<OVERLAPPED> overlapped = std::make_unique<OVERLAPPED>();  // zero-filled
   alignas(8) BYTE buffer[kBufferSize];
   std::string root;
   UniqueHandle directory;
   std::int64_t id;
+  WatchOptions options;
   std::atomic<WatchState> state{WatchState::Idle};
 };
 
+// The name a batch carries: long form, UTF-8, a directory's with a trailing backslash.
+std::string EntryName(const std::wstring& root, Notice& notice) {
+  if (StillExists(notice.action)) notice.name = LongName(root, notice.name);
+  std::string name = Narrow(notice.name);
+  if (notice.isDirectory) name += '\\';
+  return name;
+}
+
+bool IsDirectoryName(const std::string& name) { return !name.empty() && name.back() == '\\'; }
+
+// With modifications asked for, a file that arrives (moved in, or renamed onto its name)
+// brings content that no write reported.
+void AddNewContent(const WatchOptions& options, const std::string& name, BatchList& batches) {
+  if (options.modifications && !IsDirectoryName(name)) batches.Add(name, kActionModified);
+}
+
+void AddChange(const WatchOptions& options, std::string name, DWORD action, BatchList& batches) {
+  // A directory's own time stamps change with its entries: that is no change of content.
+  if (action == kActionModified && IsDirectoryName(name)) return;
+  if (action == kActionAdded) AddNewContent(options, name, batches);
+  batches.Add(std::move(name), action);
+}
+
 class CompletionPortBackend final : public MonitorBackend {
  public:
-  CompletionPortBackend(const MonitorHandlers& handlers, UniqueHandle port)
-      : handlers_(handlers), port_(std::move(port)) {
-    worker_ = std::thread([this] { Run(); });
-  }
-  ~CompletionPortBackend() override;
+  CompletionPortBackend(MonitorHandlers handlers, UniqueHandle port)
+      : MonitorBackend(std::move(handlers)), port_(std::move(port)) {}
 
-  bool Running() const override { return !stopped_; }
-  bool Add(const std::string& root, std::int64_t id) override;
-  void Remove(std::int64_t id) override;
+ protected:
+  void Run() override;
+  void Wake() override;
+  std::error_code AddWatch(const std::string& root, std::int64_t id, const WatchOptions& options) override;
+  void RemoveWatch(std::int64_t id) override;
 
  private:
   using Watches = std::map<OVERLAPPED*, std::unique_ptr<WatchInfo>>;
 
-  void Run();
-  void Drain();
-  void HandleCompletion(DWORD bytes, OVERLAPPED* overlapped);
+  void Drain(OVERLAPPED* aborted);
+  // Parses a completion under the lock; true when the watch reads on once it is delivered.
+  bool HandleCompletion(DWORD bytes, OVERLAPPED* overlapped, Deliveries& deliveries);
+  void ReadAgain(OVERLAPPED* overlapped);
   bool IssueRead(WatchInfo& watch);
-  ChangeBatch Parse(const WatchInfo& watch) const;
-  bool AnyStopping() const;
+  void Parse(const WatchInfo& watch, Deliveries& deliveries) const;
+  bool AnyStopping();
   std::vector<std::int64_t> WatchIds() const;
   // Directory handles complete with key 0; only the wake-up carries this one.
   ULONG_PTR WakeKey() const { return reinterpret_cast<ULONG_PTR>(this); }
 
-  const MonitorHandlers& handlers_;
   UniqueHandle port_;
   std::mutex mutex_;  // over watches_
   Watches watches_;
-  std::atomic<bool> stopped_{false};
-  std::thread worker_;
 };
 
-CompletionPortBackend::~CompletionPortBackend() {
+void CompletionPortBackend::Wake() {
   {
     std::lock_guard<std::mutex> lock(mutex_);
     for (auto& entry : watches_) {
@@ -208,39 +229,43 @@ CompletionPortBackend::~CompletionPortBackend() {
     }
   }
   PostQueuedCompletionStatus(port_.Get(), 0, WakeKey(), nullptr);
-  worker_.join();
 }
 
-bool CompletionPortBackend::Add(const std::string& root, std::int64_t id) {
+std::error_code CompletionPortBackend::AddWatch(const std::string& root, std::int64_t id,
+                                                const WatchOptions& options) {
   UniqueHandle directory(CreateFileA(root.c_str(), FILE_LIST_DIRECTORY,
                                      FILE_SHARE_READ | FILE_SHARE_WRITE | FILE_SHARE_DELETE, nullptr,
                                      OPEN_EXISTING, FILE_FLAG_BACKUP_SEMANTICS | FILE_FLAG_OVERLAPPED,
                                      nullptr));
+  const auto systemError = [] { return std::error_code(static_cast<int>(GetLastError()), std::system_category()); };
   if (!directory.Valid()) {
-    handlers_.errorText(CannotOpenDirectory(GetLastError()));
-    return false;
+    const std::error_code error = systemError();
+    ReportNow(CannotOpenDirectory(static_cast<unsigned long>(error.value())));
+    return error;
   }
   BY_HANDLE_FILE_INFORMATION information;
-  if (!GetFileInformationByHandle(directory.Get(), &information)) return false;
+  if (!GetFileInformationByHandle(directory.Get(), &information)) return systemError();
   if (!(information.dwFileAttributes & FILE_ATTRIBUTE_DIRECTORY)) {
-    handlers_.errorText(NotADirectory(root));
-    return false;
+    ReportNow(NotADirectory(root));
+    return std::make_error_code(std::errc::not_a_directory);
   }
   if (!CreateIoCompletionPort(directory.Get(), port_.Get(), 0, 1)) {
-    handlers_.errorText("Cannot create IOCP: " + std::to_string(GetLastError()) + "\n");
-    return false;
+    const std::error_code error = systemError();
+    ReportNow("Cannot create IOCP: " + std::to_string(error.value()) + "\n");
+    return error;
   }
-  auto watch = std::make_unique<WatchInfo>(root, std::move(directory), id);
+  auto watch = std::make_unique<WatchInfo>(root, std::move(directory), id, options);
   OVERLAPPED* key = watch->overlapped.get();
   std::lock_guard<std::mutex> lock(mutex_);
   const auto [entry, inserted] = watches_.emplace(key, std::move(watch));
-  if (!inserted) return false;
-  if (!stopped_ && IssueRead(*entry->second)) return true;
+  if (!inserted) return std::make_error_code(std::errc::file_exists);
+  if (Running() && IssueRead(*entry->second)) return {};
+  const std::error_code error = Running() ? systemError() : std::make_error_code(std::errc::operation_canceled);
   watches_.erase(entry);
-  return false;
+  return error;
 }
 
-void CompletionPortBackend::Remove(std::int64_t id) {
+void CompletionPortBackend::RemoveWatch(std::int64_t id) {
   std::lock_guard<std::mutex> lock(mutex_);
   for (auto entry = watches_.begin(); entry != watches_.end(); ++entry) {
     WatchInfo& watch = *entry->second;
@@ -258,95 +283,133 @@ void CompletionPortBackend::Remove(std::int64_t id) {
 bool CompletionPortBackend::IssueRead(WatchInfo& watch) {
   if (watch.state != WatchState::Idle) return false;
   const ReadChangesEx readEx = kernel32.ReadDirectoryChangesEx();
+  const DWORD filter = kNotifyFilter | (watch.options.modifications ? FILE_NOTIFY_CHANGE_LAST_WRITE : 0);
+  const BOOL subtree = watch.options.recursive ? TRUE : FALSE;
   const BOOL issued =
-      readEx ? readEx(watch.directory.Get(), watch.buffer, kBufferSize, TRUE, kNotifyFilter, nullptr,
+      readEx ? readEx(watch.directory.Get(), watch.buffer, kBufferSize, subtree, filter, nullptr,
                       watch.overlapped.get(), nullptr, kNotifyExtendedInformation)
-             : ReadDirectoryChangesW(watch.directory.Get(), watch.buffer, kBufferSize, TRUE,
-                                     kNotifyFilter, nullptr, watch.overlapped.get(), nullptr);
+             : ReadDirectoryChangesW(watch.directory.Get(), watch.buffer, kBufferSize, subtree, filter, nullptr,
+                                     watch.overlapped.get(), nullptr);
   watch.state = issued ? WatchState::Reading : WatchState::Idle;
   return issued != FALSE;
 }
 
 void CompletionPortBackend::Run() {
-  DWORD bytes = 0;
-  ULONG_PTR key = 0;
-  OVERLAPPED* overlapped = nullptr;
-  bool woken = false;
+  DWORD error = 0;
+  OVERLAPPED* failed = nullptr;
   // A failed wait ends the worker even when it carries a packet (an aborted read): the
-  // channel is then reported broken, strictly.
-  while (GetQueuedCompletionStatus(port_.Get(), &bytes, &key, &overlapped, INFINITE)) {
-    if (key == WakeKey()) {
-      woken = true;
-      break;
-    }
-    std::lock_guard<std::mutex> lock(mutex_);
-    HandleCompletion(bytes, overlapped);
-  }
-  const DWORD error = woken ? 0 : GetLastError();
-  stopped_ = true;
-  std::lock_guard<std::mutex> lock(mutex_);
-  if (woken)
-    Drain();
-  else
-    ReportChannelFailure(handlers_, error, WatchIds());
-}
-
-// Waits for the aborted reads of the stopped watches, so that their buffers are not freed
-// while the system may still write to them.
-void CompletionPortBackend::Drain() {
-  while (AnyStopping()) {
+  // channel is then reported broken, strictly, unless the monitor is being destroyed.
+  for (;;) {
     DWORD bytes = 0;
     ULONG_PTR key = 0;
     OVERLAPPED* overlapped = nullptr;
-    // An aborted read dequeues as a failed wait with its record; no record means the
-    // wait itself failed.
-    GetQueuedCompletionStatus(port_.Get(), &bytes, &key, &overlapped, INFINITE);
-    if (!overlapped) return;
-    const auto found = watches_.find(overlapped);
-    if (found != watches_.end()) watches_.erase(found);
+    if (!GetQueuedCompletionStatus(port_.Get(), &bytes, &key, &overlapped, INFINITE)) {
+      error = GetLastError();
+      failed = overlapped;
+      break;
+    }
+    if (key == WakeKey()) break;
+    Deliveries deliveries;
+    bool readAgain = false;
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      readAgain = HandleCompletion(bytes, overlapped, deliveries);
+    }
+    Deliver(deliveries);
+    if (readAgain) ReadAgain(overlapped);
+  }
+  LoopEnded();
+  if (!error || (failed && StopRequested())) return Drain(failed);
+  Deliveries deliveries;
+  {
+    std::lock_guard<std::mutex> lock(mutex_);
+    ReportChannelFailure(error, WatchIds(), deliveries);
+  }
+  Deliver(deliveries);
+}
+
+// Waits for the aborted reads of the stopped watches, so that their buffers are not freed
+// while the system may still write to them. `aborted` already came back.
+void CompletionPortBackend::Drain(OVERLAPPED* aborted) {
+  for (OVERLAPPED* overlapped = aborted;;) {
+    {
+      std::lock_guard<std::mutex> lock(mutex_);
+      const auto found = overlapped ? watches_.find(overlapped) : watches_.end();
+      if (found != watches_.end()) watches_.erase(found);
+      if (!AnyStopping()) return;
+    }
+    DWORD bytes = 0;
+    ULONG_PTR key = 0;
+    overlapped = nullptr;
+    // An aborted read dequeues as a failed wait with its record; the wake-up carries none,
+    // and a wait that fails without a record means the port itself failed.
+    const BOOL woke = GetQueuedCompletionStatus(port_.Get(), &bytes, &key, &overlapped, INFINITE);
+    if (!overlapped && !(woke && key == WakeKey())) return;
   }
 }
 
-void CompletionPortBackend::HandleCompletion(DWORD bytes, OVERLAPPED* overlapped) {
+bool CompletionPortBackend::HandleCompletion(DWORD bytes, OVERLAPPED* overlapped, Deliveries& deliveries) {
   const auto found = watches_.find(overlapped);
   if (found == watches_.end()) {
-    handlers_.errorText("WatchInfo was not found for filesystem event.\n");
-    return;
+    deliveries.push_back({Delivery::Kind::Text, 0, {}, "WatchInfo was not found for filesystem event.\n"});
+    return false;
   }
   WatchInfo& watch = *found->second;
   if (watch.state == WatchState::Reading) watch.state = WatchState::Idle;
   if (watch.state == WatchState::Stopping) {
     watches_.erase(found);
-    return;
+    return false;
   }
   if (bytes == 0) {  // the buffer overflowed: changes were lost, so the watch goes quiet
-    handlers_.watchError(watch.id);
-    return;
+    deliveries.push_back({Delivery::Kind::WatchError, watch.id, {}, {}});
+    return false;
   }
-  const ChangeBatch batch = Parse(watch);
-  if (!batch.empty()) handlers_.event(watch.id, batch);
-  if (IssueRead(watch)) return;
-  handlers_.watchError(watch.id);
-  watches_.erase(found);
+  Parse(watch, deliveries);
+  return true;
 }
 
-ChangeBatch CompletionPortBackend::Parse(const WatchInfo& watch) const {
-  ChangeBatch batch;
+// After the handler, as a read's changes were always handled before the next read: what
+// happens meanwhile waits in the system's buffer and comes as one batch.
+void CompletionPortBackend::ReadAgain(OVERLAPPED* overlapped) {
+  Deliveries deliveries;
+  {
+    std::lock_guard<std::mutex> lock(mutex_);
+    const auto found = watches_.find(overlapped);
+    // Removed meanwhile, or closed by a destruction that has begun.
+    if (found == watches_.end() || StopRequested() || IssueRead(*found->second)) return;
+    deliveries.push_back({Delivery::Kind::WatchError, found->second->id, {}, {}});
+    watches_.erase(found);
+  }
+  Deliver(deliveries);
+}
+
+// The records of one buffer in order; an old name directly followed by its new name is one
+// rename.
+void CompletionPortBackend::Parse(const WatchInfo& watch, Deliveries& deliveries) const {
+  BatchList batches;
   const std::wstring root = Widen(watch.root);
   const bool extended = kernel32.ReadDirectoryChangesEx() != nullptr;
-  for (const BYTE* at = watch.buffer;;) {
+  std::string oldName;  // an old name whose new name may come next
+  bool haveOld = false;
+  for (const BYTE* at = watch.buffer; at;) {
     Notice notice = extended ? ReadExtended(at) : ReadPlain(at, root);
-    if (StillExists(notice.action)) notice.name = LongName(root, notice.name);
-    std::string name = Narrow(notice.name);
-    if (notice.isDirectory) name += '\\';
-    batch.emplace(std::move(name), notice.action);
-    if (notice.next == 0) break;
-    at += notice.next;
+    std::string name = EntryName(root, notice);
+    if (haveOld && notice.action == kActionRenamedNew) {
+      batches.AddRename(std::move(oldName), name);
+      AddNewContent(watch.options, name, batches);
+    } else {
+      if (haveOld) batches.Add(std::move(oldName), kActionRenamedOld);
+      if (notice.action == kActionRenamedOld) oldName = std::move(name);
+      if (notice.action != kActionRenamedOld) AddChange(watch.options, std::move(name), notice.action, batches);
+    }
+    haveOld = notice.action == kActionRenamedOld;
+    at = notice.next == 0 ? nullptr : at + notice.next;
   }
-  return batch;
+  if (haveOld) batches.Add(std::move(oldName), kActionRenamedOld);
+  batches.MoveInto(watch.id, deliveries);
 }
 
-bool CompletionPortBackend::AnyStopping() const {
+bool CompletionPortBackend::AnyStopping() {
   for (const auto& entry : watches_)
     if (entry.second->state == WatchState::Stopping) return true;
   return false;
@@ -360,14 +423,13 @@ std::vector<std::int64_t> CompletionPortBackend::WatchIds() const {
 
 }  // namespace
 
-std::unique_ptr<MonitorBackend> CreateMonitorBackend(const MonitorHandlers& handlers,
-                                                     std::string& errorText) {
+std::shared_ptr<MonitorBackend> CreateMonitorBackend(MonitorHandlers handlers, std::string& errorText) {
   UniqueHandle port(CreateIoCompletionPort(INVALID_HANDLE_VALUE, nullptr, 0, 1));
   if (!port.Valid()) {
     errorText = kChannelNotCreated;
     return nullptr;
   }
-  return std::make_unique<CompletionPortBackend>(handlers, std::move(port));
+  return std::make_shared<CompletionPortBackend>(std::move(handlers), std::move(port));
 }
 
 }  // namespace vexil

@@ -1,8 +1,9 @@
-// Bookkeeping of inotify descriptors per project watch, and the translation of raw events
-// into per-watch batches: created and moved-in directories are watched and scanned at once.
+// Bookkeeping of inotify descriptors per watch, and the translation of raw events into
+// per-watch batches: created, renamed and moved-in directories are watched and scanned at once.
 #include "watch/inotify_tree.h"
 
 #include <dirent.h>
+#include <fcntl.h>
 #include <sys/inotify.h>
 #include <sys/stat.h>
 
@@ -10,16 +11,18 @@
 #include <cstring>
 #include <memory>
 #include <system_error>
-#include <unordered_map>
 
 namespace vexil {
 namespace {
 
-constexpr std::uint32_t kEntryEvents = IN_CREATE | IN_DELETE | IN_MOVED_FROM | IN_MOVED_TO |
-                                       IN_DELETE_SELF | IN_MOVE_SELF | IN_EXCL_UNLINK | IN_ONLYDIR;
-// Below the root a symbolic link is an entry of its own, never a directory to descend into.
-constexpr std::uint32_t kSubdirectoryMask = kEntryEvents | IN_DONT_FOLLOW;
+constexpr std::uint32_t kEntryEvents = IN_CREATE | IN_DELETE | IN_MOVED_FROM | IN_MOVED_TO | IN_DELETE_SELF |
+                                       IN_MOVE_SELF | IN_EXCL_UNLINK | IN_ONLYDIR;
+constexpr std::uint32_t kContentEvents = IN_MODIFY | IN_CLOSE_WRITE;
 constexpr std::uint32_t kSelfEvents = IN_DELETE_SELF | IN_MOVE_SELF | IN_IGNORED | IN_UNMOUNT;
+
+using Event = InotifyTree::Event;
+
+bool IsDirectory(const Event& event) { return (event.mask & IN_ISDIR) != 0; }
 
 std::string JoinPath(const std::string& directory, const std::string& name) {
   if (directory.empty() || directory.back() == '/') return directory + name;
@@ -35,9 +38,8 @@ std::pair<std::map<std::string, int>::iterator, std::map<std::string, int>::iter
   return {first, last};
 }
 
-void Report(ReadOutcome& outcome, std::int64_t id, const std::string& relative, bool isDirectory,
-            unsigned action) {
-  outcome.batches[id].emplace(isDirectory ? relative + "/" : relative, action);
+std::string Marked(const std::string& relative, bool isDirectory) {
+  return isDirectory ? relative + "/" : relative;
 }
 
 struct Entry {
@@ -45,41 +47,28 @@ struct Entry {
   bool isDirectory;
 };
 
-bool IsDirectoryEntry(const dirent& entry, const std::string& path) {
-  if (entry.d_type != DT_UNKNOWN) return entry.d_type == DT_DIR;
-  struct stat status;
-  return lstat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode);
-}
-
-// Read whole before descending, so a deep tree does not hold one open stream per level.
-std::vector<Entry> ListDirectory(const std::string& path) {
+// Read whole, so that the directory is closed again before its subdirectories are opened.
+std::vector<Entry> ListDirectory(int directory) {
   std::vector<Entry> entries;
-  std::unique_ptr<DIR, int (*)(DIR*)> stream(opendir(path.c_str()), &closedir);
-  if (!stream) return entries;  // gone again: its parent reports the removal
+  const int own = dup(directory);  // the stream takes this one over
+  if (own < 0) return entries;
+  std::unique_ptr<DIR, int (*)(DIR*)> stream(fdopendir(own), &closedir);
+  if (!stream) {
+    close(own);
+    return entries;
+  }
   while (const dirent* entry = readdir(stream.get())) {
     if (std::strcmp(entry->d_name, ".") == 0 || std::strcmp(entry->d_name, "..") == 0) continue;
-    entries.push_back({entry->d_name, IsDirectoryEntry(*entry, JoinPath(path, entry->d_name))});
+    bool isDirectory = entry->d_type == DT_DIR;
+    struct stat status;
+    if (entry->d_type == DT_UNKNOWN)
+      isDirectory = fstatat(directory, entry->d_name, &status, AT_SYMLINK_NOFOLLOW) == 0 && S_ISDIR(status.st_mode);
+    entries.push_back({entry->d_name, isDirectory});
   }
   return entries;
 }
 
-}  // namespace
-
-struct InotifyTree::Event {
-  int descriptor;
-  std::uint32_t mask;
-  std::uint32_t cookie;
-  std::string name;
-
-  bool IsDirectory() const { return (mask & IN_ISDIR) != 0; }
-};
-
-namespace {
-
-using Event = InotifyTree::Event;
-
-std::vector<Event> ParseEvents(const char* buffer, std::size_t length) {
-  std::vector<Event> events;
+void ParseEvents(const char* buffer, std::size_t length, std::vector<Event>& events) {
   std::size_t offset = 0;
   while (offset + sizeof(inotify_event) <= length) {
     inotify_event header;
@@ -88,39 +77,44 @@ std::vector<Event> ParseEvents(const char* buffer, std::size_t length) {
     events.push_back({header.wd, header.mask, header.cookie, std::string(name, strnlen(name, header.len))});
     offset += sizeof header + header.len;
   }
-  return events;
 }
 
-// Both halves of each move seen in this read, by cookie.
-struct MoveHalves {
-  const Event* from = nullptr;
-  const Event* to = nullptr;
-};
+bool HasMoveTo(const std::vector<Event>& events, std::size_t after, std::uint32_t cookie) {
+  for (std::size_t i = after + 1; i < events.size(); ++i)
+    if ((events[i].mask & IN_MOVED_TO) && events[i].cookie == cookie) return true;
+  return false;
+}
 
-using Moves = std::unordered_map<std::uint32_t, MoveHalves>;
-
-Moves PairMoves(const std::vector<Event>& events) {
-  Moves moves;
-  for (const Event& event : events) {
-    if (event.mask & IN_MOVED_FROM) moves[event.cookie].from = &event;
-    if (event.mask & IN_MOVED_TO) moves[event.cookie].to = &event;
-  }
-  return moves;
+// Where the events to hold back begin: at the first move out, among those after `carried`,
+// whose other half is not there (yet). Its events are handled in order, so the ones after
+// it wait with it.
+std::size_t HoldFrom(const std::vector<Event>& events, std::size_t carried) {
+  for (std::size_t i = carried; i < events.size(); ++i)
+    if ((events[i].mask & IN_MOVED_FROM) && !HasMoveTo(events, i, events[i].cookie)) return i;
+  return events.size();
 }
 
 }  // namespace
 
-InotifyTree::InotifyTree(int inotifyFd, const MonitorHandlers& handlers)
-    : fd_(inotifyFd), handlers_(handlers) {}
+// Both halves of one move, by cookie.
+struct InotifyTree::MoveHalves {
+  const Event* from = nullptr;
+  const Event* to = nullptr;
+};
 
-int InotifyTree::AddRoot(const std::string& root, std::int64_t id) {
-  const int descriptor = inotify_add_watch(fd_, root.c_str(), kEntryEvents);
+int InotifyTree::AddRoot(const std::string& root, std::int64_t id, const WatchOptions& options,
+                         ReadOutcome& outcome) {
+  Identity identity;
+  UniqueFd directory;
+  const int descriptor = WatchDirectory(root, true, options.modifications, identity, directory);
   if (descriptor < 0) return errno;
-  projects_[id].root = root;
+  projects_[id] = {root, options, {}};
   const Owners owners{{id, ""}};
-  Adopt(descriptor, owners);
+  Adopt(descriptor, identity, owners);
+  if (!options.recursive) return 0;
   // What exists already is not a change; only its directories need watching.
-  Scan(root, owners, nullptr);
+  for (const Entry& entry : ListDirectory(directory.Get()))
+    if (entry.isDirectory) AddSubtree(JoinPath(root, entry.name), {{id, entry.name + "/"}}, outcome, false);
   return 0;
 }
 
@@ -130,50 +124,67 @@ void InotifyTree::Remove(std::int64_t id) {
 }
 
 ReadOutcome InotifyTree::Translate(const char* buffer, std::size_t length) {
-  ReadOutcome outcome;
-  const std::vector<Event> events = ParseEvents(buffer, length);
-  const auto moves = PairMoves(events);
+  std::vector<Event> events = std::move(held_);
+  held_.clear();
+  const std::size_t carried = events.size();  // held once already: they go now
+  ParseEvents(buffer, length, events);
+  const std::size_t end = length == 0 ? events.size() : HoldFrom(events, carried);
+  held_.assign(events.begin() + static_cast<std::ptrdiff_t>(end), events.end());
+  events.resize(end);
+
+  Moves moves;
   for (const Event& event : events) {
-    if (event.mask & IN_Q_OVERFLOW) {
-      outcome.overflow = true;
-      continue;
-    }
-    const auto found = owners_.find(event.descriptor);
-    if (found == owners_.end()) continue;  // dropped by us while the kernel still queued it
-    const Owners owners = found->second;   // a copy: handling may add or drop descriptors
-    if (event.mask & kSelfEvents) {
-      SelfChanged(event, owners, outcome);
-    } else if (event.mask & IN_CREATE) {
-      Created(event, owners, outcome);
-    } else if (event.mask & IN_DELETE) {
-      Removed(event, owners, outcome);
-    } else if (event.mask & IN_MOVED_FROM) {
-      MovedFrom(event, moves.at(event.cookie).to, owners, outcome);
-    } else if (event.mask & IN_MOVED_TO) {
-      MovedTo(event, moves.at(event.cookie).from, owners, outcome);
-    }
+    if (event.mask & IN_MOVED_FROM) moves[event.cookie].from = &event;
+    if (event.mask & IN_MOVED_TO) moves[event.cookie].to = &event;
   }
+  ReadOutcome outcome;
+  for (const Event& event : events) Handle(event, moves, outcome);
   return outcome;
+}
+
+void InotifyTree::Handle(const Event& event, const Moves& moves, ReadOutcome& outcome) {
+  if (event.mask & IN_Q_OVERFLOW) {
+    outcome.overflow = true;
+    return;
+  }
+  const auto found = owners_.find(event.descriptor);
+  if (found == owners_.end()) return;  // dropped by us while the kernel still queued it
+  const Owners owners = found->second;   // a copy: handling may add or drop descriptors
+  if (event.mask & kSelfEvents) {
+    SelfChanged(event, owners, outcome);
+  } else if (event.mask & IN_CREATE) {
+    Created(event, owners, outcome);
+  } else if (event.mask & IN_DELETE) {
+    Removed(event, owners, outcome);
+  } else if (event.mask & IN_MOVED_FROM) {
+    MovedFrom(event, moves.at(event.cookie).to, owners, outcome);
+  } else if (event.mask & IN_MOVED_TO) {
+    MovedTo(event, moves.at(event.cookie).from, owners, outcome);
+  } else if (event.mask & kContentEvents) {
+    Modified(event, owners, outcome);
+  }
 }
 
 void InotifyTree::Created(const Event& event, const Owners& owners, ReadOutcome& outcome) {
   Owners below;
   for (const auto& [id, prefix] : owners) {
-    Report(outcome, id, prefix + event.name, event.IsDirectory(), kActionAdded);
-    below.emplace(id, prefix + event.name + "/");
+    Report(outcome, id, prefix + event.name, IsDirectory(event), kActionAdded);
+    if (IsDirectory(event) && Recursive(id)) below.emplace(id, prefix + event.name + "/");
   }
-  if (event.IsDirectory()) AddSubtree(EntryPath(below), below, &outcome);
+  // Already renamed away, the directory is watched when that rename is handled.
+  if (!below.empty()) AddSubtree(EntryPath(below), below, outcome, true);
 }
 
 void InotifyTree::Removed(const Event& event, const Owners& owners, ReadOutcome& outcome) {
   // A removed directory's own descriptor is released when the kernel ignores it.
   for (const auto& [id, prefix] : owners)
-    Report(outcome, id, prefix + event.name, event.IsDirectory(), kActionRemoved);
+    Report(outcome, id, prefix + event.name, IsDirectory(event), kActionRemoved);
 }
 
 void InotifyTree::MovedFrom(const Event& event, const Event* partner, const Owners& owners,
                             ReadOutcome& outcome) {
-  const bool isDirectory = event.IsDirectory();
+  const bool isDirectory = IsDirectory(event);
+  Owners unwatched;  // renamed before its watch could be added, or whose watch is another's now
   for (const auto& [id, prefix] : owners) {
     const std::string from = prefix + event.name;
     const std::string* target = partner ? PrefixIn(partner->descriptor, id) : nullptr;
@@ -183,22 +194,38 @@ void InotifyTree::MovedFrom(const Event& event, const Event* partner, const Owne
       continue;
     }
     const std::string to = *target + partner->name;
-    Report(outcome, id, from, isDirectory, kActionRenamedOld);
-    Report(outcome, id, to, isDirectory, kActionRenamedNew);
-    if (isDirectory) MoveSubtree(id, from + "/", to + "/");
+    outcome.batches[id].AddRename(Marked(from, isDirectory), Marked(to, isDirectory));
+    if (!isDirectory) {
+      ReportModified(outcome, id, to);
+    } else if (!Recursive(id)) {
+      continue;
+    } else if (WatchesRenamed(id, from + "/", to)) {
+      MoveSubtree(id, from + "/", to + "/");
+    } else {
+      unwatched.emplace(id, to + "/");
+    }
   }
+  if (!unwatched.empty()) AddSubtree(EntryPath(unwatched), unwatched, outcome, true);
 }
 
-void InotifyTree::MovedTo(const Event& event, const Event* partner, const Owners& owners,
-                          ReadOutcome& outcome) {
+void InotifyTree::MovedTo(const Event& event, const Event* partner, const Owners& owners, ReadOutcome& outcome) {
   Owners arrived;
   for (const auto& [id, prefix] : owners) {
     // A move within this watch's tree was reported whole by its first half.
     if (partner && PrefixIn(partner->descriptor, id)) continue;
-    Report(outcome, id, prefix + event.name, event.IsDirectory(), kActionAdded);
-    arrived.emplace(id, prefix + event.name + "/");
+    Report(outcome, id, prefix + event.name, IsDirectory(event), kActionAdded);
+    if (!IsDirectory(event)) {
+      ReportModified(outcome, id, prefix + event.name);
+    } else if (Recursive(id)) {
+      arrived.emplace(id, prefix + event.name + "/");
+    }
   }
-  if (event.IsDirectory() && !arrived.empty()) AddSubtree(EntryPath(arrived), arrived, &outcome);
+  if (!arrived.empty()) AddSubtree(EntryPath(arrived), arrived, outcome, true);
+}
+
+void InotifyTree::Modified(const Event& event, const Owners& owners, ReadOutcome& outcome) {
+  if (IsDirectory(event)) return;
+  for (const auto& [id, prefix] : owners) ReportModified(outcome, id, prefix + event.name);
 }
 
 void InotifyTree::SelfChanged(const Event& event, const Owners& owners, ReadOutcome& outcome) {
@@ -214,6 +241,23 @@ void InotifyTree::SelfChanged(const Event& event, const Owners& owners, ReadOutc
     if (entry != descriptors.end() && entry->second == event.descriptor) descriptors.erase(entry);
   }
   owners_.erase(found);
+  identities_.erase(event.descriptor);
+}
+
+void InotifyTree::Report(ReadOutcome& outcome, std::int64_t id, const std::string& relative, bool isDirectory,
+                         unsigned action) const {
+  outcome.batches[id].Add(Marked(relative, isDirectory), action);
+}
+
+void InotifyTree::ReportModified(ReadOutcome& outcome, std::int64_t id, const std::string& relative) const {
+  const auto project = projects_.find(id);
+  if (project != projects_.end() && project->second.options.modifications)
+    outcome.batches[id].Add(relative, kActionModified);
+}
+
+bool InotifyTree::Recursive(std::int64_t id) const {
+  const auto project = projects_.find(id);
+  return project != projects_.end() && project->second.options.recursive;
 }
 
 void InotifyTree::RootGone(std::int64_t id, ReadOutcome& outcome) {
@@ -221,31 +265,52 @@ void InotifyTree::RootGone(std::int64_t id, ReadOutcome& outcome) {
   Remove(id);
 }
 
-void InotifyTree::AddSubtree(const std::string& path, const Owners& owners, ReadOutcome* outcome) {
-  const int descriptor = inotify_add_watch(fd_, path.c_str(), kSubdirectoryMask);
+void InotifyTree::AddSubtree(const std::string& path, const Owners& owners, ReadOutcome& outcome,
+                             bool reportEntries) {
+  bool modifications = false;
+  for (const auto& owner : owners) modifications = modifications || projects_.at(owner.first).options.modifications;
+  Identity identity;
+  UniqueFd directory;
+  const int descriptor = WatchDirectory(path, false, modifications, identity, directory);
   if (descriptor < 0) {
-    // Gone or replaced again before we got to it: its parent reports that.
-    if (errno == ENOENT || errno == ENOTDIR) return;
-    handlers_.errorText("Cannot watch directory: " + path + ": " +
-                        std::error_code(errno, std::generic_category()).message() + "\n");
+    // Gone, replaced or renamed before we got to it: its parent's events tell the rest.
+    if (errno == ENOENT || errno == ENOTDIR || errno == ELOOP) return;
+    outcome.errors.push_back("Cannot watch directory: " + path + ": " +
+                             std::error_code(errno, std::generic_category()).message() + "\n");
     return;
   }
-  Adopt(descriptor, owners);
-  Scan(path, owners, outcome);
-}
-
-void InotifyTree::Scan(const std::string& path, const Owners& owners, ReadOutcome* outcome) {
-  for (const Entry& entry : ListDirectory(path)) {
+  Adopt(descriptor, identity, owners);
+  const std::vector<Entry> entries = ListDirectory(directory.Get());
+  directory.Reset();  // a deep tree must not hold one open directory per level
+  for (const Entry& entry : entries) {
     Owners below;
     for (const auto& [id, prefix] : owners) {
-      if (outcome) Report(*outcome, id, prefix + entry.name, entry.isDirectory, kActionAdded);
+      if (reportEntries) Report(outcome, id, prefix + entry.name, entry.isDirectory, kActionAdded);
       below.emplace(id, prefix + entry.name + "/");
     }
-    if (entry.isDirectory) AddSubtree(JoinPath(path, entry.name), below, outcome);
+    if (entry.isDirectory) AddSubtree(JoinPath(path, entry.name), below, outcome, reportEntries);
   }
 }
 
-void InotifyTree::Adopt(int descriptor, const Owners& owners) {
+int InotifyTree::WatchDirectory(const std::string& path, bool followLink, bool modifications, Identity& identity,
+                                UniqueFd& directory) const {
+  // Below the root a symbolic link is an entry of its own, never a directory to descend into.
+  directory = UniqueFd(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC | (followLink ? 0 : O_NOFOLLOW)));
+  if (!directory.Valid()) return -1;
+  struct stat status;
+  if (fstat(directory.Get(), &status) != 0) return -1;
+  identity = {status.st_dev, status.st_ino};
+  // Another watch may share the directory and want other events: masks only ever grow.
+  const std::uint32_t mask = kEntryEvents | IN_MASK_ADD | (modifications ? kContentEvents : 0);
+  const std::string opened = "/proc/self/fd/" + std::to_string(directory.Get());
+  const int descriptor = inotify_add_watch(fd_, opened.c_str(), mask);
+  if (descriptor >= 0 || errno != ENOENT) return descriptor;
+  // Without /proc, by name, which may belong to another directory by now.
+  return inotify_add_watch(fd_, path.c_str(), mask | (followLink ? 0 : IN_DONT_FOLLOW));
+}
+
+void InotifyTree::Adopt(int descriptor, const Identity& identity, const Owners& owners) {
+  identities_[descriptor] = identity;
   Owners& current = owners_[descriptor];
   for (const auto& [id, prefix] : owners) {
     auto& descriptors = projects_[id].descriptors;
@@ -263,6 +328,7 @@ void InotifyTree::Disown(int descriptor, std::int64_t id) {
   if (!found->second.empty()) return;  // another watch still needs it
   inotify_rm_watch(fd_, descriptor);
   owners_.erase(found);
+  identities_.erase(descriptor);
 }
 
 void InotifyTree::DetachSubtree(std::int64_t id, const std::string& prefix) {
@@ -284,6 +350,18 @@ void InotifyTree::MoveSubtree(std::int64_t id, const std::string& from, const st
     descriptors[renamed] = descriptor;
     owners_[descriptor][id] = renamed;
   }
+}
+
+bool InotifyTree::WatchesRenamed(std::int64_t id, const std::string& fromPrefix, const std::string& to) const {
+  const Project& project = projects_.at(id);
+  const auto watched = project.descriptors.find(fromPrefix);
+  if (watched == project.descriptors.end()) return false;
+  struct stat status;
+  // Renamed on again or removed since: the events still to come say where it went.
+  if (lstat(JoinPath(project.root, to).c_str(), &status) != 0) return true;
+  const auto identity = identities_.find(watched->second);
+  return identity == identities_.end() ||
+         (identity->second.device == status.st_dev && identity->second.inode == status.st_ino);
 }
 
 const std::string* InotifyTree::PrefixIn(int descriptor, std::int64_t id) const {

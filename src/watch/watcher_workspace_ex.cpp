@@ -10,6 +10,10 @@ namespace {
 // The "no longer operating" line has always been cut at this size.
 constexpr std::size_t kWatchErrorLineSize = 512;
 
+constexpr char kDestroyedInCallback[] =
+    "WatcherWorkspaceEx destroyed from inside its own callback: watching has stopped, without waiting for that "
+    "callback to return.\n";
+
 const char* TextOrEmpty(const char* text) { return text ? text : ""; }
 
 }  // namespace
@@ -27,6 +31,9 @@ WatcherWorkspaceEx::WatcherWorkspaceEx(xChangeCallback change, TraceCallback tra
 }
 
 WatcherWorkspaceEx::~WatcherWorkspaceEx() {
+  *alive_ = false;
+  // The worker cannot wait for itself; the handler it returns into sees that this is gone.
+  if (monitor_->InHandler()) tracer_.Text(TraceType::Line, "Error", kDestroyedInCallback);
   std::map<std::int64_t, std::unique_ptr<WatcherProjectEx>> projects;
   {
     std::lock_guard<std::mutex> lock(projectsLock_);
@@ -64,6 +71,9 @@ WatcherProjectEx* WatcherWorkspaceEx::FindProject(std::int64_t id) {
 }
 
 void WatcherWorkspaceEx::OnEvent(std::int64_t id, const vexil::ChangeBatch& batch) {
+  // The host may destroy this object from either callback: nothing of it is touched after
+  // one that did.
+  const auto alive = alive_;
   std::string pendingOld;
   std::string pendingNew;
   for (const auto& [name, action] : batch) {
@@ -72,6 +82,7 @@ void WatcherWorkspaceEx::OnEvent(std::int64_t id, const vexil::ChangeBatch& batc
     xChangeEvent event(name, action);
     tracer_.Verbose("Id: %lld  Project: %s  Directory: %s\n", static_cast<long long>(id),
                     project->Name(), name.c_str());
+    if (!*alive) return;
     if (event.type == 2) {
       (action == vexil::kActionRenamedOld ? pendingOld : pendingNew) = name;
       if (pendingOld.empty() || pendingNew.empty()) continue;
@@ -79,6 +90,7 @@ void WatcherWorkspaceEx::OnEvent(std::int64_t id, const vexil::ChangeBatch& batc
       event.newName = std::exchange(pendingNew, std::string());
     }
     change_(project, &event);
+    if (!*alive) return;
   }
 }
 

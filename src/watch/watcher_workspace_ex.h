@@ -2,6 +2,7 @@
 // the translation of the monitor's batches into the host's change events.
 #pragma once
 
+#include <atomic>
 #include <cstdint>
 #include <map>
 #include <memory>
@@ -32,6 +33,8 @@ class WatcherWorkspaceEx : public xWatcherWorkspaceEx {
  public:
   WatcherWorkspaceEx(xChangeCallback change, TraceCallback trace, TraceLevel level);
   // Forgets the projects, then stops the monitor: no callback runs once this has returned.
+  // Called from one of its own callbacks, it reports that, and the monitor's worker ends
+  // when the callback returns instead of being joined.
   ~WatcherWorkspaceEx() override;
 
   void Start(const char* name, const char* root, const void* userData) override;
@@ -46,8 +49,11 @@ class WatcherWorkspaceEx : public xWatcherWorkspaceEx {
  private:
   WatcherProjectEx* FindProject(std::int64_t id);
 
-  std::int64_t lastId_ = 0;
+  std::atomic<std::int64_t> lastId_{0};
   xChangeCallback change_;
+  // Read by the handlers after each host callback, which may have destroyed this object;
+  // a handler keeps its own reference.
+  std::shared_ptr<std::atomic<bool>> alive_ = std::make_shared<std::atomic<bool>>(true);
   vexil::Tracer tracer_;
   // Written by Start on the host's thread, read by OnEvent on the monitor's thread.
   std::mutex projectsLock_;

@@ -3,10 +3,12 @@
 #include <gtest/gtest.h>
 #include <signal.h>
 
+#include <algorithm>
 #include <chrono>
 #include <filesystem>
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "watcher_cmd_fixture.h"
 
@@ -22,20 +24,33 @@ xWatcherOptions Sleep30(int timeout) {
 }
 
 TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
-  // Still running at the 100 ms look, ended long before its 10 s.
-  auto event = Event("a.cpp", Options("echo built $F; sleep 1"));
+  // Still running at the 100 ms look, ended long before its 60 s. On the way it writes a
+  // frame header that promises 900 MB, a 1 MiB line, and more lines than are held at once.
+  const std::string output =
+      "printf 'Content-Length: 900000000\\r\\n\\r\\n'; head -c 1048576 /dev/zero | tr '\\0' x; echo; seq 200000; ";
+  auto event = Event("a.cpp", Options(output + "echo built $F; sleep 1; printf unended", 60000));
   ASSERT_TRUE(event->Start());
   const int pid = event->Command().Id();
   EXPECT_GT(pid, 0);
 
   ASSERT_TRUE(WaitForLine(Notice(kTask, "Watcher Command Run event complete.")));
-  EXPECT_TRUE(Traced(Message("built a.cpp\n")));
+  // Traced line by line, each cut like any trace line: the rest of the long line is dropped,
+  // and the last line counts without a line end.
+  for (const std::string& text : std::vector<std::string>{"Content-Length: 900000000\n", "\n", std::string(4095, 'x'),
+                                                          "1\n", "200000\n", "built a.cpp\n", "unended\n"}) {
+    EXPECT_TRUE(Traced(Message(text))) << text.substr(0, 30);
+  }
+  EXPECT_EQ(Recorded().shared.Read([] {
+              return std::count_if(Recorded().traces.begin(), Recorded().traces.end(),
+                                   [](const TraceLine& line) { return line.text.find("xx") != std::string::npos; });
+            }),
+            1);
   EXPECT_TRUE(event->Command().Completed());
   EXPECT_FALSE(event->Command().HaveErrors());
   EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));  // the notice comes just before the thread's end
-  for (const char* text : {"Watcher Event starting....\n\n", " Executable: /bin/sh\n",
-                           "  Arguments: -c echo built a.cpp; sleep 1 \n", "Use Command: Yes\n",
-                           "     Timout: 10000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"}) {
+  for (const std::string& text : std::vector<std::string>{
+           "Watcher Event starting....\n\n", " Executable: /bin/sh\n", "  Arguments: -c " + output + "echo built a.cpp; sleep 1; printf unended \n",
+           "Use Command: Yes\n", "     Timout: 60000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"}) {
     EXPECT_TRUE(Traced(Verbose(text))) << text;
   }
   EXPECT_FALSE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));

@@ -19,8 +19,9 @@ bool HasExtendedRead() {
   return GetProcAddress(GetModuleHandleA("kernel32.dll"), "ReadDirectoryChangesExW") != nullptr;
 }
 
-TEST(CompletionPortMonitor, ChangesMadeWhileNoReadIsOutstandingArriveAsOneBatch) {
+TEST(CompletionPortMonitor, ChangesMadeWhileNoReadIsOutstandingArriveAsOneBatchRenamesApart) {
   TempDir root;
+  for (int i = 0; i < 5; ++i) Touch(root / ("f" + std::to_string(i)));
   Probe probe;
   WorkerGate gate;
   ChangeMonitor monitor(gate.Wrap(probe.Handlers()));
@@ -29,9 +30,16 @@ TEST(CompletionPortMonitor, ChangesMadeWhileNoReadIsOutstandingArriveAsOneBatch)
   Touch(root / "a.txt");
   fs::remove(root / "a.txt");
   fs::create_directory(root / "sub");
+  // Each rename's two records stand together in the buffer: each pair is a batch of its own.
+  for (int i = 0; i < 5; ++i) fs::rename(root / ("f" + std::to_string(i)), root / ("g" + std::to_string(4 - i)));
   gate.Release();
   ASSERT_TRUE(probe.WaitForAll(1, {{"a.txt", kAdded}, {"a.txt", kRemoved}, {"sub\\", kAdded}}));
   EXPECT_TRUE(probe.SawInOneBatch(1, {{"a.txt", kAdded}, {"a.txt", kRemoved}, {"sub\\", kAdded}}));
+  for (int i = 0; i < 5; ++i) {
+    const std::string from = "f" + std::to_string(i), to = "g" + std::to_string(4 - i);
+    ASSERT_TRUE(probe.WaitFor(1, {to, kNew}));
+    EXPECT_TRUE(probe.SawBatch(1, {{from, kOld}, {to, kNew}})) << from;
+  }
 }
 
 TEST(CompletionPortMonitor, DirectoriesThatStillExistEndInABackslash) {

@@ -20,7 +20,7 @@ using vexil::ChangeBatch;
 using vexil::ChangeMonitor;
 using Change = std::pair<std::string, unsigned>;
 
-constexpr unsigned kAdded = 1, kRemoved = 2, kOld = 4, kNew = 5;
+constexpr unsigned kAdded = 1, kRemoved = 2, kModified = 3, kOld = 4, kNew = 5;
 
 // A directory's name in a batch ends in the platform's own separator.
 #ifdef _WIN32
@@ -70,6 +70,13 @@ class Probe {
         if (all) return true;
       }
       return false;
+    });
+  }
+  // Did one batch carry exactly `expected`?
+  bool SawBatch(std::int64_t id, const ChangeBatch& expected) {
+    return shared_.Read([&] {
+      return std::any_of(batches_.begin(), batches_.end(),
+                         [&](const auto& entry) { return entry.first == id && entry.second == expected; });
     });
   }
   std::size_t EventsFor(std::int64_t id) {

@@ -6,9 +6,11 @@
 
 #include <algorithm>
 #include <atomic>
+#include <map>
 #include <memory>
 #include <thread>
 #include <tuple>
+#include <utility>
 
 #include "watch_callbacks.h"
 
@@ -104,6 +106,17 @@ TEST_F(WatcherWorkspaceExTest, DeliversChangesAsEventsWithRenamesPaired) {
   EXPECT_EQ(std::make_tuple(events[4].type, events[4].action, events[4].name),
             std::make_tuple(1, 2u, std::string("a.txt")));
   EXPECT_TRUE(Traces().empty());
+
+  // Renames at once, which one read may take together, each still reach the host right.
+  for (int i = 0; i < 10; ++i) Touch(root / ("f" + std::to_string(i)));
+  ASSERT_TRUE(WaitForEvent("f9"));
+  for (int i = 0; i < 10; ++i) fs::rename(root / ("f" + std::to_string(i)), root / ("g" + std::to_string(9 - i)));
+  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 25; }));
+  std::map<std::string, std::string> renames, expected;
+  for (int i = 0; i < 10; ++i) expected["f" + std::to_string(i)] = "g" + std::to_string(9 - i);
+  for (const Delivered& event : Events())
+    if (event.type == 2 && event.name[0] == 'f') renames[event.name] = event.newName;
+  EXPECT_EQ(renames, expected);
 }
 
 TEST_F(WatcherWorkspaceExTest, BelowVerboseOnlyErrorLinesAreWritten) {
@@ -117,6 +130,39 @@ TEST_F(WatcherWorkspaceExTest, BelowVerboseOnlyErrorLinesAreWritten) {
   Touch(root + "/seen.txt");
   ASSERT_TRUE(WaitForEvent("seen.txt"));
   EXPECT_EQ(Traces(), (std::vector<TraceLine>{Error("Cannot create directory handle: 2\n")}));
+}
+
+// What the change callback below acts on: the callbacks are plain functions.
+xWatcherWorkspaceEx* acting = nullptr;
+std::string secondRoot;
+bool started = false;
+
+void ActOnChange(xWatcherProjectEx* project, xChangeEvent* event) {
+  RecordChange(project, event);
+  if (event->name == "start") {
+    acting->Start("second", secondRoot.c_str(), nullptr);
+    Recorded().shared.Update([] { started = true; });
+  }
+  if (event->name == "destroy") delete std::exchange(acting, nullptr);
+}
+
+TEST_F(WatcherWorkspaceExTest, CallbackMayStartProjectsAndDestroyingItsWatcherIsReported) {
+  TempDir first, second;
+  secondRoot = second.Path().string();
+  started = false;
+  acting = xWatcher_WorkspaceEx(ActOnChange, RecordTrace, LSP::TraceLevel::Messages);
+  acting->Start("first", first.Path().string().c_str(), nullptr);
+
+  Touch(first / "start");
+  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return started; })) << "Start hung in the callback";
+  Touch(second / "seen");
+  ASSERT_TRUE(WaitForEvent("seen"));
+  EXPECT_EQ(Only("seen").project, "second");
+
+  // Refused by the interface, yet neither a self-join nor a use of the freed watcher.
+  Touch(first / "destroy");
+  EXPECT_TRUE(WaitForTrace(Error("WatcherWorkspaceEx destroyed from inside its own callback: watching has stopped, "
+                                 "without waiting for that callback to return.\n")));
 }
 
 TEST_F(WatcherWorkspaceExTest, StopKeepsWatchingAndDestructionEndsCallbacks) {

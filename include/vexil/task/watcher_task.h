@@ -8,6 +8,10 @@
 #include "vexil/export.h"
 #include "vexil/task/watcher_options.h"
 
+// A task's trace callback is called on the thread that watches its directories while it
+// reports a change and runs the command. From there the host may call any other task, but
+// not Start, Stop or Release of the same task, which wait for that thread: they are refused
+// with an "Error" line.
 class VEXIL_API xWatcherTask {
  public:
   virtual ~xWatcherTask() = default;

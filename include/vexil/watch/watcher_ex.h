@@ -15,11 +15,18 @@ class VEXIL_API xWatcherProjectEx {
   virtual const void* UserData() = 0;
 };
 
-// Called on the watcher's own thread; `event` lives only for the duration of the call.
+// Called on the watcher's own thread, holding none of the watcher's locks; `event` lives
+// only for the duration of the call. A rename arrives once, as one event of type 2 with the
+// old `name` and the `newName`. From inside the callback the host may call `Start` (of this
+// or another watcher) and anything else of the library, but must not destroy the watcher
+// whose callback it is in: its destructor waits for its thread, which is the caller's. A
+// watcher destroyed there anyway says so under "Error" and stops without that wait.
 using xChangeCallback = void (*)(xWatcherProjectEx* project, xChangeEvent* event);
 
 class VEXIL_API xWatcherWorkspaceEx {
  public:
+  // Stops watching and waits for a callback that is running: none runs once it has returned.
+  // Not to be called from this watcher's own change or trace callbacks (see xChangeCallback).
   virtual ~xWatcherWorkspaceEx() = default;
   // Watches `root` and its whole subtree; failures are reported only as trace lines.
   virtual void Start(const char* name, const char* root, const void* userData) = 0;
