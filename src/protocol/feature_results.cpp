@@ -3,6 +3,7 @@
 #include "vexil/protocol/feature_results.h"
 
 #include "protocol/json_arrays.h"
+#include "protocol/raw_json.h"
 
 namespace LSP {
 namespace {
@@ -57,6 +58,7 @@ void CompletionItem::Read(const xObject& value) {
   insertText = value.String("insertText");
   insertTextFormat = value.Int("insertTextFormat");
   textEdit.Read(value.Object("textEdit"));
+  rawJson = RawJsonText(value);
 }
 
 void CompletionList::Read(const xObject& value) {

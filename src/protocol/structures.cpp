@@ -5,6 +5,7 @@
 #include <string>
 
 #include "protocol/json_arrays.h"
+#include "protocol/raw_json.h"
 
 namespace LSP {
 namespace {
@@ -175,6 +176,7 @@ void Diagnostic::Read(const xObject& value) {
   source = value.String("source");
   message = value.String("message");
   severity = value.Int("severity");
+  rawJson = RawJsonText(value);
 }
 
 void Diagnostic::Write(xWriter& writer) {

@@ -66,7 +66,8 @@ class VEXIL_API CompletionItemLabelDetails : public JsonObject {
   std::string description;
 };
 
-// Additional edits, commit characters and commands are not kept.
+// Additional edits, commit characters and commands are not read, but `rawJson` keeps the
+// item as the server sent it, so that "completionItem/resolve" can send it back whole.
 class VEXIL_API CompletionItem : public JsonObject {
  public:
   const char* Name() const override { return "completionItem"; }
@@ -85,6 +86,7 @@ class VEXIL_API CompletionItem : public JsonObject {
   std::string insertText;
   int insertTextFormat = -1;
   TextEdit textEdit;
+  std::string rawJson;  // "" for an item the host built
 };
 
 // A completion reply: a list object, a bare array of items, or null.
