@@ -4,26 +4,19 @@
 #include <gtest/gtest.h>
 
 #include <filesystem>
-#include <fstream>
-#include <sstream>
 
-#include "vexil/client/uri.h"
-#include "vexil/client/workspace_edits.h"
+#include "edit_helpers.h"
 #include "vexil_test/support.h"
 
 namespace {
 
 using LSP::PositionEncoding;
+using vexil_test::Content;
+using vexil_test::DocumentEdit;
+using vexil_test::Edit;
 
 // "a😀b" CRLF "cé" CR "d": bytes a 0, 😀 1-4, b 5, CR 6, LF 7, c 8, é 9-10, CR 11, d 12.
 const std::string kMixed = "a\xF0\x9F\x98\x80" "b\r\nc\xC3\xA9\rd";
-
-LSP::TextEdit Edit(int line, int from, int endLine, int to, const std::string& text) {
-  LSP::TextEdit edit;
-  edit.range = LSP::Range(LSP::Position(line, from), LSP::Position(endLine, to));
-  edit.newText = text;
-  return edit;
-}
 
 TEST(Positions, ConvertToOffsetsAndBackRoundingDownInsideCharacters) {
   const PositionEncoding u16 = PositionEncoding::Utf16;
@@ -91,21 +84,7 @@ TEST(ApplyTextEdits, RangesReferToTheOriginalTextAndOverlapsAreRefused) {
   }
 }
 
-std::string Content(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  std::ostringstream text;
-  text << file.rdbuf();
-  return text.str();
-}
-
 void Write(const std::string& path, const std::string& text) { std::ofstream(path, std::ios::binary) << text; }
-
-LSP::TextDocumentEdit DocumentEdit(const std::string& path, std::vector<LSP::TextEdit> edits) {
-  LSP::TextDocumentEdit document;
-  document.textDocument.uri = path.rfind("http", 0) == 0 ? path : FileToUri(path.c_str());
-  document.edits = std::move(edits);
-  return document;
-}
 
 std::size_t Entries(const std::filesystem::path& directory) {
   return static_cast<std::size_t>(std::distance(std::filesystem::directory_iterator(directory), {}));

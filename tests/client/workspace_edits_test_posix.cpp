@@ -7,27 +7,16 @@
 
 #include <csignal>
 #include <filesystem>
-#include <fstream>
 
-#include "vexil/client/uri.h"
-#include "vexil/client/workspace_edits.h"
+#include "edit_helpers.h"
 #include "vexil_test/support.h"
 
 namespace {
 
-std::string Content(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  return std::string(std::istreambuf_iterator<char>(file), {});
-}
+using vexil_test::Content;
 
 LSP::TextDocumentEdit Replace(const std::string& path, const std::string& text) {
-  LSP::TextDocumentEdit document;
-  document.textDocument.uri = FileToUri(path.c_str());
-  LSP::TextEdit edit;
-  edit.range = LSP::Range(LSP::Position(0, 0), LSP::Position(9, 0));
-  edit.newText = text;
-  document.edits = {edit};
-  return document;
+  return vexil_test::DocumentEdit(path, {vexil_test::Edit(0, 0, 9, 0, text)});
 }
 
 // Lowers the file-size limit of the process for one scope; going past it fails the
