@@ -76,7 +76,8 @@ bool WriteBeside(const std::string& target, const std::string& text, std::string
   struct stat status;
   // Renaming over a file needs only the directory's permission: a read-only file would
   // be replaced without a word.
-  if (stat(target.c_str(), &status) != 0 || access(target.c_str(), W_OK) != 0) return SystemFailure(error, "Cannot write", target);
+  if (stat(target.c_str(), &status) != 0 || access(target.c_str(), W_OK) != 0)
+    return SystemFailure(error, "Cannot write", target);
   std::string name = target + ".vexil-XXXXXX";
   Descriptor file(mkstemp(&name[0]));
   if (file.Get() < 0) return SystemFailure(error, "Cannot write", target);

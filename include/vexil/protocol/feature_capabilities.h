@@ -20,14 +20,14 @@ class VEXIL_API FeatureClientCapabilities : public Params {
   FeatureClientCapabilities() { name = "capabilities"; }
   void Write(xWriter& writer) override;
 
-  std::vector<std::string> codeActionKinds{"",         "quickfix", "refactor", "refactor.extract", "refactor.inline",
+  std::vector<std::string> codeActionKinds{"", "quickfix", "refactor", "refactor.extract", "refactor.inline",
                                            "refactor.rewrite", "source", "source.organizeImports"};
-  std::vector<std::string> tokenTypes{"namespace", "type",     "class",    "enum",     "interface", "struct",
-                                      "typeParameter", "parameter", "variable", "property", "enumMember", "event",
-                                      "function",  "method",   "macro",    "keyword",  "modifier",  "comment",
-                                      "string",    "number",   "regexp",   "operator", "decorator"};
-  std::vector<std::string> tokenModifiers{"declaration", "definition", "readonly",     "static",        "deprecated",
-                                          "abstract",    "async",      "modification", "documentation", "defaultLibrary"};
+  std::vector<std::string> tokenTypes{"namespace", "type", "class", "enum", "interface", "struct", "typeParameter",
+                                      "parameter", "variable", "property", "enumMember", "event", "function",
+                                      "method", "macro", "keyword", "modifier", "comment", "string", "number",
+                                      "regexp", "operator", "decorator"};
+  std::vector<std::string> tokenModifiers{"declaration", "definition", "readonly", "static", "deprecated",
+                                          "abstract", "async", "modification", "documentation", "defaultLibrary"};
 };
 
 }  // namespace LSP
