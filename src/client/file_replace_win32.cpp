@@ -70,8 +70,15 @@ bool ReadWholeFile(const std::string& path, std::string& text, std::string& erro
 }
 
 bool WriteBeside(const std::string& target, const std::string& text, std::string& temporary, std::string& error) {
+  // A read-only file is refused even where the system would let a privileged user open
+  // it (wine running as root does).
+  const DWORD attributes = GetFileAttributesA(target.c_str());
+  if (attributes != INVALID_FILE_ATTRIBUTES && (attributes & FILE_ATTRIBUTE_READONLY)) {
+    SetLastError(ERROR_ACCESS_DENIED);
+    return SystemFailure(error, "Cannot write", target);
+  }
   // The open that a replacement needs: it fails while another program holds the file
-  // without sharing its deletion, and for a read-only file.
+  // without sharing its deletion.
   {
     Handle probe(CreateFileA(target.c_str(), GENERIC_WRITE | DELETE, kShareAll, nullptr, OPEN_EXISTING, 0, nullptr));
     if (!probe.Valid()) return SystemFailure(error, "Cannot write", target);

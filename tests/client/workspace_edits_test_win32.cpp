@@ -3,6 +3,8 @@
 #include <gtest/gtest.h>
 #include <windows.h>
 
+#include <fstream>
+
 #include "edit_helpers.h"
 #include "vexil_test/support.h"
 
@@ -19,7 +21,7 @@ TEST(ApplyWorkspaceEdit, FilesThatCannotBeReplacedAreRefusedBeforeAnyIsWritten) 
   const std::string free = directory / "free.txt";
   const std::string held = directory / "held.txt";
   const std::string readOnly = directory / "read-only.txt";
-  for (const std::string& path : {free, held, readOnly}) std::ofstream(path) << "text\n";
+  for (const std::string& path : {free, held, readOnly}) std::ofstream(path, std::ios::binary) << "text\n";
   SetFileAttributesA(readOnly.c_str(), FILE_ATTRIBUTE_READONLY);
   HANDLE holder = CreateFileA(held.c_str(), GENERIC_READ, FILE_SHARE_READ | FILE_SHARE_WRITE, nullptr, OPEN_EXISTING,
                               0, nullptr);
