@@ -99,6 +99,9 @@ void CompletionItemResolveParams::Write(xWriter& writer) {
   else WriteRawMembers(writer, item.rawJson);
 }
 
-void ResolvedCompletionItem::Read(const xObject& value) { item.Read(value); }
+void ResolvedCompletionItem::Read(const xObject& value) {
+  item.Read(value);
+  item.rawJson = RawJsonText(value);
+}
 
 }  // namespace LSP

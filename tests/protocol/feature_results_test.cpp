@@ -62,6 +62,13 @@ TEST(CompletionItem, ReadsEveryKeptMemberAndDefaultsTheAbsentOnes) {
   EXPECT_EQ(bare.kind, -1);
   EXPECT_EQ(bare.insertTextFormat, -1);
   EXPECT_EQ(bare.textEdit.range.start.line, -1);
+  // Each item keeps its text, for a resolve, unless the list is told it need not.
+  EXPECT_EQ(bare.rawJson, R"({"label":"x"})");
+  EXPECT_NE(full.rawJson.find(R"("commitCharacters":["("])"), std::string::npos);
+  LSP::CompletionList lean;
+  lean.keepItemJson = false;
+  ReadResult(R"({"items":[{"label":"x","data":1}]})", lean);
+  EXPECT_EQ(lean.items.at(0).rawJson, "");
 }
 
 TEST(LocationsList, ReadsNullASingleLocationOrAnArray) {

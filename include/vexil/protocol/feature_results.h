@@ -67,7 +67,8 @@ class VEXIL_API CompletionItemLabelDetails : public JsonObject {
 };
 
 // Additional edits, commit characters and commands are not read, but `rawJson` keeps the
-// item as the server sent it, so that "completionItem/resolve" can send it back whole.
+// item as the server sent it, so that "completionItem/resolve" can send it back whole. It
+// is filled by the list that holds the item and by the resolved item.
 class VEXIL_API CompletionItem : public JsonObject {
  public:
   const char* Name() const override { return "completionItem"; }
@@ -98,6 +99,9 @@ class VEXIL_API CompletionList : public Result {
 
   bool isIncomplete = false;
   std::vector<CompletionItem> items;
+  // Whether each item keeps its JSON text (`rawJson`), which only a server that resolves
+  // items needs: keeping it makes reading a large list half as fast again.
+  bool keepItemJson = true;
 };
 
 // A result that arrives as a JSON array.
