@@ -4,7 +4,26 @@
 
 #include <numeric>
 
+#include "json/rapidjson.h"
+
 namespace LSP {
+namespace {
+
+// Merges `source` into `target` in place: objects member by member, other values replaced,
+// new members appended after the existing ones.
+void Merge(JsonValue& target, const JsonValue& source, JsonDocument::AllocatorType& allocator) {
+  for (const auto& member : source.GetObject()) {
+    auto found = target.FindMember(member.name);
+    if (found == target.MemberEnd())
+      target.AddMember(JsonValue(member.name, allocator), JsonValue(member.value, allocator), allocator);
+    else if (found->value.IsObject() && member.value.IsObject())
+      Merge(found->value, member.value, allocator);
+    else
+      found->value.CopyFrom(member.value, allocator);
+  }
+}
+
+}  // namespace
 
 void DynamicRegistrationCapabilities::Write(xWriter& writer) {
   writer.Bool("dynamicRegistration", dynamicRegistration);
@@ -103,8 +122,26 @@ void TextDocumentClientCapabilities::Write(xWriter& writer) {
 }
 
 void ClientCapabilities::Write(xWriter& writer) {
-  writer.Object(workspace, true);
-  writer.Object(textDocument, true);
+  if (additions.empty()) {
+    writer.Object(workspace, true);
+    writer.Object(textDocument, true);
+    return;
+  }
+  // The tree as text, merged with the additions, then written member by member.
+  xWriter plain;
+  plain.StartObject();
+  plain.Object(workspace, true);
+  plain.Object(textDocument, true);
+  plain.EndObject();
+  const std::string text = plain.GetString();
+  JsonDocument tree;
+  tree.Parse(text.c_str(), text.size());
+  for (const std::string& addition : additions) {
+    JsonDocument extra;
+    extra.Parse(addition.c_str(), addition.size());
+    if (!extra.HasParseError() && extra.IsObject()) Merge(tree, extra, tree.GetAllocator());
+  }
+  for (const auto& member : tree.GetObject()) writer.Raw(member.name.GetString(), member.value);
 }
 
 }  // namespace LSP

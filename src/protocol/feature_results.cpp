@@ -3,6 +3,7 @@
 #include "vexil/protocol/feature_results.h"
 
 #include "protocol/json_arrays.h"
+#include "protocol/raw_json.h"
 
 namespace LSP {
 namespace {
@@ -60,12 +61,17 @@ void CompletionItem::Read(const xObject& value) {
 }
 
 void CompletionList::Read(const xObject& value) {
+  xObject array = value;
   if (value.IsObject()) {
     isIncomplete = value.Bool("isIncomplete");
     ReadArray(value, "items", items);
+    array = value.Object("items");
   } else if (value.IsArray()) {
     ReadArrayElements(value.Value(), items);
   }
+  if (!keepItemJson || !array.IsArray()) return;
+  std::size_t item = items.size() - array.Value().Size();  // items read before this reply stay
+  for (const JsonValue& element : array.Value().GetArray()) items[item++].rawJson = RawJsonText(xObject(element));
 }
 
 void LocationsList::Read(const xObject& value) {

@@ -19,6 +19,24 @@ bool ReadProvider(const xObject& capabilities, const char* key) {
   }
 }
 
+// A member of an options object that is read like a boolean provider: true only for
+// `true`, never failing the reading.
+bool ReadOption(const xObject& capabilities, const char* provider, const char* option) {
+  xObject options = capabilities.Object(provider);
+  return options.IsObject() && ReadProvider(options, option);
+}
+
+// Options read after the ones of old: a malformed value leaves them at their defaults
+// instead of failing the reading of capabilities that read fine before.
+template <typename Options>
+void ReadLeniently(const xObject& value, Options& options) {
+  try {
+    options.Read(value);
+  } catch (const std::exception&) {
+    options = Options();
+  }
+}
+
 }  // namespace
 
 void SaveOptions::Read(const xObject& value) { includeText = value.Bool("includeText"); }
@@ -89,6 +107,12 @@ void ServerCapabilities::Read(const xObject& value) {
   documentOnTypeFormattingProvider.Read(value.Object("documentOnTypeFormattingProvider"));
   executeCommandProvider.Read(value.Object("executeCommandProvider"));
   diagnosticProvider = ReadProvider(value, "diagnosticProvider");
+  ReadLeniently(value.Object("semanticTokensProvider"), semanticTokensProvider);
+  foldingRangeProvider = ReadProvider(value, "foldingRangeProvider");
+  selectionRangeProvider = ReadProvider(value, "selectionRangeProvider");
+  callHierarchyProvider = ReadProvider(value, "callHierarchyProvider");
+  inlayHintProvider = ReadProvider(value, "inlayHintProvider");
+  prepareRenameProvider = ReadOption(value, "renameProvider", "prepareProvider");
 }
 
 }  // namespace LSP

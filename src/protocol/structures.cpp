@@ -6,6 +6,7 @@
 
 #include "json/json_depth.h"
 #include "protocol/json_arrays.h"
+#include "protocol/raw_json.h"
 
 namespace LSP {
 namespace {
@@ -186,6 +187,7 @@ void Diagnostic::Read(const xObject& value) {
   source = value.String("source");
   message = value.String("message");
   severity = value.Int("severity");
+  rawJson = RawJsonText(value);
 }
 
 void Diagnostic::Write(xWriter& writer) {

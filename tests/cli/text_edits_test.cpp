@@ -1,24 +1,9 @@
-// Edits applied at UTF-16 positions, in any order, and shown as unified diffs whose hunks
-// carry the right line numbers.
+// Edits shown as unified diffs whose hunks carry the right line numbers.
 #include <gtest/gtest.h>
 
 #include "text_edits.h"
 
 namespace {
-
-LSP::TextEdit Edit(int line, int from, int endLine, int to, const std::string& text) {
-  LSP::TextEdit edit;
-  edit.range = LSP::Range(LSP::Position(line, from), LSP::Position(endLine, to));
-  edit.newText = text;
-  return edit;
-}
-
-TEST(TextEdits, EditsApplyAtUtf16PositionsWhateverTheirOrder) {
-  // "é" is two bytes and one unit; "😀" four bytes and two units.
-  std::string text = "int é = 1;\nint 😀x = 2;\nend\n";
-  std::string edited = cli::ApplyEdits(text, {Edit(1, 6, 1, 7, "y"), Edit(0, 4, 0, 5, "e"), Edit(2, 0, 3, 0, "")});
-  EXPECT_EQ(edited, "int e = 1;\nint 😀y = 2;\n");
-}
 
 TEST(TextEdits, DiffsShowRemovalsBeforeAdditionsInSeparateHunks) {
   std::string before;

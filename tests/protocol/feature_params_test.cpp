@@ -1,8 +1,13 @@
-// The params of every feature request and notification, as the exact texts servers parse.
+// The params of every feature request and notification, as the exact texts servers parse;
+// what a server sent goes back as it came.
 #include <gtest/gtest.h>
 
 #include "reply_helpers.h"
+#include "vexil/protocol/call_hierarchy.h"
+#include "vexil/protocol/diagnostics.h"
+#include "vexil/protocol/document_features.h"
 #include "vexil/protocol/feature_params.h"
+#include "vexil/protocol/workspace_notifications.h"
 
 namespace {
 
@@ -91,6 +96,76 @@ TEST(FeatureParams, WorkspaceSymbolQueryIsWrittenEvenWhenEmpty) {
   LSP::RequestMessage request("workspace/symbol", &params);
   request.id = 5;
   EXPECT_EQ(request.ToJSON(), R"({"jsonrpc":"2.0","id":5,"method":"workspace/symbol","params":{"query":"Rect"}})");
+}
+
+TEST(FeatureParams, CodeActionContextGivesDiagnosticsBackInTheProtocolsShape) {
+  // One as published (kept verbatim, "data" and all), one built by the host.
+  LSP::PublishDiagnosticsParams published;
+  const std::string sent = R"({"range":{"start":{"line":1,"character":2},"end":{"line":1,"character":5}},)"
+                           R"("severity":1,"code":"E1","source":"lint","message":"bad","data":{"fix":7}})";
+  LSP::xReader reader;
+  ASSERT_TRUE(reader.Parse(R"({"params":{"uri":"file:///a.c","diagnostics":[)" + sent + "]}}"));
+  published.Read(reader);
+  LSP::Diagnostic built;
+  built.range = LSP::Range(LSP::Position(3, 0), LSP::Position(3, 1));
+  built.code = 42;
+  built.message = "m";
+  auto actions = WithDocument<LSP::CodeActionParams>();
+  actions.range = built.range;
+  actions.context.diagnostics = {published.diagnostics[0], built};
+  actions.context.only = {"quickfix"};
+  EXPECT_EQ(Json(actions), std::string("{") + kDocument +
+                               R"(,"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
+                               R"("context":{"diagnostics":[)" + sent +
+                               R"(,{"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
+                               R"("code":42,"message":"m"}],"only":["quickfix"]}})");
+  // The diagnostic's own writing stays flattened.
+  EXPECT_EQ(Json(built), R"({"start":{"line":3,"character":0},"end":{"line":3,"character":1},"code":42,"message":"m"})");
+}
+
+TEST(FeatureParams, NewerRequestsAndNotificationsWriteExactlyTheirMembers) {
+  LSP::ExecuteCommandParams execute;
+  execute.command = "run";
+  auto selection = WithDocument<LSP::SelectionRangeParams>();
+  selection.positions = {LSP::Position(1, 2), LSP::Position(3, 4)};
+  auto hints = WithDocument<LSP::InlayHintParams>();
+  hints.range = LSP::Range(LSP::Position(0, 0), LSP::Position(9, 0));
+  auto willSave = WithDocument<LSP::WillSaveTextDocumentParams>();
+  willSave.reason = 3;
+  LSP::DidChangeConfigurationParams configuration;
+  LSP::DidChangeWorkspaceFoldersParams folders;
+  folders.event.added.emplace_back("file:///b", "b");
+  LSP::CompletionItemResolveParams resolveBuilt;
+  resolveBuilt.item.label = "push_back";
+  LSP::CallHierarchyCallsParams callsBuilt;
+  callsBuilt.item.name = "f";
+  callsBuilt.item.kind = 12;
+  callsBuilt.item.uri = "file:///a.c";
+  LSP::ApplyWorkspaceEditResult answer;
+  answer.failureReason = "read-only";
+  const std::pair<LSP::JsonObject*, std::string> rows[] = {
+      {&execute, R"({"command":"run"})"},
+      {&selection, std::string("{") + kDocument +
+                       R"(,"positions":[{"line":1,"character":2},{"line":3,"character":4}]})"},
+      {&hints, std::string("{") + kDocument + R"(,"range":{"start":{"line":0,"character":0},"end":{"line":9,"character":0}}})"},
+      {&willSave, std::string("{") + kDocument + R"(,"reason":3})"},
+      {&configuration, R"({"settings":null})"},
+      {&folders, R"({"event":{"added":[{"uri":"file:///b","name":"b"}],"removed":[]}})"},
+      {&resolveBuilt, R"({"label":"push_back"})"},
+      {&callsBuilt, R"({"item":{"name":"f","kind":12,"uri":"file:///a.c","range":{"start":{"line":0,"character":0},)"
+                    R"("end":{"line":0,"character":0}},"selectionRange":{"start":{"line":0,"character":0},)"
+                    R"("end":{"line":0,"character":0}}}})"},
+      {&answer, R"({"applied":false,"failureReason":"read-only"})"},
+  };
+  for (const auto& [params, expected] : rows) EXPECT_EQ(Json(*params), expected);
+
+  execute.arguments = R"([{"file":"a.c"},2])";
+  configuration.settings = R"({"pylsp":{"plugins":{}}})";
+  EXPECT_EQ(Json(execute), R"({"command":"run","arguments":[{"file":"a.c"},2]})");
+  EXPECT_EQ(Json(configuration), R"({"settings":{"pylsp":{"plugins":{}}}})");
+  configuration.settings = "{pylsp";
+  EXPECT_EQ(vexil_test::ThrownText([&] { Json(configuration); }),
+            "Invalid JSON for settings: Missing a name for object member.");
 }
 
 }  // namespace

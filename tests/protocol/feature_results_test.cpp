@@ -1,9 +1,14 @@
 // Feature results in every shape a server may send: bare arrays and list objects, null,
-// single locations, string / object / array hover contents, hierarchical symbols.
+// single locations, string / object / array hover contents, hierarchical symbols, code
+// actions mixed with bare commands, selection chains, hint labels, rename answers, tokens.
 #include <gtest/gtest.h>
 
+#include <gmock/gmock.h>
+
 #include "reply_helpers.h"
+#include "vexil/protocol/document_features.h"
 #include "vexil/protocol/feature_results.h"
+#include "vexil/protocol/semantic_tokens.h"
 
 namespace {
 
@@ -57,6 +62,13 @@ TEST(CompletionItem, ReadsEveryKeptMemberAndDefaultsTheAbsentOnes) {
   EXPECT_EQ(bare.kind, -1);
   EXPECT_EQ(bare.insertTextFormat, -1);
   EXPECT_EQ(bare.textEdit.range.start.line, -1);
+  // Each item keeps its text, for a resolve, unless the list is told it need not.
+  EXPECT_EQ(bare.rawJson, R"({"label":"x"})");
+  EXPECT_NE(full.rawJson.find(R"("commitCharacters":["("])"), std::string::npos);
+  LSP::CompletionList lean;
+  lean.keepItemJson = false;
+  ReadResult(R"({"items":[{"label":"x","data":1}]})", lean);
+  EXPECT_EQ(lean.items.at(0).rawJson, "");
 }
 
 TEST(LocationsList, ReadsNullASingleLocationOrAnArray) {
@@ -162,6 +174,121 @@ TEST(DocumentFormattingList, ReadsEditsAsAnArrayOnly) {
   EXPECT_EQ(ThrownText([&] { ReadResult(R"([{"range":{},"newText":1}])", bad); }),
             "Error:Expecting a 'string' JSON object but found 'number' JSON object.\n\n"
             "Expecting a array JSON object but found 4 JSON object.");
+}
+
+TEST(CodeActionList, ActionsAndBareCommandsMixInOneList) {
+  LSP::CodeActionList list;
+  ReadResult(std::string(R"([{"title":"Run","command":"run","arguments":[1,{"a":null}]},)"
+                         R"({"title":"Fix","kind":"quickfix","diagnostics":[{"range":)") +
+                 kRange + R"(,"message":"m","code":"E1"}],"edit":{"documentChanges":[{"textDocument":)"
+                          R"({"uri":"file:///a.c","version":3},"edits":[{"range":)" +
+                 kRange + R"(,"newText":"x"}]}]},"command":{"title":"Then","command":"after"}},{"title":"Bare"}])",
+             list);
+  ASSERT_EQ(list.items.size(), 3u);
+  const LSP::CodeAction& command = list.items[0];
+  EXPECT_EQ(command.title, "Run");
+  EXPECT_EQ(command.command.arguments, R"([1,{"a":null}])");
+  EXPECT_FALSE(command.HasEdit());
+  const LSP::CodeAction& fix = list.items[1];
+  EXPECT_EQ(fix.diagnostics[0].codeText, "E1");
+  EXPECT_EQ(fix.edit.documentChanges[0].textDocument.version, 3);
+  EXPECT_EQ(fix.command.command, "after");
+  EXPECT_FALSE(list.items[2].HasEdit() || list.items[2].HasCommand());
+  EXPECT_EQ(ThrownText([&] { ReadResult("{}", list); }), "Expecting a array JSON object but found 3 JSON object .");
+}
+
+TEST(SelectionRange, ParentsAreReadInnermostFirstUpToAThousand) {
+  LSP::SelectionRangeList list;
+  ReadResult(R"([{"range":{"start":{"line":5,"character":2},"end":{"line":5,"character":4}},"parent":{"range":)"
+             R"({"start":{"line":5,"character":0},"end":{"line":6,"character":0}},"parent":{"range":)"
+             R"({"start":{"line":0,"character":0},"end":{"line":9,"character":0}}}}},{"range":{}}])",
+             list);
+  ASSERT_EQ(list.items.size(), 2u);
+  EXPECT_EQ(list.items[0].range.start.character, 2);
+  ASSERT_EQ(list.items[0].parents.size(), 2u);
+  EXPECT_EQ(list.items[0].parents[0].end.line, 6);
+  EXPECT_EQ(list.items[0].parents[1].end.line, 9);
+  EXPECT_TRUE(list.items[1].parents.empty());
+
+  // Each parent wraps the range before it; the last wrapped is the innermost.
+  for (const int depth : {1000, 1001}) {
+    std::string json = std::string(R"({"range":)") + kRange + "}";
+    for (int k = 0; k < depth; ++k) json = std::string(R"({"range":)") + kRange + R"(,"parent":)" + json + "}";
+    LSP::SelectionRangeList deep;
+    const std::string thrown = ThrownText([&] { ReadResult("[" + json + "]", deep); });
+    if (depth == 1000) EXPECT_EQ(deep.items.at(0).parents.size(), 1000u) << thrown;
+    else EXPECT_THAT(thrown, testing::StartsWith("Error:More than 1000 nested 'parent' JSON objects."));
+  }
+}
+
+TEST(InlayHint, LabelIsTextOrPartsJoined) {
+  LSP::InlayHintList hints;
+  ReadResult(R"([{"position":{"line":3,"character":8},"label":"value:","kind":2,"paddingRight":true},)"
+             R"({"position":{"line":4,"character":1},"label":[{"value":": "},{"value":"Rectangle","location":)"
+             R"({"uri":"file:///s.h","range":{"start":{"line":9,"character":6},"end":{"line":9,"character":15}}}}],)"
+             R"("tooltip":"type","textEdits":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":1}},)"
+             R"("newText":": Rectangle"}]}])",
+             hints);
+  ASSERT_EQ(hints.items.size(), 2u);
+  EXPECT_EQ(hints.items[0].label, "value:");
+  EXPECT_TRUE(hints.items[0].labelParts.empty());
+  EXPECT_TRUE(hints.items[0].paddingRight && !hints.items[0].paddingLeft);
+  const LSP::InlayHint& parts = hints.items[1];
+  EXPECT_EQ(parts.label, ": Rectangle");
+  ASSERT_EQ(parts.labelParts.size(), 2u);
+  EXPECT_EQ(parts.labelParts[1].location.uri, "file:///s.h");
+  EXPECT_EQ(parts.labelParts[0].location.uri, "");
+  EXPECT_EQ(parts.kind, -1);
+  EXPECT_EQ(parts.tooltip.value, "type");
+  EXPECT_EQ(parts.textEdits.at(0).newText, ": Rectangle");
+}
+
+TEST(PrepareRenameResult, RangeRangeWithPlaceholderOrDefaultBehavior) {
+  struct Row {
+    const char* result;
+    bool canRename;
+    int startCharacter;
+    const char* placeholder;
+  } rows[] = {
+      {kRange, true, 1, ""},
+      {R"({"range":{"start":{"line":2,"character":3},"end":{"line":2,"character":5}},"placeholder":"x"})", true, 3, "x"},
+      {R"({"defaultBehavior":true})", true, -1, ""},
+      {R"({"defaultBehavior":false})", false, -1, ""},
+      {"null", false, -1, ""},
+  };
+  for (const Row& row : rows) {
+    LSP::PrepareRenameResult result;
+    ReadResult(row.result, result);
+    EXPECT_EQ(result.CanRename(), row.canRename) << row.result;
+    EXPECT_EQ(result.range.start.character, row.startCharacter) << row.result;
+    EXPECT_EQ(result.placeholder, row.placeholder) << row.result;
+  }
+}
+
+TEST(SemanticTokens, DecodeMakesPositionsAbsoluteAndNamesWhatTheLegendKnows) {
+  LSP::SemanticTokensLegend legend;
+  legend.tokenTypes = {"variable", "function"};
+  legend.tokenModifiers = {"declaration", "static"};
+  LSP::SemanticTokens tokens;
+  // Same line twice (starts add up), a new line (start from 0), an unknown type and
+  // modifier bits beyond the legend (the 32nd included), and an incomplete last group.
+  ReadResult(R"({"resultId":"7","data":[2,4,3,1,1, 0,6,2,0,2, 3,1,5,9,4294967295, 1,2]})", tokens);
+  const std::vector<LSP::SemanticToken> decoded = tokens.Decode(legend);
+  ASSERT_EQ(decoded.size(), 3u);
+  EXPECT_EQ(decoded[0].line * 100 + decoded[0].character, 204);
+  EXPECT_EQ(decoded[0].type, "function");
+  EXPECT_THAT(decoded[0].modifiers, testing::ElementsAre("declaration"));
+  EXPECT_EQ(decoded[1].line * 100 + decoded[1].character, 210);
+  EXPECT_THAT(decoded[1].modifiers, testing::ElementsAre("static"));
+  EXPECT_EQ(decoded[2].line * 100 + decoded[2].character, 501);
+  EXPECT_EQ(decoded[2].length, 5);
+  EXPECT_EQ(decoded[2].type, "");
+  EXPECT_EQ(decoded[2].typeIndex, 9);
+  EXPECT_EQ(decoded[2].modifierBits, 4294967295u);
+  EXPECT_THAT(decoded[2].modifiers, testing::ElementsAre("declaration", "static"));
+  LSP::SemanticTokens bad;
+  EXPECT_EQ(ThrownText([&] { ReadResult(R"({"data":[1,-2]})", bad); }),
+            "Expecting a uint JSON object but found 6 JSON object .");
 }
 
 }  // namespace

@@ -37,13 +37,17 @@ TEST(ServerCapabilities, BooleanProviderIsTrueForTrueAndForAnOptionsObjectOnly) 
       R"({"hoverProvider":{},"definitionProvider":{},"typeDefinitionProvider":{},"implementationProvider":{},)"
       R"("referencesProvider":{},"documentHighlightProvider":{},"documentSymbolProvider":{},)"
       R"("workspaceSymbolProvider":{},"codeActionProvider":{},"documentFormattingProvider":{},)"
-      R"("documentRangeFormattingProvider":{},"renameProvider":{}})");
+      R"("documentRangeFormattingProvider":{},"renameProvider":{"prepareProvider":true},"foldingRangeProvider":{},)"
+      R"("selectionRangeProvider":{},"callHierarchyProvider":{},"inlayHintProvider":{}})");
   for (bool provided : {objects.hoverProvider, objects.definitionProvider, objects.typeDefinitionProvider,
                         objects.implementationProvider, objects.referencesProvider, objects.documentHighlightProvider,
                         objects.documentSymbolProvider, objects.workspaceSymbolProvider, objects.codeActionProvider,
                         objects.documentFormattingProvider, objects.documentRangeFormattingProvider,
-                        objects.renameProvider})
+                        objects.renameProvider, objects.prepareRenameProvider, objects.foldingRangeProvider,
+                        objects.selectionRangeProvider, objects.callHierarchyProvider, objects.inlayHintProvider})
     EXPECT_TRUE(provided);
+  EXPECT_TRUE(read.prepareRenameProvider);
+  EXPECT_FALSE(Read(R"({"renameProvider":true})").prepareRenameProvider);
 }
 
 TEST(ServerCapabilities, OptionProvidersFillTheirFieldsAndIgnoreTheSyncMember) {
@@ -52,7 +56,8 @@ TEST(ServerCapabilities, OptionProvidersFillTheirFieldsAndIgnoreTheSyncMember) {
       R"("signatureHelpProvider":{"triggerCharacters":["("]},"codeLensProvider":{"resolveProvider":true},)"
       R"("documentOnTypeFormattingProvider":{"firstTriggerCharacter":"}","moreTriggerCharacter":[";"]},)"
       R"("documentLinkProvider":{"resolveProvider":true},"colorProvider":true,)"
-      R"("executeCommandProvider":{"commands":["a","b"]}})");
+      R"("executeCommandProvider":{"commands":["a","b"]},"semanticTokensProvider":{"legend":{"tokenTypes":["type"],)"
+      R"("tokenModifiers":["static"]},"range":true,"full":{"delta":false}}})");
   EXPECT_EQ(read.textDocumentSync.change, 0);
   EXPECT_FALSE(read.textDocumentSync.openClose);
   EXPECT_TRUE(read.completionProvider.resolveProvider);
@@ -63,6 +68,10 @@ TEST(ServerCapabilities, OptionProvidersFillTheirFieldsAndIgnoreTheSyncMember) {
   EXPECT_TRUE(read.documentOnTypeFormattingProvider.moreTriggerCharacter.empty());
   EXPECT_TRUE(read.documentLinkProvider.resolveProvider);
   EXPECT_EQ(read.executeCommandProvider.commands, (std::vector<std::string>{"a", "b"}));
+  const LSP::SemanticTokensOptions& tokens = read.semanticTokensProvider;
+  EXPECT_TRUE(tokens.range && tokens.full && !tokens.fullDelta);
+  EXPECT_EQ(tokens.legend.tokenTypes, std::vector<std::string>{"type"});
+  EXPECT_EQ(tokens.legend.tokenModifiers, std::vector<std::string>{"static"});
 
   LSP::CompletionOptions options = read.completionProvider;
   EXPECT_EQ(LSP::ToJsonText(options), R"({"resolveProvider":true,"triggerCharacter":[".",">"]})");
@@ -80,6 +89,12 @@ TEST(ServerCapabilities, OptionProviderOfTheWrongTypeFailsTheWholeReading) {
             "Expecting a 'array' JSON object but found 'string' JSON object.");
   // Nothing to read, so nothing to fail.
   EXPECT_EQ(ThrownText([] { Read(R"({"colorProvider":true})"); }), "");
+  // Semantic tokens came later: a malformed provider is only left unread.
+  for (const char* malformed : {R"(true)", R"({"legend":{"tokenTypes":"type"},"full":true})"}) {
+    const LSP::ServerCapabilities read = Read(std::string(R"({"hoverProvider":true,"semanticTokensProvider":)") + malformed + "}");
+    EXPECT_TRUE(read.hoverProvider) << malformed;
+    EXPECT_FALSE(read.semanticTokensProvider.IsProvided()) << malformed;
+  }
 }
 
 TEST(ServerCapabilities, MissingOrNullCapabilitiesLeaveEveryDefault) {

@@ -6,6 +6,7 @@
 #include <filesystem>
 
 #include "text_edits.h"
+#include "vexil/client/text_edits.h"
 #include "vexil/client/uri.h"
 
 namespace cli {
@@ -106,8 +107,11 @@ std::string HoverText(const LSP::Hover& hover) {
 }
 
 std::string EditsAsDiff(const FileEdits& file) {
-  std::string before = ReadText(file.path);
-  return UnifiedDiff(Relative(file.path), before, ApplyEdits(before, file.edits));
+  const std::string before = ReadText(file.path);
+  std::string after = before;
+  std::string error;
+  if (!LSP::ApplyTextEdits(after, file.edits, error)) return "  " + Relative(file.path) + ": " + error + "\n";
+  return UnifiedDiff(Relative(file.path), before, after);
 }
 
 void PrintReadable(std::ostream& out, const Action& action, const Outcome& outcome) {

@@ -1,5 +1,5 @@
-// Applying text edits and diffing texts line by line. Files shown by the command-line
-// host are small, so the diff is the plain longest-common-subsequence table.
+// Diffing texts line by line. Files shown by the command-line host are small, so the
+// diff is the plain longest-common-subsequence table.
 #include "text_edits.h"
 
 #include <algorithm>
@@ -9,27 +9,6 @@ namespace cli {
 namespace {
 
 constexpr std::size_t kContext = 3;
-
-// The byte offset of a protocol position: a line, then UTF-16 units into it.
-std::size_t Offset(const std::string& text, const LSP::Position& position) {
-  std::size_t at = 0;
-  for (int line = 0; line < position.line && at < text.size(); ++line) {
-    std::size_t end = text.find('\n', at);
-    at = end == std::string::npos ? text.size() : end + 1;
-  }
-  for (int units = 0; units < position.character && at < text.size() && text[at] != '\n';) {
-    unsigned char lead = static_cast<unsigned char>(text[at]);
-    std::size_t length = lead < 0x80 ? 1 : lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
-    units += length == 4 ? 2 : 1;  // characters beyond the basic plane take two units
-    at = std::min(text.size(), at + length);
-  }
-  return at;
-}
-
-bool Before(const LSP::TextEdit& a, const LSP::TextEdit& b) {
-  return a.range.start.line != b.range.start.line ? a.range.start.line < b.range.start.line
-                                                  : a.range.start.character < b.range.start.character;
-}
 
 enum class Op { Keep, Remove, Add };
 
@@ -84,18 +63,6 @@ std::vector<std::string> SplitLines(const std::string& text) {
   std::istringstream in(text);
   for (std::string line; std::getline(in, line);) lines.push_back(line);
   return lines;
-}
-
-std::string ApplyEdits(const std::string& text, std::vector<LSP::TextEdit> edits) {
-  // From the end backwards, so that earlier offsets stay valid.
-  std::stable_sort(edits.begin(), edits.end(), Before);
-  std::string result = text;
-  for (auto edit = edits.rbegin(); edit != edits.rend(); ++edit) {
-    std::size_t start = Offset(text, edit->range.start);
-    std::size_t end = std::max(start, Offset(text, edit->range.end));
-    result.replace(start, end - start, edit->newText);
-  }
-  return result;
 }
 
 std::string UnifiedDiff(const std::string& name, const std::string& before, const std::string& after) {

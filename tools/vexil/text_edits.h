@@ -1,16 +1,11 @@
-// Showing proposed edits as people read them: the edits applied to a file's text, and a
-// unified diff between the text before and after.
+// Showing proposed edits as people read them: a unified diff between a file's text
+// before and after the edits.
 #pragma once
 
 #include <string>
 #include <vector>
 
-#include "vexil/protocol/structures.h"
-
 namespace cli {
-
-// `text` with every edit applied; positions count UTF-16 units, as the protocol does.
-std::string ApplyEdits(const std::string& text, std::vector<LSP::TextEdit> edits);
 
 // A unified diff of two texts with three lines of context, under "--- name" and
 // "+++ name"; empty when the texts are equal.

@@ -2,6 +2,7 @@
 // client without dynamic registration, plain-text documentation only, written in a fixed order.
 #pragma once
 
+#include <string>
 #include <vector>
 
 #include "vexil/protocol/message.h"
@@ -287,6 +288,11 @@ class VEXIL_API ClientCapabilities : public Params {
 
   WorkspaceClientCapabilities workspace;
   TextDocumentClientCapabilities textDocument;
+  // Opt-in capabilities (e.g. FeatureClientCapabilities written as text), each a JSON
+  // object merged over the tree in turn: a member the tree has keeps its place (objects
+  // merge member by member, anything else is replaced), a new member is appended. Text
+  // that is not a JSON object is ignored. With none, the tree is written as always.
+  std::vector<std::string> additions;
 };
 
 }  // namespace LSP

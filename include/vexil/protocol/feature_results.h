@@ -66,7 +66,9 @@ class VEXIL_API CompletionItemLabelDetails : public JsonObject {
   std::string description;
 };
 
-// Additional edits, commit characters and commands are not kept.
+// Additional edits, commit characters and commands are not read, but `rawJson` keeps the
+// item as the server sent it, so that "completionItem/resolve" can send it back whole. It
+// is filled by the list that holds the item and by the resolved item.
 class VEXIL_API CompletionItem : public JsonObject {
  public:
   const char* Name() const override { return "completionItem"; }
@@ -85,6 +87,7 @@ class VEXIL_API CompletionItem : public JsonObject {
   std::string insertText;
   int insertTextFormat = -1;
   TextEdit textEdit;
+  std::string rawJson;  // "" for an item the host built
 };
 
 // A completion reply: a list object, a bare array of items, or null.
@@ -96,6 +99,9 @@ class VEXIL_API CompletionList : public Result {
 
   bool isIncomplete = false;
   std::vector<CompletionItem> items;
+  // Whether each item keeps its JSON text (`rawJson`), which only a server that resolves
+  // items needs: keeping it makes reading a large list half as fast again.
+  bool keepItemJson = true;
 };
 
 // A result that arrives as a JSON array.

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "vexil/protocol/message.h"
+#include "vexil/protocol/semantic_tokens.h"
 
 namespace LSP {
 
@@ -123,6 +123,14 @@ class VEXIL_API ServerCapabilities : public Params {
   ExecuteCommandOptions executeCommandProvider;
   // Whether the server answers "textDocument/diagnostic" (pulled diagnostics).
   bool diagnosticProvider = false;
+  // The legend that names the numbers of semantic tokens, and which requests take them.
+  SemanticTokensOptions semanticTokensProvider;
+  bool foldingRangeProvider = false;
+  bool selectionRangeProvider = false;
+  bool callHierarchyProvider = false;
+  bool inlayHintProvider = false;
+  // "renameProvider": {"prepareProvider": true}: the server answers "textDocument/prepareRename".
+  bool prepareRenameProvider = false;
 };
 
 }  // namespace LSP

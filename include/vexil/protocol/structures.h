@@ -156,7 +156,9 @@ class VEXIL_API SymbolInformation : public JsonObject {
 
 // A server's error, warning or hint about a range of a document. The protocol allows a
 // number or a string as "code": `codeText` holds either as text, `code` only a number.
-// Tags and related information are not kept. Writing leaves out severity and codeText.
+// Tags and related information are not read, but `rawJson` keeps the diagnostic as the
+// server sent it, to be given back in a code action's context. Writing leaves out
+// severity, codeText and rawJson.
 class VEXIL_API Diagnostic : public Params {
  public:
   void Read(const xObject& value) override;
@@ -169,6 +171,7 @@ class VEXIL_API Diagnostic : public Params {
   std::string message;
   int severity = -1;  // 1 error, 2 warning, 3 information, 4 hint
   std::string codeText;
+  std::string rawJson;  // "" for a diagnostic the host built
 };
 
 class VEXIL_API MarkedString : public JsonObject {

@@ -1,0 +1,24 @@
+// JSON kept as text: what a server sent, stored to be sent back unchanged (completion items,
+// call hierarchy items, diagnostics, command arguments), and free-form values from the host.
+#pragma once
+
+#include <string>
+
+#include "vexil/json/json.h"
+
+namespace LSP {
+
+// The value as compact JSON text; "" for a null or missing value.
+std::string RawJsonText(const xObject& value);
+
+// Writes `json` as the member `name`; nothing when `json` is empty. Text that is not JSON
+// throws "Invalid JSON for <name>: <parser's text>".
+void WriteRawJson(xWriter& writer, const char* name, const std::string& json);
+
+// Writes `json`, an object's text, as an element of the array being written.
+void WriteRawElement(xWriter& writer, const std::string& json);
+
+// Writes every member of the object `json` into the object being written.
+void WriteRawMembers(xWriter& writer, const std::string& json);
+
+}  // namespace LSP

@@ -1,0 +1,33 @@
+// Helpers of the text helper tests: edits, document edits of a file, and a file's bytes.
+#pragma once
+
+#include <fstream>
+#include <string>
+#include <vector>
+
+#include "vexil/client/uri.h"
+#include "vexil/client/workspace_edits.h"
+
+namespace vexil_test {
+
+inline LSP::TextEdit Edit(int line, int from, int endLine, int to, const std::string& text) {
+  LSP::TextEdit edit;
+  edit.range = LSP::Range(LSP::Position(line, from), LSP::Position(endLine, to));
+  edit.newText = text;
+  return edit;
+}
+
+// The edits of the file `path`, or of `path` itself when it is already a URI.
+inline LSP::TextDocumentEdit DocumentEdit(const std::string& path, std::vector<LSP::TextEdit> edits) {
+  LSP::TextDocumentEdit document;
+  document.textDocument.uri = path.find("://") != std::string::npos ? path : FileToUri(path.c_str());
+  document.edits = std::move(edits);
+  return document;
+}
+
+inline std::string Content(const std::string& path) {
+  std::ifstream file(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(file), {});
+}
+
+}  // namespace vexil_test
