@@ -19,6 +19,9 @@ namespace {
 constexpr int kDefaultTimeoutMs = 200;
 // A server still running this long after its launch counts as started.
 constexpr long kStartupGraceMs = 150;
+// How long an ended server's error reader may take to read the rest of its pipe; more
+// only when a process the server started holds the pipe open.
+constexpr std::chrono::milliseconds kLastWordsWait{500};
 
 }  // namespace
 
@@ -130,6 +133,7 @@ bool xServer::Launch() {
 }
 
 void xServer::ReportFailedStart(const std::string& reason, bool hint) {
+  AwaitLastWords();
   if (tracer_.Messages()) {
     TraceEarlyErrorLines();
     TraceStrayOutput();
@@ -145,6 +149,8 @@ void xServer::ReportFailedStart(const std::string& reason, bool hint) {
       "correct.\n");
   if (hint) tracer_.Error("%s", kTraceLevelHint);
 }
+
+void xServer::AwaitLastWords() { errThread_.TryJoin(kLastWordsWait); }
 
 void xServer::TraceLaunchDetails() {
   if (!tracer_.Verbose()) return;
