@@ -5,6 +5,8 @@
 #include <algorithm>
 #include <sstream>
 
+#include "columns.h"
+
 namespace cli {
 namespace {
 
@@ -17,13 +19,8 @@ std::size_t Offset(const std::string& text, const LSP::Position& position) {
     std::size_t end = text.find('\n', at);
     at = end == std::string::npos ? text.size() : end + 1;
   }
-  for (int units = 0; units < position.character && at < text.size() && text[at] != '\n';) {
-    unsigned char lead = static_cast<unsigned char>(text[at]);
-    std::size_t length = lead < 0x80 ? 1 : lead < 0xE0 ? 2 : lead < 0xF0 ? 3 : 4;
-    units += length == 4 ? 2 : 1;  // characters beyond the basic plane take two units
-    at = std::min(text.size(), at + length);
-  }
-  return at;
+  std::size_t end = std::min(text.find('\n', at), text.size());
+  return at + std::min(BytesOf(text.substr(at, end - at), position.character), end - at);
 }
 
 bool Before(const LSP::TextEdit& a, const LSP::TextEdit& b) {
