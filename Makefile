@@ -14,7 +14,7 @@ WINE_ENV         = WINEPREFIX=$(abspath $(WINDOWS_BUILD))/wineprefix WINEARCH=wi
 FUZZ_BUILD   ?= build-fuzz
 FUZZ_SECONDS ?= 60
 
-.PHONY: all deps configure build test demo bench asan tsan fuzz clean windows-deps windows test-windows
+.PHONY: all deps configure build test demo package bench asan tsan fuzz clean windows-deps windows test-windows
 
 all: build
 
@@ -33,6 +33,10 @@ test: build
 # clangd and pylsp over the example projects, and a watcher over a temporary directory.
 demo: build
 	$(BUILD)/tools/vexil/vexil demo
+
+# Debian packages in $(BUILD)/packages: libvexil0, libvexil-dev and vexil.
+package: build
+	cd $(BUILD) && cpack
 
 # The memory check runs first, in a process of its own, so that no other benchmark's freed
 # memory hides its growth. The other repetitions are interleaved at random, so a load that
