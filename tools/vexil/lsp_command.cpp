@@ -8,6 +8,7 @@
 #include "lsp_options.h"
 #include "render.h"
 #include "trace_sink.h"
+#include "vexil/client/uri.h"
 
 namespace cli {
 namespace {
@@ -60,6 +61,9 @@ std::string LspHelp() {
 int RunLsp(const Arguments& arguments) {
   LspOptions options = ParseLspOptions(arguments);
   ShowTrace(options.session.trace);
+  if (FileToUri(options.session.root.c_str()).empty()) {
+    return Fail(options, "start", options.session.root + ": the root cannot be written as a file URI");
+  }
   for (const Action& action : options.actions) {
     if (action.file.empty()) continue;
     try {
