@@ -75,6 +75,7 @@ int RunLsp(const Arguments& arguments) {
   Session session(options.session);
   std::string why;
   if (!session.Start(why)) {
+    if (Interrupted()) return 128 + Interrupted();
     if (options.session.trace != LSP::TraceLevel::Verbose) why += kDetails;
     return Fail(options, "start", why);
   }
@@ -94,10 +95,9 @@ int RunLsp(const Arguments& arguments) {
     }
   }
   if (Interrupted()) return 128 + Interrupted();
-  if (!session.Stop()) {
-    std::cerr << "vexil: " << session.Program() << " did not end after exit\n";
-    status = 1;
-  }
+  // The library waits about a second for the server to end; the answers are in, and a
+  // slower server is ended rather than left running.
+  if (!session.Stop()) EndChildren();
   return status;
 }
 

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <chrono>
+#include <cstdio>
 #include <filesystem>
 #include <fstream>
 #include <sstream>
@@ -45,6 +46,15 @@ xServerStart StartRecord(const SessionOptions& options) {
   for (std::size_t i = 0; i < options.arguments.size() && i < 7; ++i) *slots[i] = options.arguments[i];
   start.name = options.name;
   return start;
+}
+
+// The library's line for a reply that did not come in time.
+const char kTimedOut[] = "Reply: Timed out";
+
+std::string Seconds(int milliseconds) {
+  char text[32];
+  std::snprintf(text, sizeof text, "%g s", milliseconds / 1000.0);
+  return text;
 }
 
 // How the server ended, once SIGCHLD has told; "" while it is not known.
@@ -126,9 +136,8 @@ bool Session::Start(std::string& why) {
     why = Program() + " exited with " + LastExit() + (said.empty() ? "" : ": " + said);
   } else if (server_->HaveErrors()) {
     why = Program() + " did not start: " + server_->ErrorMessage();
-  } else if (detail.rfind("Reply: Timed out", 0) == 0) {
-    why = Program() + " did not answer initialize within " +
-          std::to_string(std::max(options_.timeout, kInitializeWaitMs) / 1000) + " s";
+  } else if (detail.find(" did not answer within ") != std::string::npos) {
+    why = Program() + " did not answer initialize within " + Seconds(std::max(options_.timeout, kInitializeWaitMs));
   } else {
     std::string said = ServerSaid();
     why = Program() + " did not start: " + (said.empty() ? (detail.empty() ? TraceError(errorMark_) : detail) : said);
@@ -231,6 +240,9 @@ bool Session::Failed(const std::string& method, std::string& why) {
   }
   if (TraceErrors() == errorMark_) return false;
   why = TraceError(errorMark_);
+  if (why.rfind(kTimedOut, 0) == 0) {
+    why = Program() + " did not answer within " + Seconds(options_.timeout) + "; a longer --timeout may help";
+  }
   return true;
 }
 
