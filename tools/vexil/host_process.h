@@ -15,6 +15,9 @@ void WatchProcess();
 int Interrupted();
 // Blocks until an interrupt arrives; returns its signal number.
 int WaitForInterrupt();
+// Called by the platform's side on the interrupt `signal`, on a thread of its own: tells
+// every waiter, ends the children, and ends the process unless the command does first.
+[[noreturn]] void EndAfterInterrupt(int signal);
 // Ends every process started below ours (servers, commands and what they started).
 void EndChildren();
 // How the most recent child to end did ("status 1", "signal 9"); "" when none has ended

@@ -4,9 +4,6 @@
 #include <signal.h>
 #include <unistd.h>
 
-#include <chrono>
-#include <condition_variable>
-#include <cstdio>
 #include <mutex>
 #include <string>
 #include <thread>
@@ -16,12 +13,7 @@
 namespace cli {
 namespace {
 
-// How long a command may take to wind up after an interrupt before the process ends.
-constexpr std::chrono::seconds kWindUp{3};
-
-std::mutex stateMutex;
-std::condition_variable interruptArrived;
-int interruptSignal = 0;
+std::mutex exitMutex;
 std::string lastExit;
 
 sigset_t Watched() {
@@ -35,21 +27,9 @@ sigset_t Watched() {
 
 // SIGCHLD says how a child ended even when the library reaps it first.
 void NoteExit(const siginfo_t& info) {
-  std::lock_guard<std::mutex> lock(stateMutex);
+  std::lock_guard<std::mutex> lock(exitMutex);
   if (info.si_code == CLD_EXITED) lastExit = "status " + std::to_string(info.si_status);
   else if (info.si_code == CLD_KILLED || info.si_code == CLD_DUMPED) lastExit = "signal " + std::to_string(info.si_status);
-}
-
-[[noreturn]] void OnInterrupt(int signal) {
-  {
-    std::lock_guard<std::mutex> lock(stateMutex);
-    interruptSignal = signal;
-  }
-  interruptArrived.notify_all();
-  EndChildren();
-  std::this_thread::sleep_for(kWindUp);
-  std::fflush(stdout);
-  _exit(128 + signal);
 }
 
 void Watch() {
@@ -58,7 +38,7 @@ void Watch() {
     siginfo_t info{};
     if (sigwaitinfo(&set, &info) < 0) continue;
     if (info.si_signo == SIGCHLD) NoteExit(info);
-    else OnInterrupt(info.si_signo);
+    else EndAfterInterrupt(info.si_signo);
   }
 }
 
@@ -70,19 +50,8 @@ void WatchProcess() {
   std::thread(Watch).detach();
 }
 
-int Interrupted() {
-  std::lock_guard<std::mutex> lock(stateMutex);
-  return interruptSignal;
-}
-
-int WaitForInterrupt() {
-  std::unique_lock<std::mutex> lock(stateMutex);
-  interruptArrived.wait(lock, [] { return interruptSignal != 0; });
-  return interruptSignal;
-}
-
 std::string LastExit() {
-  std::lock_guard<std::mutex> lock(stateMutex);
+  std::lock_guard<std::mutex> lock(exitMutex);
   return lastExit;
 }
 

@@ -4,11 +4,6 @@
 #include <tlhelp32.h>
 #include <io.h>
 
-#include <chrono>
-#include <condition_variable>
-#include <cstdio>
-#include <cstdlib>
-#include <mutex>
 #include <thread>
 #include <vector>
 
@@ -18,11 +13,6 @@ namespace cli {
 namespace {
 
 constexpr int kSigInt = 2;
-constexpr std::chrono::seconds kWindUp{3};
-
-std::mutex stateMutex;
-std::condition_variable interruptArrived;
-int interruptSignal = 0;
 
 std::vector<DWORD> Descendants() {
   std::vector<PROCESSENTRY32> processes;
@@ -50,34 +40,13 @@ std::vector<DWORD> Descendants() {
 
 BOOL WINAPI OnControl(DWORD kind) {
   if (kind != CTRL_C_EVENT && kind != CTRL_BREAK_EVENT) return FALSE;
-  {
-    std::lock_guard<std::mutex> lock(stateMutex);
-    interruptSignal = kSigInt;
-  }
-  interruptArrived.notify_all();
-  std::thread([] {
-    EndChildren();
-    std::this_thread::sleep_for(kWindUp);
-    std::fflush(stdout);
-    std::_Exit(128 + kSigInt);
-  }).detach();
+  std::thread([] { EndAfterInterrupt(kSigInt); }).detach();
   return TRUE;
 }
 
 }  // namespace
 
 void WatchProcess() { SetConsoleCtrlHandler(OnControl, TRUE); }
-
-int Interrupted() {
-  std::lock_guard<std::mutex> lock(stateMutex);
-  return interruptSignal;
-}
-
-int WaitForInterrupt() {
-  std::unique_lock<std::mutex> lock(stateMutex);
-  interruptArrived.wait(lock, [] { return interruptSignal != 0; });
-  return interruptSignal;
-}
 
 void EndChildren() {
   for (DWORD pid : Descendants()) {

@@ -131,7 +131,8 @@ bool Session::Start(std::string& why) {
     why = Program() + " does not speak the language server protocol";
   } else if (started && !Failed("initialize", detail)) {
     return true;
-  } else if (!server_->IsRunning() && !AwaitExit().empty() && !server_->HaveErrors()) {
+  } else if (!server_->HaveErrors() && !AwaitExit().empty()) {
+    // A server whose output has ended may still be on its way out: SIGCHLD tells.
     std::string said = ServerSaid();
     why = Program() + " exited with " + LastExit() + (said.empty() ? "" : ": " + said);
   } else if (server_->HaveErrors()) {
