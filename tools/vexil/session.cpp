@@ -127,23 +127,24 @@ bool Session::Start(std::string& why) {
     started = server_->Start(init) && server_->IsRunning();
   }
   std::string detail;
-  if (NotAServer()) {
-    why = Program() + " does not speak the language server protocol";
-  } else if (started && !Failed("initialize", detail)) {
-    return true;
-  } else if (!server_->HaveErrors() && !AwaitExit().empty()) {
-    // A server whose output has ended may still be on its way out: SIGCHLD tells.
-    std::string said = ServerSaid();
-    why = Program() + " exited with " + LastExit() + (said.empty() ? "" : ": " + said);
-  } else if (server_->HaveErrors()) {
-    why = Program() + " did not start: " + server_->ErrorMessage();
-  } else if (detail.find(" did not answer within ") != std::string::npos) {
-    why = Program() + " did not answer initialize within " + Seconds(std::max(options_.timeout, kInitializeWaitMs));
-  } else {
-    std::string said = ServerSaid();
-    why = Program() + " did not start: " + (said.empty() ? (detail.empty() ? TraceError(errorMark_) : detail) : said);
-  }
+  if (!NotAServer() && started && !Failed("initialize", detail)) return true;
+  why = StartFailure(detail);
   return false;
+}
+
+std::string Session::StartFailure(const std::string& detail) {
+  if (NotAServer()) return Program() + " does not speak the language server protocol";
+  // A server whose output has ended may still be on its way out: SIGCHLD tells.
+  const bool exited = !server_->HaveErrors() && !AwaitExit().empty();
+  const std::string said = ServerSaid();
+  if (exited) {
+    return Program() + " exited with " + LastExit() + (said.empty() ? "" : ": " + said);
+  }
+  if (server_->HaveErrors()) return Program() + " did not start: " + server_->ErrorMessage();
+  if (detail.find(" did not answer within ") != std::string::npos) {
+    return Program() + " did not answer initialize within " + Seconds(std::max(options_.timeout, kInitializeWaitMs));
+  }
+  return Program() + " did not start: " + (!said.empty() ? said : !detail.empty() ? detail : TraceError(errorMark_));
 }
 
 bool Session::Stop() {

@@ -63,6 +63,8 @@ class Session {
     int diagnosticsMark = 0;
     int sendsMark = 0;
   };
+  // Why the server did not start, in one line; `detail` is the failure Failed() found.
+  std::string StartFailure(const std::string& detail);
   void Sent(OpenDocument& document);
   bool Published(const std::string& uri);
 
