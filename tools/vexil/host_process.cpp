@@ -15,18 +15,27 @@ namespace {
 // How long a command may take to wind up after an interrupt before the process ends.
 constexpr std::chrono::seconds kWindUp{3};
 
-std::mutex interruptMutex;
-std::condition_variable interruptArrived;
-int interruptSignal = 0;
+struct InterruptState {
+  std::mutex mutex;
+  std::condition_variable arrived;
+  int signal = 0;
+};
+
+// Never destroyed: the thread that ends the process may still hold it while main returns.
+InterruptState& State() {
+  static InterruptState* state = new InterruptState;
+  return *state;
+}
 
 }  // namespace
 
 void EndAfterInterrupt(int signal) {
+  InterruptState& state = State();
   {
-    std::lock_guard<std::mutex> lock(interruptMutex);
-    interruptSignal = signal;
+    std::lock_guard<std::mutex> lock(state.mutex);
+    state.signal = signal;
   }
-  interruptArrived.notify_all();
+  state.arrived.notify_all();
   EndChildren();
   std::this_thread::sleep_for(kWindUp);
   std::fflush(stdout);
@@ -34,14 +43,15 @@ void EndAfterInterrupt(int signal) {
 }
 
 int Interrupted() {
-  std::lock_guard<std::mutex> lock(interruptMutex);
-  return interruptSignal;
+  std::lock_guard<std::mutex> lock(State().mutex);
+  return State().signal;
 }
 
 int WaitForInterrupt() {
-  std::unique_lock<std::mutex> lock(interruptMutex);
-  interruptArrived.wait(lock, [] { return interruptSignal != 0; });
-  return interruptSignal;
+  InterruptState& state = State();
+  std::unique_lock<std::mutex> lock(state.mutex);
+  state.arrived.wait(lock, [&state] { return state.signal != 0; });
+  return state.signal;
 }
 
 }  // namespace cli

@@ -13,8 +13,16 @@
 namespace cli {
 namespace {
 
-std::mutex exitMutex;
-std::string lastExit;
+struct ExitNews {
+  std::mutex mutex;
+  std::string last;
+};
+
+// Never destroyed: the signal thread may still note an exit while main returns.
+ExitNews& News() {
+  static ExitNews* news = new ExitNews;
+  return *news;
+}
 
 sigset_t Watched() {
   sigset_t set;
@@ -27,9 +35,10 @@ sigset_t Watched() {
 
 // SIGCHLD says how a child ended even when the library reaps it first.
 void NoteExit(const siginfo_t& info) {
-  std::lock_guard<std::mutex> lock(exitMutex);
-  if (info.si_code == CLD_EXITED) lastExit = "status " + std::to_string(info.si_status);
-  else if (info.si_code == CLD_KILLED || info.si_code == CLD_DUMPED) lastExit = "signal " + std::to_string(info.si_status);
+  ExitNews& news = News();
+  std::lock_guard<std::mutex> lock(news.mutex);
+  if (info.si_code == CLD_EXITED) news.last = "status " + std::to_string(info.si_status);
+  else if (info.si_code == CLD_KILLED || info.si_code == CLD_DUMPED) news.last = "signal " + std::to_string(info.si_status);
 }
 
 void Watch() {
@@ -51,8 +60,8 @@ void WatchProcess() {
 }
 
 std::string LastExit() {
-  std::lock_guard<std::mutex> lock(exitMutex);
-  return lastExit;
+  std::lock_guard<std::mutex> lock(News().mutex);
+  return News().last;
 }
 
 bool ErrorsToTerminal() { return isatty(STDERR_FILENO) == 1; }
