@@ -62,6 +62,10 @@ LSP::TraceLevel TraceLevelOf(const std::string& text) {
   throw UsageError("--trace takes off, messages or verbose, not '" + text + "'");
 }
 
+const ActionInfo* ActionAt(const OptionReader& reader) {
+  return reader.Done() ? nullptr : ActionOfOption(reader.Current().substr(0, reader.Current().find('=')));
+}
+
 // Reads the options up to "--".
 void ReadOptions(OptionReader& reader, LspOptions& options) {
   while (!reader.Done() && reader.Current() != "--") {
@@ -70,14 +74,11 @@ void ReadOptions(OptionReader& reader, LspOptions& options) {
     else if (reader.Is("--root")) options.session.root = reader.Value();
     else if (reader.Is("--language")) options.session.language = reader.Value();
     else if (reader.Is("--json")) reader.Flag(), options.json = true;
+    else if (ActionAt(reader)) throw UsageError(reader.Current() + " is an action: it follows '-- SERVER [ARG]...'");
     else reader.Unknown();
   }
   if (reader.Done()) throw UsageError("the server command must follow '--'");
   reader.Take();
-}
-
-const ActionInfo* ActionAt(const OptionReader& reader) {
-  return reader.Done() ? nullptr : ActionOfOption(reader.Current().substr(0, reader.Current().find('=')));
 }
 
 void CheckLanguages(const LspOptions& options) {
