@@ -220,23 +220,29 @@ TEST_F(ServerTraffic, WriteAndReadAfterTheServerDied) {
   EXPECT_EQ(TraceLog::Texts(), (Texts{"Error: A server read was requested but the server is not running.\n\n", kHint}));
 }
 
-TEST_F(ServerTraffic, AServerThatDiesWhileAwaitedEndsTheWaitAtOnce) {
-  auto server = Started(30000);
-  TextResult result;
-  int id = server->Id();
-  auto asked = std::chrono::steady_clock::now();
+// Kills the server once the read has passed over the notification `method` makes it send
+// first: the read is then under way, and its wait has to end with the server.
+void AskAndKillWhileAwaited(vexil::xServer& server, const char* method, const std::string& params) {
+  const int id = server.Id();
   std::thread killer([id] {
-    std::this_thread::sleep_for(300ms);
+    WaitFor([] { return TraceLog::Contains("Ignoring Reply: "); }, 30s);
     vexil_test::KillProcess(id);
   });
-  Ask(*server, "fake/silent", "", result);
+  TextResult result;
+  Ask(server, method, params, result);
   killer.join();
+}
+
+TEST_F(ServerTraffic, AServerThatDiesWhileAwaitedEndsTheWaitAtOnce) {
+  auto server = Started(30000);
+  auto asked = std::chrono::steady_clock::now();
+  AskAndKillWhileAwaited(*server, "fake/silent", R"({"notifications":1})");
   EXPECT_LT(std::chrono::steady_clock::now() - asked, 3s);
   EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), 1);
 
   // Killed in the middle of a frame: what it had sent of the header is the stray output.
   auto crashing = Started(30000);
-  Ask(*crashing, "fake/crash", R"({"delay":500})", result);
+  AskAndKillWhileAwaited(*crashing, "fake/stall", "");
   EXPECT_EQ(TraceLog::Count("Output: Content-Length: \n"), 1);
 }
 

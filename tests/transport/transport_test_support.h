@@ -7,6 +7,7 @@
 
 #include <chrono>
 #include <functional>
+#include <memory>
 #include <mutex>
 #include <string>
 #include <thread>
@@ -156,6 +157,18 @@ inline bool ErrorLineArrives(vexil::xServer& server, const std::string& line) {
     Ask(server, "fake/echo", "", result);
     return TraceLog::Count("Reply: " + line + "\n") == 1;
   });
+}
+
+// A server of a program that ends at once, whose start failed; null when ten did not. The
+// start looks 150 ms after the launch, which a busy machine may not give even such a
+// program: it is launched again, with a clear trace, until its start saw it end.
+inline std::unique_ptr<vexil::xServer> FailedStart(const xServerStart& start) {
+  for (int attempt = 0; attempt < 10; ++attempt) {
+    TraceLog::Clear();
+    auto server = std::make_unique<vexil::xServer>(start);
+    if (!server->Start()) return server;
+  }
+  return nullptr;
 }
 
 // Each test of a server's start reads only its own trace lines.

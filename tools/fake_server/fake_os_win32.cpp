@@ -37,11 +37,6 @@ void SleepUntilKilled() {
   for (;;) Sleep(INFINITE);
 }
 
-void Crash() {
-  TerminateProcess(GetCurrentProcess(), 9);
-  for (;;) Sleep(INFINITE);
-}
-
 void SpawnSelf(const std::string& argument) {
   char path[MAX_PATH];
   if (!GetModuleFileNameA(nullptr, path, MAX_PATH)) return;
