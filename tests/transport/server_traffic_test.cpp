@@ -320,13 +320,18 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
        {}, Next::Works},
       {"failed to start: Start launches it again", {"fail-once=" + scratch / "failed"},
        [](vexil::xServer& server) {
-         EXPECT_FALSE(server.IsRunning());
+         // A slow machine may see the first launch end only after the start's grace time.
+         EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
          EXPECT_TRUE(server.Start());
        },
        {}, Next::Works},
   };
   for (const Misbehaviour& row : rows) {
     SCOPED_TRACE(row.name);
+    auto has = [&](const char* directive) {
+      return std::find(row.directives.begin(), row.directives.end(), directive) != row.directives.end();
+    };
+    if (has("close-stdin") && !kClosedInputFailsWrites) continue;
     vexil::xServer server(FakeStart(row.directives, row.timeout, LSP::TraceLevel::Messages));
     server.Start();
     TraceLog::Clear();
@@ -347,8 +352,7 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
       EXPECT_STREQ(server.ErrorMessage(), "A server read was requested but the server is not running.");
     }
     EXPECT_FALSE(TraceLog::Contains("Write Error"));  // a failed answer is no reader error
-    const std::vector<std::string>& directives = row.directives;
-    if (std::find(directives.begin(), directives.end(), "hang") != directives.end()) vexil_test::KillProcess(server.Id());
+    if (has("hang")) vexil_test::KillProcess(server.Id());
   }
 }
 

@@ -74,6 +74,15 @@ inline const std::string kFailedStart =
 inline const std::string kCheckDetails =
     "Make sure the executable and directory details are correct and if required the system PATH is also correct.\n";
 
+// Whether a write fails once the server has closed its input. Wine gives every child
+// started without a console a console host that holds its standard input too, so there
+// a closed input only shows as a pipe that fills up.
+#ifdef _WIN32
+constexpr bool kClosedInputFailsWrites = false;
+#else
+constexpr bool kClosedInputFailsWrites = true;
+#endif
+
 // A start record for the fake server with up to seven directives.
 inline xServerStart FakeStart(std::vector<std::string> directives = {}, int timeout = 2000,
                               LSP::TraceLevel level = LSP::TraceLevel::Verbose) {
