@@ -67,6 +67,9 @@ xServer::~xServer() {
   tracer_.Verbose("Waiting for threads to end....\n");
   if (streams_) streams_->JoinReaders();
   deferred_.Deliver();
+  // A server that outlives its connection (one that stopped reading) is collected once it
+  // ends, never ended here.
+  process_.Abandon();
   tracer_.Verbose("Language server close complete.\n\n");
 }
 
