@@ -107,7 +107,7 @@ TEST(Hover, ContentsMayBeAStringAnObjectOrAnArray) {
   ReadResult(R"({"contents":["first",{"language":"c","value":"int x"},"second"]})", marked);
   EXPECT_EQ(marked.contents.value, "first");
   ASSERT_EQ(marked.contents.items.size(), 1u);
-  EXPECT_EQ(marked.contents.items[0].language, "c");
+  EXPECT_EQ(marked.contents.items[0].language + ":" + marked.contents.items[0].value, "c:int x");
 }
 
 TEST(SignatureHelp, ReadsSignaturesAndRejectsOffsetLabels) {
