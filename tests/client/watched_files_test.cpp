@@ -83,9 +83,12 @@ class Heard {
   std::vector<std::string> errors_;
 };
 
+// The folder a host gives: absolute, with its drive on Windows (unlike the temporary
+// directory's path under wine).
+std::string Folder(const TempDir& root) { return std::filesystem::absolute(root.Path()).make_preferred().string(); }
 // `relative` below `root`, in this platform's separators, as the notifier names it.
 std::string At(const TempDir& root, const std::string& relative) {
-  return (root.Path() / std::filesystem::path(relative)).make_preferred().string();
+  return (std::filesystem::path(Folder(root)) / relative).make_preferred().string();
 }
 std::string Uri(const std::string& path) { return FileToUri(path.c_str()); }
 
@@ -96,7 +99,7 @@ TEST(WatchedFilesNotifier, SendsBatchesOfWhatTheServerRegistered) {
   Touch(At(root, "gone.txt"));
   const std::string missing = At(root, "missing");
   Heard heard;
-  vexil::WatchedFilesNotifier notifier({root.Path().string(), missing}, heard.Callbacks());
+  vexil::WatchedFilesNotifier notifier({Folder(root), missing}, heard.Callbacks());
   notifier.ServerInitialized();
 
   // With nothing registered, every change; a rename is a deletion and a creation.
@@ -154,12 +157,12 @@ TEST(WatchedFilesNotifier, SendsBatchesOfWhatTheServerRegistered) {
 TEST(WatchedFilesNotifier, SendsNothingBeforeInitializedAndMayBeDestroyedFromItsCallback) {
   TempDir root;
   Heard early;
-  vexil::WatchedFilesNotifier waiting({root.Path().string()}, early.Callbacks());
+  vexil::WatchedFilesNotifier waiting({Folder(root)}, early.Callbacks());
   Shared shared;
   std::unique_ptr<vexil::WatchedFilesNotifier> notifier;
   bool destroyed = false;
   notifier = std::make_unique<vexil::WatchedFilesNotifier>(
-      std::vector<std::string>{root.Path().string()},
+      std::vector<std::string>{Folder(root)},
       vexil::WatchedFilesNotifier::Callbacks{[&](const std::string&) {
                                                notifier.reset();
                                                shared.Update([&] { destroyed = true; });
