@@ -158,19 +158,21 @@ TEST(WatchedFilesNotifier, SendsNothingBeforeInitializedAndMayBeDestroyedFromIts
   TempDir root;
   Heard early;
   vexil::WatchedFilesNotifier waiting({Folder(root)}, early.Callbacks());
-  Shared shared;
-  std::unique_ptr<vexil::WatchedFilesNotifier> notifier;
-  bool destroyed = false;
-  notifier = std::make_unique<vexil::WatchedFilesNotifier>(
-      std::vector<std::string>{Folder(root)},
-      vexil::WatchedFilesNotifier::Callbacks{[&](const std::string&) {
-                                               notifier.reset();
-                                               shared.Update([&] { destroyed = true; });
-                                             },
-                                             {}});
-  notifier->ServerInitialized();
+  // Shared with the callback, which finishes on the notifier's thread after the test saw it.
+  struct Self {
+    Shared shared;
+    bool destroyed = false;
+    std::unique_ptr<vexil::WatchedFilesNotifier> notifier;
+  };
+  auto self = std::make_shared<Self>();
+  self->notifier = std::make_unique<vexil::WatchedFilesNotifier>(
+      std::vector<std::string>{Folder(root)}, vexil::WatchedFilesNotifier::Callbacks{[self](const std::string&) {
+        self->notifier.reset();
+        self->shared.Update([&] { self->destroyed = true; });
+      }, {}});
+  self->notifier->ServerInitialized();
   Touch(At(root, "a.txt"));
-  ASSERT_TRUE(shared.WaitUntil([&] { return destroyed; }));
+  ASSERT_TRUE(self->shared.WaitUntil([&] { return self->destroyed; }));
   // Ten times the batch delay: the uninitialized one heard the same change meanwhile.
   EXPECT_FALSE(early.WaitForSend(10 * vexil::WatchedFilesNotifier::kBatchDelay));
 }
