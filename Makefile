@@ -16,7 +16,7 @@ FUZZ_SECONDS ?= 60
 
 STRESS_RUNS ?= 10
 
-.PHONY: all deps configure build test stress demo bench asan tsan fuzz clean windows-deps windows test-windows
+.PHONY: all deps configure build test stress demo package bench asan tsan fuzz clean windows-deps windows test-windows
 
 all: build
 
@@ -40,6 +40,10 @@ stress: build
 # clangd and pylsp over the example projects, and a watcher over a temporary directory.
 demo: build
 	$(BUILD)/tools/vexil/vexil demo
+
+# Debian packages in $(BUILD)/packages: libvexil0, libvexil-dev and vexil.
+package: build
+	cd $(BUILD) && cpack
 
 # The memory check runs first, in a process of its own, so that no other benchmark's freed
 # memory hides its growth. The other repetitions are interleaved at random, so a load that

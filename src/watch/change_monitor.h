@@ -48,9 +48,9 @@ struct WatchOptions {
   // The whole tree below the root, or only the root's own entries.
   bool recursive = true;
   // Also report, as kActionModified, every file whose content at a name is new: written to
-  // (and closed after writing), or put there by a rename or a move into the tree, which is
-  // how editors save atomically. Directories are never reported as modified. A name written
-  // in several steps may be reported once per read that saw a step.
+  // (on Linux once its writer closes it; on Windows as the system reports writes, which may
+  // be more than once per save), or put there by a rename or a move into the tree, which is
+  // how editors save atomically. Directories are never reported as modified.
   bool modifications = false;
 };
 

@@ -17,7 +17,9 @@ namespace {
 
 constexpr std::uint32_t kEntryEvents = IN_CREATE | IN_DELETE | IN_MOVED_FROM | IN_MOVED_TO | IN_DELETE_SELF |
                                        IN_MOVE_SELF | IN_EXCL_UNLINK | IN_ONLYDIR;
-constexpr std::uint32_t kContentEvents = IN_MODIFY | IN_CLOSE_WRITE;
+// A file's new content is complete when its writer closes it. Each write (IN_MODIFY) would
+// report one ordinary save several times, the first of them before the content is all there.
+constexpr std::uint32_t kContentEvents = IN_CLOSE_WRITE;
 constexpr std::uint32_t kSelfEvents = IN_DELETE_SELF | IN_MOVE_SELF | IN_IGNORED | IN_UNMOUNT;
 
 using Event = InotifyTree::Event;
