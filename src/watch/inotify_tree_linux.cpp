@@ -98,6 +98,10 @@ std::size_t HoldFrom(const std::vector<Event>& events, std::size_t carried) {
 
 }  // namespace
 
+std::string CannotWatchDirectory(const std::string& path, int error) {
+  return "Cannot watch directory: " + path + ": " + std::error_code(error, std::generic_category()).message() + "\n";
+}
+
 // Both halves of one move, by cookie.
 struct InotifyTree::MoveHalves {
   const Event* from = nullptr;
@@ -277,8 +281,10 @@ void InotifyTree::AddSubtree(const std::string& path, const Owners& owners, Read
   if (descriptor < 0) {
     // Gone, replaced or renamed before we got to it: its parent's events tell the rest.
     if (errno == ENOENT || errno == ENOTDIR || errno == ELOOP) return;
-    outcome.errors.push_back("Cannot watch directory: " + path + ": " +
-                             std::error_code(errno, std::generic_category()).message() + "\n");
+    if (errno != ENOSPC) return outcome.errors.push_back(CannotWatchDirectory(path, errno));
+    std::vector<std::int64_t> ids;
+    for (const auto& owner : owners) ids.push_back(owner.first);
+    outcome.limited.emplace_back(std::move(ids), path);
     return;
   }
   Adopt(descriptor, identity, owners);
