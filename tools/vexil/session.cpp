@@ -62,7 +62,7 @@ std::string ReadText(const std::string& path) {
 Session::Session(const SessionOptions& options) : options_(options), server_(Vexil_Start(StartRecord(options))) {}
 
 Session::~Session() {
-  if (Vexil_Have(options_.name.c_str()) == server_) Stop();
+  if (!stopTried_ && Vexil_Have(options_.name.c_str()) == server_) Stop();
 }
 
 bool Session::Start() {
@@ -76,6 +76,7 @@ bool Session::Start() {
 }
 
 bool Session::Stop() {
+  stopTried_ = true;
   server_->Shutdown();
   // Each Exit gives the server about a second to end; an interpreter on a busy machine can
   // take longer, so the server counts as stuck only when several of them went by.

@@ -26,7 +26,7 @@ class Session {
   explicit Session(const SessionOptions& options);
   Session(const Session&) = delete;
   Session& operator=(const Session&) = delete;
-  // Stops the server if that has not been done.
+  // Stops the server if that has not been tried.
   ~Session();
 
   // Launches and initializes the server; false when either failed (see Failure).
@@ -56,6 +56,7 @@ class Session {
   xLanguageServer* server_;
   std::map<std::string, int> versions_;  // open documents by URI
   int errorMark_ = 0;
+  bool stopTried_ = false;  // a server that would not end is not waited for twice
 };
 
 // `path` made absolute and normal, as documents are named.
