@@ -110,7 +110,7 @@ Session::Session(const SessionOptions& options) : options_(options), server_(nul
 }
 
 Session::~Session() {
-  if (Vexil_Have(options_.name.c_str()) == server_) Stop();
+  if (!stopTried_ && Vexil_Have(options_.name.c_str()) == server_) Stop();
 }
 
 std::string Session::Program() const { return std::filesystem::path(options_.program).filename().string(); }
@@ -149,6 +149,7 @@ std::string Session::StartFailure(const std::string& detail) {
 }
 
 bool Session::Stop() {
+  stopTried_ = true;
   server_->Shutdown();
   // Each Exit gives the server about a second to end; an interpreter on a busy machine can
   // take longer, so the server counts as stuck only when several of them went by.

@@ -25,7 +25,7 @@ class Session {
   explicit Session(const SessionOptions& options);
   Session(const Session&) = delete;
   Session& operator=(const Session&) = delete;
-  // Stops the server if that has not been done.
+  // Stops the server if that has not been tried.
   ~Session();
 
   // Launches and initializes the server; false with the reason in one line when that failed.
@@ -73,6 +73,7 @@ class Session {
   std::map<std::string, OpenDocument> documents_;  // open documents by URI
   int sends_ = 0;                              // didOpen and didChange so far
   int errorMark_ = 0;
+  bool stopTried_ = false;  // a server that would not end is not waited for twice
 };
 
 // `path` made absolute and normal, as documents are named.
