@@ -1,11 +1,12 @@
 // Everything a host uses, in one include: records, trace types and the trace queue, the
-// connection interface and its exports, the LSP model, the language table, URI functions
-// and the directory watchers.
+// connection interface and its exports, the LSP model, the language table, URI functions,
+// the directory watchers and the watcher tasks. Every public header is listed here.
 #pragma once
 
 #include "vexil/export.h"
 #include "vexil/host/trace.h"
 #include "vexil/host/records.h"
+#include "vexil/host/server_messages.h"
 #include "vexil/host/language_server.h"
 #include "vexil/json/json.h"
 #include "vexil/protocol/message.h"
@@ -29,3 +30,5 @@
 #include "vexil/watch/change_event.h"
 #include "vexil/watch/watcher_ex.h"
 #include "vexil/watch/watcher.h"
+#include "vexil/task/watcher_options.h"
+#include "vexil/task/watcher_task.h"

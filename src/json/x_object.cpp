@@ -9,6 +9,7 @@
 
 #include "json/rapidjson.h"
 #include "json/json_errors.h"
+#include "json/member_values.h"
 
 namespace LSP {
 namespace {
@@ -21,10 +22,6 @@ const JsonValue& NullValue() {
 const char* const kTypeNames[] = {"null", "false", "true", "object", "array ", "string", "number", "Unknown"};
 
 const char* TypeName(const JsonValue& value) { return kTypeNames[static_cast<unsigned>(value.GetType()) & 7u]; }
-
-[[noreturn]] void ThrowTypeMismatch(const char* expected, const JsonValue& found) {
-  ThrowFormatted("Expecting a '%s' JSON object but found '%s' JSON object.", expected, TypeName(found));
-}
 
 // The standard string-to-int conversion, with the texts the protocol layer reports.
 int DecimalToInt(const std::string& text) {
@@ -83,17 +80,18 @@ xObject xObject::Object(const char* name) const {
     const JsonValue* member = Present(name);
     return member ? xObject(*member) : xObject();
   } catch (const std::exception& e) {
-    ThrowFormatted("%s\nFailed to read JSON object: %s", name ? name : "", e.what());
+    ThrowObjectFailure(name, e);
   }
 }
 
 bool xObject::Bool(const char* name) const {
+  const JsonValue* member = nullptr;
   try {
-    const JsonValue* member = Expect(Present(name), "bool", &JsonValue::IsBool);
-    return member && member->GetBool();
+    member = Present(name);
   } catch (const std::exception& e) {
-    ThrowFormatted("%s\nFailed to read JSON bool: %s", name ? name : "", e.what());
+    ThrowBoolFailure(name, e);
   }
+  return BoolMember(member, name);
 }
 
 // One member search serves the presence test and the access.
@@ -105,49 +103,73 @@ const JsonValue* xObject::Present(const char* name) const {
   return &member->value;
 }
 
-double xObject::Double(const char* name) const {
-  const JsonValue* member = Expect(Present(name), "double", &JsonValue::IsDouble);
+double xObject::Double(const char* name) const { return DoubleMember(Present(name)); }
+int xObject::Int(const char* name) const { return IntMember(Present(name)); }
+std::int64_t xObject::Int64(const char* name) const { return Int64Member(Present(name)); }
+unsigned xObject::UInt(const char* name) const { return UIntMember(Present(name)); }
+std::uint64_t xObject::UInt64(const char* name) const { return UInt64Member(Present(name)); }
+std::string xObject::String(const char* name) const { return StringMember(Present(name)); }
+std::vector<int> xObject::Integers(const char* name) const { return IntegersMember(Present(name)); }
+std::vector<std::string> xObject::Strings(const char* name) const { return StringsMember(Present(name)); }
+
+double DoubleMember(const JsonValue* member) {
+  member = Expect(member, "double", &JsonValue::IsDouble);
   return member ? member->GetDouble() : 0.0;
 }
 
-int xObject::Int(const char* name) const {
-  const JsonValue* member = Expect(Present(name), "int", &JsonValue::IsInt);
-  return member ? member->GetInt() : -1;
-}
-
-std::int64_t xObject::Int64(const char* name) const {
-  const JsonValue* member = Expect(Present(name), "int64", &JsonValue::IsInt64);
+std::int64_t Int64Member(const JsonValue* member) {
+  member = Expect(member, "int64", &JsonValue::IsInt64);
   return member ? member->GetInt64() : -1;
 }
 
-unsigned xObject::UInt(const char* name) const {
-  const JsonValue* member = Expect(Present(name), "uint", &JsonValue::IsUint);
+unsigned UIntMember(const JsonValue* member) {
+  member = Expect(member, "uint", &JsonValue::IsUint);
   return member ? member->GetUint() : 0;
 }
 
-std::uint64_t xObject::UInt64(const char* name) const {
-  const JsonValue* member = Expect(Present(name), "uint64", &JsonValue::IsUint64);
+std::uint64_t UInt64Member(const JsonValue* member) {
+  member = Expect(member, "uint64", &JsonValue::IsUint64);
   return member ? member->GetUint64() : 0;
 }
 
-std::string xObject::String(const char* name) const {
-  const JsonValue* member = Expect(Present(name), "string", &JsonValue::IsString);
-  return member ? std::string(member->GetString(), member->GetStringLength()) : std::string();
-}
-
-std::vector<int> xObject::Integers(const char* name) const {
+std::vector<int> IntegersMember(const JsonValue* member) {
   std::vector<int> values;
-  if (const JsonValue* member = Expect(Present(name), "array", &JsonValue::IsArray))
+  if ((member = Expect(member, "array", &JsonValue::IsArray))) {
+    values.reserve(member->Size());
     for (const JsonValue& element : member->GetArray()) values.push_back(element.GetInt());
+  }
   return values;
 }
 
-std::vector<std::string> xObject::Strings(const char* name) const {
+std::vector<std::string> StringsMember(const JsonValue* member) {
   std::vector<std::string> values;
-  if (const JsonValue* member = Expect(Present(name), "array", &JsonValue::IsArray))
+  if ((member = Expect(member, "array", &JsonValue::IsArray))) {
+    values.reserve(member->Size());
     for (const JsonValue& element : member->GetArray())
       values.emplace_back(element.GetString(), element.GetStringLength());
+  }
   return values;
+}
+
+bool BoolMember(const JsonValue* member, const char* name) {
+  try {
+    member = Expect(member, "bool", &JsonValue::IsBool);
+  } catch (const std::exception& e) {
+    ThrowBoolFailure(name, e);
+  }
+  return member && member->GetBool();
+}
+
+void ThrowTypeMismatch(const char* expected, const JsonValue& found) {
+  ThrowFormatted("Expecting a '%s' JSON object but found '%s' JSON object.", expected, TypeName(found));
+}
+
+void ThrowBoolFailure(const char* name, const std::exception& e) {
+  ThrowFormatted("%s\nFailed to read JSON bool: %s", name ? name : "", e.what());
+}
+
+void ThrowObjectFailure(const char* name, const std::exception& e) {
+  ThrowFormatted("%s\nFailed to read JSON object: %s", name ? name : "", e.what());
 }
 
 }  // namespace LSP

@@ -2,6 +2,7 @@
 // array, a list object, a single location, null.
 #include "vexil/protocol/feature_results.h"
 
+#include "json/members.h"
 #include "protocol/json_arrays.h"
 #include "protocol/raw_json.h"
 
@@ -42,22 +43,29 @@ void SignatureHelp::Read(const xObject& value) {
 }
 
 void CompletionItemLabelDetails::Read(const xObject& value) {
-  detail = value.String("detail");
-  description = value.String("description");
+  static const MemberNames names{"detail", "description"};
+  const Members details(value, names);
+  detail = details.String("detail");
+  description = details.String("description");
 }
 
 void CompletionItem::Read(const xObject& value) {
-  label = value.String("label");
-  labelDetails.Read(value.Object("labelDetails"));
-  kind = value.Int("kind");
-  detail = value.String("detail");
-  documentation.Read(value.Object("documentation"));
-  deprecated = value.Bool("deprecated");
-  sortText = value.String("sortText");
-  filterText = value.String("filterText");
-  insertText = value.String("insertText");
-  insertTextFormat = value.Int("insertTextFormat");
-  textEdit.Read(value.Object("textEdit"));
+  // Lists of thousands of items: each item's members are found in one pass.
+  static const MemberNames names{"label",      "labelDetails", "kind",       "detail",
+                                 "documentation", "deprecated", "sortText", "filterText",
+                                 "insertText", "insertTextFormat", "textEdit"};
+  const Members item(value, names);
+  label = item.String("label");
+  labelDetails.Read(item.Object("labelDetails"));
+  kind = item.Int("kind");
+  detail = item.String("detail");
+  documentation.Read(item.Object("documentation"));
+  deprecated = item.Bool("deprecated");
+  sortText = item.String("sortText");
+  filterText = item.String("filterText");
+  insertText = item.String("insertText");
+  insertTextFormat = item.Int("insertTextFormat");
+  textEdit.Read(item.Object("textEdit"));
 }
 
 void CompletionList::Read(const xObject& value) {

@@ -9,25 +9,21 @@
 
 namespace LSP {
 
-// How deep a chain of nested values (selection-range parents) may go. Deeper is taken as
-// malformed rather than walked: a hostile or broken reply must not exhaust the stack or
-// the memory of the host.
-constexpr int kMaxNesting = 1000;
-
 // Appends every element of `array` read as a T. An element that cannot be read is
 // reported with the caught text and the array's type number.
 template <typename T>
 void ReadArrayElements(const JsonValue& array, std::vector<T>& items) {
   items.reserve(items.size() + array.Size());  // a completion list can hold thousands of items
   for (const JsonValue& element : array.GetArray()) {
-    T item;
+    // Read in place, not moved in: an item that fails to read is taken out again.
+    items.emplace_back();
     try {
-      item.Read(xObject(element));
+      items.back().Read(xObject(element));
     } catch (const std::exception& e) {
+      items.pop_back();
       ThrowFormatted("Error:%s\n\nExpecting a %s JSON object but found %d JSON object.", e.what(), "array",
                      static_cast<int>(array.GetType()));
     }
-    items.push_back(std::move(item));
   }
 }
 

@@ -5,6 +5,7 @@
 #include <string>
 
 #include "json/json_depth.h"
+#include "json/members.h"
 #include "protocol/json_arrays.h"
 #include "protocol/raw_json.h"
 
@@ -28,8 +29,10 @@ void ReadCode(const xObject& diagnostic, int& code, std::string& codeText) {
 }  // namespace
 
 void Position::Read(const xObject& value) {
-  line = value.Int("line");
-  character = value.Int("character");
+  static const MemberNames names{"line", "character"};
+  const Members position(value, names);
+  line = position.Int("line");
+  character = position.Int("character");
 }
 
 void Position::Write(xWriter& writer) {
@@ -38,8 +41,10 @@ void Position::Write(xWriter& writer) {
 }
 
 void Range::Read(const xObject& value) {
-  start.Read(value.Object("start"));
-  end.Read(value.Object("end"));
+  static const MemberNames names{"start", "end"};
+  const Members range(value, names);
+  start.Read(range.Object("start"));
+  end.Read(range.Object("end"));
 }
 
 void Range::Write(xWriter& writer) {
@@ -85,8 +90,10 @@ void TextDocumentItem::Write(xWriter& writer) {
 }
 
 void TextEdit::Read(const xObject& value) {
-  range.Read(value.Object("range"));
-  newText = value.String("newText");
+  static const MemberNames names{"range", "newText"};
+  const Members edit(value, names);
+  range.Read(edit.Object("range"));
+  newText = edit.String("newText");
 }
 
 void TextEdit::Write(xWriter& writer) {

@@ -137,6 +137,9 @@ class xServer {
   void DrainErrorLines();
   void ReportTimeOut();
   void CancelRequest(int id);
+  // Once the server has ended: waits briefly for the rest of its standard error, so that
+  // the trace shows why it ended.
+  void AwaitLastWords();
   void Dispatch(ServerStreams& streams, LSP::xReader& message);
   // Hands `message` to the host's handler; true when the host is to answer it.
   bool HandToHost(ServerStreams& streams, const LSP::xObject& message);

@@ -125,6 +125,10 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
       if (wait == MessageQueue::Wait::Interrupted) {
         tracer_.Message("Request Cancelled: %d\n", id);
       } else {
+        if (wait == MessageQueue::Wait::Finished) {
+          AwaitLastWords();
+          DrainErrorLines();
+        }
         ReportTimeOut();
       }
       CancelRequest(id);

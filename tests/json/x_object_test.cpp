@@ -5,6 +5,7 @@
 #include <stdexcept>
 #include <string>
 
+#include "json/members.h"
 #include "vexil/json/json.h"
 
 namespace {
@@ -26,6 +27,14 @@ std::string ErrorText(Call call) {
     return e.what();
   }
   return "no exception";
+}
+
+// The value a look-up returns, as text, or the text of what it throws.
+template <typename Call>
+std::string Outcome(Call call) {
+  std::string value;
+  std::string error = ErrorText([&] { value = call(); });
+  return error == "no exception" ? value : error;
 }
 
 std::string Mismatch(const char* expected, const char* found) {
@@ -122,4 +131,31 @@ TEST(xObject, AsIntTakesNumbersAndDecimalStrings) {
   EXPECT_EQ(o.Object("missing").AsInt(7), 7);
   EXPECT_EQ(o.Object("s").AsInt(7), 42);
   EXPECT_THROW(o.Object("bad").AsInt(7), std::invalid_argument);
+}
+
+// The one-pass look-ups stand in for xObject's own: the same value, default or error text
+// for duplicates (the first wins, even when null), names of equal length that differ in
+// one byte, names not listed, and values that are not objects.
+TEST(Members, LookUpsGiveWhatxObjectGives) {
+  static const LSP::MemberNames names{"a", "label", "sortText", "labelDetails", "insertTextFormat!"};
+  for (const char* json :
+       {R"({"a":1,"a":"x","label":null,"label":"l","sortText":2})", R"({"a":null,"a":3,"labelDetails":{}})",
+        R"({"lobel":"x","sortTaxt":"y","labelDetaiLs":true,"insertTextFormat?":1,"insertTextFormat!":"z"})",
+        R"({"c":true,"labelDetails":false})", "null", "[1]", "5"}) {
+    Parsed doc(json);
+    LSP::xObject o = doc.Root();
+    const LSP::Members m(o, names);
+    for (const char* name : {"a", "label", "sortText", "labelDetails", "insertTextFormat!", "c", "lobel",
+                             static_cast<const char*>(nullptr)}) {
+      auto same = [&](auto look) {
+        EXPECT_EQ(Outcome([&] { return look(m); }), Outcome([&] { return look(o); }))
+            << json << " " << (name ? name : "(null)");
+      };
+      same([&](const auto& v) { return std::to_string(v.Int(name)); });
+      same([&](const auto& v) { return v.String(name); });
+      same([&](const auto& v) { return std::to_string(v.Bool(name)); });
+      same([&](const auto& v) { return std::to_string(v.HasObject(name)); });
+      same([&](const auto& v) { return std::to_string(static_cast<int>(v.Object(name).Value().GetType())); });
+    }
+  }
 }
