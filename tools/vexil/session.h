@@ -4,6 +4,7 @@
 
 #include <map>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "vexil/host/language_server.h"
@@ -18,6 +19,8 @@ struct SessionOptions {
   int timeout = 5000;
   LSP::TraceLevel trace = LSP::TraceLevel::Off;  // what of the library's trace is shown
   std::string language;  // the language id of every document, instead of the file's own
+  std::vector<std::pair<std::string, std::string>> environment;  // the server's, over ours
+  bool progress = false;  // announce work-done progress, and show it
 };
 
 class Session {
