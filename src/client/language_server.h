@@ -94,6 +94,9 @@ class LanguageServer final : public xLanguageServer {
   // The request pattern for a holder made here, returned with whatever it was given.
   template <typename Holder>
   Holder Ask(const char* method, Params* params, Holder holder = Holder());
+  // The request pattern for a result of any shape: its JSON text, "null" for a null
+  // result, "" on any failure.
+  std::string RequestJson(const char* method, Params* params);
   bool Send(const char* method, Params* params);
   // Whether `params` can be written; false, with the error state set and traced, when
   // JSON text the host gave in them is not JSON.

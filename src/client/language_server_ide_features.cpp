@@ -47,9 +47,7 @@ std::vector<CodeAction> LanguageServer::TextDocument_CodeAction(CodeActionParams
 
 std::string LanguageServer::Workspace_ExecuteCommand(ExecuteCommandParams* params) {
   if (params && !Writable(*params)) return "";
-  JsonResult holder;
-  if (!Request("workspace/executeCommand", params, holder)) return "";
-  return holder.json.empty() ? "null" : holder.json;
+  return RequestJson("workspace/executeCommand", params);
 }
 
 std::vector<DocumentHighlight> LanguageServer::TextDocument_DocumentHighlight(TextDocumentPositionParams* params) {
