@@ -71,7 +71,9 @@ class VEXIL_API xLanguageServer {
   // server's "window/workDoneProgress/create" to the message handler; "configuration"
   // announces workspace.configuration and hands "workspace/configuration" to the handler;
   // "messages" hands the handler both of those and every server request the library
-  // cannot answer itself. With nothing enabled the initialize request is what it always was.
+  // cannot answer itself; "features" announces what the calls after SetEnvironment need and
+  // hands the handler "workspace/applyEdit". With nothing enabled the initialize request is
+  // what it always was.
   virtual bool Enable(const char* feature) = 0;
   // What the server announced in its reply to initialize.
   virtual LSP::ServerCapabilities ServerCapabilities() = 0;
