@@ -4,6 +4,8 @@
 
 #include <algorithm>
 
+#include "client/watched_files.h"
+
 namespace LSP {
 namespace {
 
@@ -27,6 +29,13 @@ const Feature kFeatures[] = {
      [](EnabledFeatures& enabled) {
        enabled.capabilities.push_back(R"({"workspace":{"configuration":true}})");
        enabled.hostRequests.push_back(kConfiguration);
+     }},
+    // Files changed on disk in the workspace folders, told to the server as it registers
+    // for them (or all of them, when it registers nothing).
+    {"watchedFiles",
+     [](EnabledFeatures& enabled) {
+       enabled.capabilities.push_back(vexil::kWatchedFilesCapabilities);
+       enabled.watchedFiles = true;
      }},
     // The host answers what the server asks (applyEdit, showMessageRequest...).
     {"messages",
