@@ -88,7 +88,7 @@ class xServer {
   // the server's exit; called once the server has ended, before the connection goes.
   void FinishMessages();
   // Sets (or with a null value removes) a variable of the environment of later launches;
-  // false for a name that cannot be one.
+  // false, changing nothing, for a name that cannot be one and while the server runs.
   bool Environment(const char* name, const char* value);
 
   // The reply wait limit in milliseconds; a value below 1 becomes the default. Writes

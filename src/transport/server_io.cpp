@@ -117,6 +117,7 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
     for (auto left = cap - Clock::now(); left > Clock::duration::zero(); left = cap - Clock::now()) {
       auto step = std::min(std::chrono::duration_cast<std::chrono::milliseconds>(left), kTick);
       if ((wait = replies.WaitPop(text, step)) != MessageQueue::Wait::TimedOut) break;
+      deferred_.Deliver();
       ++lastWaitTicks_;
       if (--countdown == 0) break;
     }
