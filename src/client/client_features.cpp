@@ -37,6 +37,12 @@ const Feature kFeatures[] = {
        enabled.capabilities.push_back(vexil::kWatchedFilesCapabilities);
        enabled.watchedFiles = true;
      }},
+    // Columns counted in UTF-8 bytes when the server agrees (ServerCapabilities says which):
+    // hosts that keep their texts in UTF-8 then need no conversion.
+    {"positionEncoding",
+     [](EnabledFeatures& enabled) {
+       enabled.capabilities.push_back(R"({"general":{"positionEncodings":["utf-8","utf-16"]}})");
+     }},
     // The host answers what the server asks (applyEdit, showMessageRequest...).
     {"messages",
      [](EnabledFeatures& enabled) {

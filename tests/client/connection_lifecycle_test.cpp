@@ -89,6 +89,7 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
       {{"messages", "unknown"}, {}},
       {{"progress"}, {{treeEnd + "}", treeEnd + R"(,"window":{"workDoneProgress":true}})"}}},
       {{"configuration", "configuration"}, {{R"("configuration":false)", R"("configuration":true)"}}},
+      {{"positionEncoding"}, {{treeEnd + "}", treeEnd + R"(,"general":{"positionEncodings":["utf-8","utf-16"]}})"}}},
       {{"watchedFiles"},
        {{R"("didChangeWatchedFiles":{"dynamicRegistration":false})",
          R"("didChangeWatchedFiles":{"dynamicRegistration":true,"relativePatternSupport":true})"}}},
@@ -119,12 +120,14 @@ TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
     std::string capabilities;
     int change;
     bool openClose, save, includeText;
+    const char* encoding = "utf-16";
   };
   const Row rows[] = {
-      {R"({"textDocumentSync": 2,"hoverProvider":true})", 2, true, true, false},
+      {R"({"textDocumentSync": 2,"hoverProvider":true,"positionEncoding":"utf-8"})", 2, true, true, false, "utf-8"},
       {R"({"textDocumentSync": {"openClose":true,"change":1,"save":{"includeText":true}},"hoverProvider":true})", 1,
        true, true, true},
-      {R"({"textDocumentSync": {"change":2,"save":false},"hoverProvider":true})", 2, false, false, false},
+      {R"({"textDocumentSync": {"change":2,"save":false},"hoverProvider":true,"positionEncoding":8})", 2, false, false,
+       false},
       {R"({"textDocumentSync": "full","hoverProvider":true})", 0, false, false, false},
   };
   for (const Row& row : rows) {
@@ -137,6 +140,7 @@ TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
     EXPECT_EQ(read.documentSync.openClose, row.openClose) << row.capabilities;
     EXPECT_EQ(read.documentSyncSave, row.save) << row.capabilities;
     EXPECT_EQ(read.documentSync.save.includeText, row.includeText) << row.capabilities;
+    EXPECT_EQ(read.positionEncoding, row.encoding) << row.capabilities;
     EXPECT_EQ(read.textDocumentSync.change, 0) << "the old member stays unread";
     std::string compact = row.capabilities;
     compact.erase(compact.find(' '), 1);
