@@ -66,7 +66,10 @@ class VEXIL_API xLanguageServer {
   // server's "window/workDoneProgress/create" to the message handler; "configuration"
   // announces workspace.configuration and hands "workspace/configuration" to the handler;
   // "messages" hands the handler both of those and every server request the library
-  // cannot answer itself. With nothing enabled the initialize request is what it always was.
+  // cannot answer itself; "watchedFiles" tells the server about files changed in the
+  // workspace folders as it registers for them; "positionEncoding" offers UTF-8 columns
+  // (ServerCapabilities().positionEncoding says what the server chose). With nothing
+  // enabled the initialize request is what it always was.
   virtual bool Enable(const char* feature) = 0;
   // What the server announced in its reply to initialize.
   virtual LSP::ServerCapabilities ServerCapabilities() = 0;
