@@ -286,6 +286,12 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
   EXPECT_TRUE(transport_test::WaitFor([&] { return received("b.txt"); }, 30s));
   EXPECT_FALSE(received("b.py"));
   EXPECT_NE(ask("client/registerCapability", "{}").find(R"("error":{"code":-32602,)"), std::string::npos);
+
+  // Shut down and initialized again: the registrations of the earlier session are gone.
+  EXPECT_TRUE(server->Shutdown());
+  ASSERT_TRUE(server->Start(init));
+  std::ofstream(file("c.py")).put('x');
+  EXPECT_TRUE(transport_test::WaitFor([&] { return received("c.py"); }, 30s));
 }
 
 TEST_F(ConnectionLifecycle, StartUpDetailsAreVerboseOnlyAndNothingIsSentToAStoppedServer) {
