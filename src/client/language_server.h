@@ -3,8 +3,12 @@
 // one protocol message.
 #pragma once
 
+#include <memory>
+#include <mutex>
+
 #include "client/client_features.h"
 #include "client/json_params.h"
+#include "client/watched_files.h"
 #include "host/trace_line.h"
 #include "transport/server.h"
 #include "vexil/host/language_server.h"
@@ -19,7 +23,7 @@ class LanguageServer final : public xLanguageServer {
   explicit LanguageServer(const xServerStart& start);
   LanguageServer(const LanguageServer&) = delete;
   LanguageServer& operator=(const LanguageServer&) = delete;
-  ~LanguageServer() = default;
+  ~LanguageServer() { StopWatchingFiles(); }
 
   bool Exit() override;
   const char* ErrorMessage() override { return server.ErrorMessage(); }
@@ -106,11 +110,21 @@ class LanguageServer final : public xLanguageServer {
   bool Prepared(const char* method, const char* paramsJson, JsonParams& params);
   // Polls until the process has ended or the limit has passed; true when it ended.
   bool AwaitEnd();
+  // With "watchedFiles" enabled: watches the workspace folders of `init` and takes the
+  // server's registrations, before "initialized" is sent. Nothing is sent before
+  // FilesInitialized().
+  void WatchFiles(const xServerInitialise& init);
+  void FilesInitialized();
+  // Ends the watching, before the server is stopped, started again or left.
+  void StopWatchingFiles();
 
   vexil::xServer server;
   bool initialized = false;
   InitializeResult result;
   EnabledFeatures features;
+  // Swapped under its lock: the output reader hands it the server's registrations.
+  std::mutex filesMutex;
+  std::unique_ptr<vexil::WatchedFilesNotifier> files;
 };
 
 template <typename Holder>

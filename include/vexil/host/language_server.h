@@ -72,8 +72,10 @@ class VEXIL_API xLanguageServer {
   // announces workspace.configuration and hands "workspace/configuration" to the handler;
   // "messages" hands the handler both of those and every server request the library
   // cannot answer itself; "features" announces what the calls after SetEnvironment need and
-  // hands the handler "workspace/applyEdit". With nothing enabled the initialize request is
-  // what it always was.
+  // hands the handler "workspace/applyEdit"; "watchedFiles" tells the server about files
+  // changed in the workspace folders as it registers for them; "positionEncoding" offers
+  // UTF-8 columns (ServerCapabilities().positionEncoding says what the server chose). With
+  // nothing enabled the initialize request is what it always was.
   virtual bool Enable(const char* feature) = 0;
   // What the server announced in its reply to initialize.
   virtual LSP::ServerCapabilities ServerCapabilities() = 0;
