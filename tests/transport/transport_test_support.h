@@ -2,9 +2,9 @@
 // that script the fake server per request, and start records that launch it.
 #pragma once
 
-
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
 #include <functional>
 #include <memory>
@@ -50,15 +50,12 @@ class TraceLog {
     return texts;
   }
   static int Count(const std::string& text) {
-    int count = 0;
-    for (const TraceLine& line : Lines()) count += line.text == text;
-    return count;
+    const std::vector<std::string> texts = Texts();
+    return static_cast<int>(std::count(texts.begin(), texts.end(), text));
   }
   static bool Contains(const std::string& piece) {
-    for (const TraceLine& line : Lines()) {
-      if (line.text.find(piece) != std::string::npos) return true;
-    }
-    return false;
+    const std::vector<std::string> texts = Texts();
+    return std::any_of(texts.begin(), texts.end(), [&](const std::string& text) { return text.find(piece) != std::string::npos; });
   }
 
  private:
@@ -91,14 +88,10 @@ inline xServerStart FakeStart(std::vector<std::string> directives = {}, int time
   start.level = level;
   start.timeout = timeout;
   start.executable = VEXIL_FAKE_SERVER;
-  directives.resize(7);
-  start.argument1 = directives[0];
-  start.argument2 = directives[1];
-  start.argument3 = directives[2];
-  start.argument4 = directives[3];
-  start.argument5 = directives[4];
-  start.argument6 = directives[5];
-  start.argument7 = directives[6];
+  std::string xServerStart::*slots[] = {&xServerStart::argument1, &xServerStart::argument2, &xServerStart::argument3,
+                                        &xServerStart::argument4, &xServerStart::argument5, &xServerStart::argument6,
+                                        &xServerStart::argument7};
+  for (std::size_t i = 0; i < 7 && i < directives.size(); ++i) start.*slots[i] = directives[i];
   return start;
 }
 
