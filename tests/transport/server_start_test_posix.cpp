@@ -22,7 +22,7 @@ std::string CurrentDirectory() {
 TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheTimeout) {
   xServerStart start = FakeStart({"", "ignored-by-sh"}, 0);
   start.useCommand = true;
-  start.executable = std::string("'") + VEXIL_FAKE_SERVER + "' 'stderr=hello world\\n'";
+  start.executable = std::string("'") + VEXIL_FAKE_SERVER + "' 'stderr=hello world\\r\\nsecond\\n'";
   vexil::xServer server(start);
   EXPECT_EQ(server.Id(), -1);
   ASSERT_TRUE(server.Start());
@@ -35,7 +35,9 @@ TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheT
   EXPECT_TRUE(server.Start());  // already running: nothing happens
   EXPECT_TRUE(TraceLog::Lines().empty());
 
-  EXPECT_TRUE(ErrorLineArrives(server, "hello world"));  // standard error, at verbose level
+  // Standard error, at verbose level, a line a trace line whatever its line end.
+  EXPECT_TRUE(ErrorLineArrives(server, "second"));
+  EXPECT_EQ(TraceLog::Count("Reply: hello world\n"), 1);
 
   xServerStart quiet = FakeStart();
   quiet.timeout = -5;
