@@ -20,19 +20,7 @@ using namespace std::chrono_literals;
 using namespace transport_test;
 using Texts = std::vector<std::string>;
 
-class ServerTraffic : public ::testing::Test {
- protected:
-  void SetUp() override { TraceLog::Clear(); }
-
-  // A started fake server at `level`, tracing into the log.
-  std::unique_ptr<vexil::xServer> Started(int timeout = 2000, std::vector<std::string> directives = {},
-                                          LSP::TraceLevel level = LSP::TraceLevel::Messages) {
-    auto server = std::make_unique<vexil::xServer>(FakeStart(std::move(directives), timeout, level));
-    EXPECT_TRUE(server->Start());
-    TraceLog::Clear();
-    return server;
-  }
-};
+using ServerTraffic = FakeServerTest;
 
 std::string Sent(const std::string& body) {
   return "\nSent: Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body + "\n";
@@ -271,7 +259,8 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
        {}, Next::FailsFast},
       {"died: Start launches it again", {},
        [](vexil::xServer& server) {
-         KillServer(server);
+         vexil_test::KillProcess(server.Id());
+         EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
          EXPECT_TRUE(server.Start());
        },
        {}, Next::Works},

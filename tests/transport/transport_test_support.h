@@ -173,16 +173,19 @@ inline std::unique_ptr<vexil::xServer> FailedStart(const xServerStart& start) {
   return nullptr;
 }
 
-// Each test of a server's start reads only its own trace lines.
-class ServerStart : public ::testing::Test {
+// Each test of the fake server reads only its own trace lines.
+class FakeServerTest : public ::testing::Test {
  protected:
   void SetUp() override { TraceLog::Clear(); }
-};
 
-// Ends a fake server this test started, by its process id.
-inline void KillServer(vexil::xServer& server) {
-  vexil_test::KillProcess(server.Id());
-  WaitFor([&] { return !server.IsRunning(); });
-}
+  // A started fake server at `level`, the lines of its start cleared from the log.
+  static std::unique_ptr<vexil::xServer> Started(int timeout = 2000, LSP::TraceLevel level = LSP::TraceLevel::Messages) {
+    auto server = std::make_unique<vexil::xServer>(FakeStart({}, timeout, level));
+    EXPECT_TRUE(server->Start());
+    TraceLog::Clear();
+    return server;
+  }
+};
+using ServerStart = FakeServerTest;
 
 }  // namespace transport_test
