@@ -64,8 +64,6 @@ TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
 
 TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   xWatcherOptions options;
-  EXPECT_EQ(options.timeout, 0);
-  EXPECT_FALSE(options.useCommand);
   options.trace = OnTrace;
   options.level = LSP::TraceLevel::Verbose;
   options.arguments = "echo $FN";
