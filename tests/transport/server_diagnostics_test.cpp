@@ -43,9 +43,7 @@ TEST_F(ServerDiagnostics, IdlePublicationsAreStoredAndStillQueuedAsIgnoredReplie
   EXPECT_TRUE(server->Diagnostics().Of("file:///fake/never.cpp").empty());
 
   // The queue is untouched: the next request still passes over the four publications.
-  TextResult result;
-  Ask(*server, "fake/echo", "", result);
-  EXPECT_TRUE(result.read);
+  EXPECT_TRUE(Ask(*server, "fake/echo").read);
   int ignored = 0;
   for (const std::string& text : TraceLog::Texts("Message")) {
     ignored += text.rfind("Ignoring Reply: ", 0) == 0 && text.find("publishDiagnostics") != std::string::npos;
@@ -92,14 +90,12 @@ TEST_F(ServerDiagnostics, AMalformedPublicationIsDroppedWithoutFailingTheReader)
   std::string escaped;
   for (char c : garbage) escaped += c == '"' ? std::string("\\\"") : std::string(1, c);
 
-  TextResult result;
-  Ask(*server, "fake/echo", "{\"garbage\":\"" + escaped + "\"}", result);
-  EXPECT_TRUE(result.read);
+  EXPECT_TRUE(Ask(*server, "fake/echo", "{\"garbage\":\"" + escaped + "\"}").read);
   EXPECT_EQ(server->Diagnostics().Version(), 0);
   EXPECT_EQ(TraceLog::Count("Diagnostics Error: Expecting a array JSON object but found 3 JSON object .\n"), 1);
 
   TraceLog::Clear();
-  Ask(*server, "fake/echo", "", result);
+  Ask(*server, "fake/echo");
   EXPECT_FALSE(TraceLog::Contains("Write Error"));
 }
 

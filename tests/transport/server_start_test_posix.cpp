@@ -55,9 +55,7 @@ TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
                                                  "  Arguments: \n", "Use Command: No\n",
                                                  "     Timout: 200 (milliseconds)\n\n"}));
     EXPECT_EQ(CurrentDirectory(), before);
-    TextResult result;
-    Ask(server, "fake/cwd", "", result);
-    EXPECT_EQ(result.cwd, "/tmp");
+    EXPECT_EQ(Ask(server, "fake/cwd").cwd, "/tmp");
     id = server.Id();
     TraceLog::Clear();
   }

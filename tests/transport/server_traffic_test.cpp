@@ -118,8 +118,7 @@ TEST_F(ServerTraffic, RepliesTimeOutsErrorsAndServerRequests) {
     SCOPED_TRACE(row.name);
     // Answering already, so that only the reply is timed, not the server's start.
     auto server = Started(30000);
-    TextResult warm;
-    Ask(*server, "fake/echo", "", warm);
+    Ask(*server, "fake/echo");
     server->Timeout(row.timeout);
     TraceLog::Clear();
     FakeParams params(row.params);
@@ -163,8 +162,7 @@ std::function<void(vexil::xServer&)> KilledWhileAwaited(const char* method, cons
       vexil_test::KillProcess(id);
     });
     auto asked = std::chrono::steady_clock::now();
-    TextResult result;
-    Ask(server, method, params, result);
+    Ask(server, method, params);
     killer.join();
     EXPECT_LT(std::chrono::steady_clock::now() - asked, 3s);  // its time-out is 30 s
   };
@@ -192,9 +190,7 @@ struct Misbehaviour {
 
 std::function<void(vexil::xServer&)> Answered(const std::string& params, bool read = true) {
   return [params, read](vexil::xServer& server) {
-    TextResult result;
-    Ask(server, "fake/echo", params, result);
-    EXPECT_EQ(result.read, read);
+    EXPECT_EQ(Ask(server, "fake/echo", params).read, read);
   };
 }
 
@@ -285,10 +281,9 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
 
     TraceLog::Clear();
     begin = std::chrono::steady_clock::now();
-    TextResult result;
-    Ask(server, "fake/echo", "", result);
+    const bool read = Ask(server, "fake/echo").read;
     EXPECT_LT(std::chrono::steady_clock::now() - begin, 30s);
-    EXPECT_EQ(result.read, row.next == Next::Works);
+    EXPECT_EQ(read, row.next == Next::Works);
     EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), row.next == Next::TimesOut ? 1 : 0);
     if (row.next == Next::FailsFast) {
       EXPECT_STREQ(server.ErrorMessage(), "A server read was requested but the server is not running.");

@@ -130,15 +130,15 @@ class TextResult : public LSP::Result {
   unsigned answers = 0;
 };
 
-// Sends one request scripted by `params` and reads its reply into `result`.
-inline LSP::ResponseMessage Ask(vexil::xServer& server, const char* method, const std::string& params,
-                                TextResult& result) {
+// Sends one request scripted by `params` and reads its reply.
+inline TextResult Ask(vexil::xServer& server, const char* method, const std::string& params = "") {
   FakeParams scripted(params);
   LSP::RequestMessage request(method, &scripted);
+  TextResult result;
   LSP::ResponseMessage response(&result);
   server.Write(request);
   server.Read(request.id, response);
-  return response;
+  return result;
 }
 
 // Polls `condition` until it holds or `limit` has passed.
@@ -155,8 +155,7 @@ inline bool WaitFor(const std::function<bool()>& condition, std::chrono::millise
 // order: ask until `line` has come through, once.
 inline bool ErrorLineArrives(vexil::xServer& server, const std::string& line) {
   return WaitFor([&] {
-    TextResult result;
-    Ask(server, "fake/echo", "", result);
+    Ask(server, "fake/echo");
     return TraceLog::Count("Reply: " + line + "\n") == 1;
   });
 }
