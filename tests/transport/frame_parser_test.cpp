@@ -60,6 +60,7 @@ TEST(FrameParser, HeadersQuirksStrayBytesAndBounds) {
     std::string newest = "";   // the output is the bound's worth ending with this
     std::size_t held = 0;      // the most the parser may hold; 0: not checked
   } rows[] = {
+      {"frames fed byte by byte", Frame("{}") + Frame(R"({"id":1})"), {"{}", R"({"id":1})"}, "", 1},
       {"header name in any case", "content-LENGTH: 2\r\n\r\nab", {"ab"}, ""},
       {"extra header lines",
        "Content-Length: 5\r\nContent-Type: application/vscode-jsonrpc; charset=utf-8\r\n\r\nhello", {"hello"}, ""},
