@@ -43,6 +43,9 @@ TEST_F(ServerTraffic, ANotificationIsWhatAReadWithoutIdWaitsFor) {
   EXPECT_EQ(TraceLog::Count("Ignoring Reply: {\"jsonrpc\":\"2.0\",\"id\":7,\"result\":null}\n"), 1);
 }
 
+// What of the reply was read: nothing, only the envelope's id, or the id and the result.
+enum class Taken { Nothing, Id, Result };
+
 // What the host read, its error state and its trace lines after one request to a fresh
 // fake server, whose reply the request's params script. In `traced`, "{id}" stands for the
 // request's id, "{request}" for the line sent with it, and a JSON object for a line sent.
@@ -51,7 +54,7 @@ struct Exchange {
   const char* method;
   std::string params;
   int timeout;
-  bool read;                // the reply was read into the result
+  Taken taken;
   int ticks;                // -1: not checked
   bool errors;              // HaveErrors()
   const char* message;      // ErrorMessage(); null: not checked
@@ -73,46 +76,46 @@ TEST_F(ServerTraffic, RepliesTimeOutsErrorsAndServerRequests) {
                          R"({"jsonrpc":"2.0","method":"$/cancelRequest","params":{"id":{id}}})"};
   const Texts readError = {"Read Error: boom\n\n", kHint};
   const Exchange rows[] = {
-      {"a prompt reply takes no tick", "fake/echo", "", 2000, true, 0, false, "", "",
+      {"a prompt reply takes no tick", "fake/echo", "", 2000, Taken::Result, 0, false, "", "",
        {"{request}", R"(Reply: {"jsonrpc":"2.0","id":{id},"result":{"method":"fake/echo","answers":[],"received":[]}})" "\n"}},
-      {"a time-out counts ticks, traces and cancels", "fake/silent", "", 200, false, 3, false, "", "", timeOut},
-      {"a time-out of 1 ms is one tick", "fake/silent", "", 1, false, 1, false, "", "", timeOut},
-      {"a time-out rounds its ticks", "fake/silent", "", 250, false, 3, false, "", "", timeOut},
-      {"each ignored message extends the countdown by half", "fake/silent", R"({"notifications":2})", 200, false, 6,
+      {"a time-out counts ticks, traces and cancels", "fake/silent", "", 200, Taken::Nothing, 3, false, "", "", timeOut},
+      {"a time-out of 1 ms is one tick", "fake/silent", "", 1, Taken::Nothing, 1, false, "", "", timeOut},
+      {"a time-out rounds its ticks", "fake/silent", "", 250, Taken::Nothing, 3, false, "", "", timeOut},
+      {"each ignored message extends the countdown by half", "fake/silent", R"({"notifications":2})", 200, Taken::Nothing, 6,
        false, "", nullptr,
        {R"(Ignoring Reply: {"jsonrpc":"2.0","method":"fake/progress","params":{"left":2}})" "\n",
         R"(Ignoring Reply: {"jsonrpc":"2.0","method":"fake/progress","params":{"left":1}})" "\n"}},
       {"a late error for another request is ignored", "fake/echo",
-       R"({"error":{"code":-32603,"message":"late","id":999}})", 200, false, -1, false, "", nullptr, {timedOut}},
+       R"({"error":{"code":-32603,"message":"late","id":999}})", 200, Taken::Nothing, -1, false, "", nullptr, {timedOut}},
       {"an error without an id is taken", "fake/echo", R"({"error":{"code":-32603,"message":"boom","id":"none"}})",
-       2000, false, 0, true, "boom", "Error", readError},
+       2000, Taken::Nothing, 0, true, "boom", "Error", readError},
       {"an error for this request is taken", "fake/echo", R"({"error":{"code":-32603,"message":"boom","id":"same"}})",
-       2000, false, 0, true, "boom", "Error", readError},
+       2000, Taken::Id, 0, true, "boom", "Error", readError},
       // The server could not read the request; the envelope cannot read a null id and says so.
       {"an error with a null id is taken", "fake/echo", R"({"error":{"code":-32700,"message":"boom","id":"null"}})",
-       2000, false, 0, true, nullptr, "Error",
+       2000, Taken::Nothing, 0, true, nullptr, "Error",
        {"Error: Expecting a 'int' JSON object but found 'null' JSON object.\n\n", kHint}},
       {"method not found is a warning that keeps its text", "fake/echo",
-       R"({"error":{"code":-32601,"message":"Unhandled method fake/echo"}})", 2000, false, 0, false,
+       R"({"error":{"code":-32601,"message":"Unhandled method fake/echo"}})", 2000, Taken::Id, 0, false,
        "Unhandled method fake/echo", "",
        {"{request}", R"(Reply: {"jsonrpc":"2.0","id":{id},"error":{"code":-32601,"message":"Unhandled method fake/echo"}})" "\n",
         "Warning: Unhandled method fake/echo\n\n"}},
-      {"an unparsable body is taken as the reply", "fake/echo", R"({"unparsable":true})", 2000, false, 0, false, "",
+      {"an unparsable body is taken as the reply", "fake/echo", R"({"unparsable":true})", 2000, Taken::Nothing, 0, false, "",
        nullptr, {"JSON Parse Failed:\nthis is not json\n", "Reply: this is not json\n"}},
       {"server requests are answered and never taken as the reply", "fake/echo",
        R"({"ask":["workspace/configuration","window/workDoneProgress/create","client/registerCapability","fake/unknown"]})",
-       2000, true, 0, false, "", nullptr,
+       2000, Taken::Result, 0, false, "", nullptr,
        {R"(Ignoring Reply: {"jsonrpc":"2.0","id":0,"method":"workspace/configuration","params":{"items":[{"section":"a"},{"section":"b"}]}})" "\n",
         R"({"jsonrpc":"2.0","id":0,"result":[null,null]})", R"({"jsonrpc":"2.0","id":1,"result":null})",
         R"({"jsonrpc":"2.0","id":2,"result":null})",
         R"({"jsonrpc":"2.0","id":3,"error":{"code":-32601,"message":"Method not found"}})"},
        4},
       {"a server request with the awaited id is not the reply", "fake/echo",
-       R"({"ask":["window/workDoneProgress/create"],"askSameId":true})", 2000, true, 0, false, "", nullptr, {}, 1},
-      {"a 4 MB reply arrives whole", "fake/echo", R"({"size":4000000})", 30000, true, -1, false, "", nullptr, {}, 0,
+       R"({"ask":["window/workDoneProgress/create"],"askSameId":true})", 2000, Taken::Result, 0, false, "", nullptr, {}, 1},
+      {"a 4 MB reply arrives whole", "fake/echo", R"({"size":4000000})", 30000, Taken::Result, -1, false, "", nullptr, {}, 0,
        4000000},
       {"a reply split in 7 writes after noise arrives whole", "fake/echo", R"({"split":7,"garbage":"warning: noise\n"})",
-       2000, true, -1, false, "", nullptr, {}},
+       2000, Taken::Result, -1, false, "", nullptr, {}},
   };
   for (const Exchange& row : rows) {
     SCOPED_TRACE(row.name);
@@ -127,9 +130,9 @@ TEST_F(ServerTraffic, RepliesTimeOutsErrorsAndServerRequests) {
     LSP::ResponseMessage response(&result);
     server->Write(request);
     server->Read(request.id, response);
-    EXPECT_EQ(result.read, row.read);
-    if (row.read) {
-      EXPECT_EQ(response.id, request.id);
+    EXPECT_EQ(response.id, row.taken == Taken::Nothing ? -1 : request.id);
+    EXPECT_EQ(result.read, row.taken == Taken::Result);
+    if (result.read) {
       EXPECT_EQ(result.method, row.method);
       EXPECT_EQ(result.answers, row.answers);
       EXPECT_EQ(result.data.size(), row.data);
