@@ -290,8 +290,8 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
     EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), row.next == Next::TimesOut ? 1 : 0);
     if (row.next == Next::FailsFast) {
       EXPECT_STREQ(server.ErrorMessage(), "A server read was requested but the server is not running.");
-      EXPECT_EQ(TraceLog::Texts("Error"),
-                (Texts{"Error: A server read was requested but the server is not running.\n\n", kHint}));
+      EXPECT_EQ(TraceLog::Count("Error: A server read was requested but the server is not running.\n\n"), 1);
+      EXPECT_TRUE(TraceLog::Contains(kHint));
     }
     EXPECT_FALSE(TraceLog::Contains("Write Error"));  // a failed answer is no reader error
     if (has("hang")) vexil_test::KillProcess(server.Id());
