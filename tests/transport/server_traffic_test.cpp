@@ -168,6 +168,8 @@ std::function<void(vexil::xServer&)> KilledWhileAwaited(const char* method, cons
     Ask(server, method, params);
     killer.join();
     EXPECT_LT(std::chrono::steady_clock::now() - asked, 3s);  // its time-out is 30 s
+    // Its output may end before its exit is seen: the next request fails fast only after.
+    EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
   };
 }
 
