@@ -1,15 +1,16 @@
-// Uses both watcher exports and the change record through the shared library alone.
+// Uses both watcher exports, the change record, the task record and both task exports
+// through the shared library alone.
 #include <gtest/gtest.h>
 
 #include <chrono>
 #include <condition_variable>
-#include <filesystem>
 #include <fstream>
 #include <memory>
 #include <mutex>
 #include <string>
 
 #include "vexil_test/support.h"
+#include "vexil/task/watcher_task.h"
 #include "vexil/watch/watcher.h"
 #include "vexil/watch/watcher_ex.h"
 
@@ -33,6 +34,11 @@ void OnTrace(TraceType, const char*, const char*) {
   ++traceLines;
 }
 
+int TraceLines() {
+  std::lock_guard<std::mutex> lock(mutex);
+  return traceLines;
+}
+
 }  // namespace
 
 TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
@@ -51,7 +57,30 @@ TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
     EXPECT_TRUE(changed.wait_for(lock, std::chrono::seconds(30), [] { return lastName == "created.txt"; }));
   }
   std::unique_ptr<xWatcherWorkspace> tree(xWatcher_Workspace(OnChange, OnTrace, LSP::TraceLevel::Verbose));
-  const int before = traceLines;
+  const int before = TraceLines();
   tree->Start("project", root.c_str(), nullptr);
-  EXPECT_GT(traceLines, before);
+  EXPECT_GT(TraceLines(), before);
+}
+
+TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
+  xWatcherOptions options;
+  options.trace = OnTrace;
+  options.level = LSP::TraceLevel::Verbose;
+  options.arguments = "echo $FN";
+  options.flag = true;
+  const xWatcherOptions copy = options;
+  EXPECT_EQ(copy.arguments, "echo $FN");
+
+  const vexil_test::TempDirectory directory;
+  const int before = TraceLines();
+  xWatcherTask* task = xWatcher_Task("exported", copy, {directory.Path().string()});
+  ASSERT_NE(task, nullptr);
+  EXPECT_EQ(xWatcher_Have("exported"), task);
+  EXPECT_TRUE(task->IsFlagged());
+  task->AddExtension(".cpp");
+  task->Start();
+  task->Stop();
+  task->Release();
+  EXPECT_EQ(xWatcher_Have("exported"), nullptr);
+  EXPECT_GT(TraceLines(), before);
 }

@@ -22,17 +22,13 @@ class Chunks {
 
   std::size_t Size() const { return size_; }
 
-  // Pieces of 1 to 64 bytes, sizes drawn from the seed; one piece for Whole().
-  std::vector<Chunk> Pieces() const {
+  // Pieces of 1 to 64 bytes, sizes drawn from the seed; the stream in one piece when `whole`.
+  std::vector<Chunk> Pieces(bool whole = false) const {
     std::vector<Chunk> pieces;
-    if (whole_) {
-      if (size_) pieces.push_back({stream_, size_});
-      return pieces;
-    }
     std::uint32_t state = seed_ * 2654435761u + 1;
     for (std::size_t at = 0; at < size_;) {
       state = state * 1103515245u + 12345u;
-      std::size_t piece = 1 + (state >> 16) % 64;
+      std::size_t piece = whole ? size_ : 1 + (state >> 16) % 64;
       if (piece > size_ - at) piece = size_ - at;
       pieces.push_back({stream_ + at, piece});
       at += piece;
@@ -40,16 +36,10 @@ class Chunks {
     return pieces;
   }
 
-  // The same stream in one piece.
-  Chunks Whole() const { return Chunks(stream_, size_); }
-
  private:
-  Chunks(const char* stream, std::size_t size) : seed_(0), stream_(stream), size_(size), whole_(true) {}
-
   std::uint8_t seed_;
   const char* stream_;
   std::size_t size_;
-  bool whole_ = false;
 };
 
 }  // namespace fuzz

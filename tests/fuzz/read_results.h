@@ -17,38 +17,36 @@
 
 namespace fuzz {
 
-inline void ReadIntoEveryResult(LSP::xReader& reader) {
-  LSP::Hover hover;
-  LSP::SignatureHelp signatureHelp;
-  LSP::CompletionList completion;
-  LSP::LocationsList locations;
-  LSP::SymbolInformationList symbols("file:///a.c");
-  LSP::DocumentFormattingList formatting;
-  LSP::WorkspaceEdit edit;
-  LSP::InitializeResult initialize;
-  LSP::CodeActionList actions;
-  LSP::JsonResult any;
-  LSP::DocumentHighlightList highlights;
-  LSP::FoldingRangeList folding;
-  LSP::SelectionRangeList selections;
-  LSP::InlayHintList hints;
-  LSP::PrepareRenameResult prepareRename;
-  LSP::ResolvedCompletionItem resolved;
-  LSP::SemanticTokens tokens;
-  LSP::CallHierarchyItemList callItems;
-  LSP::CallHierarchyIncomingCallList incoming;
-  LSP::CallHierarchyOutgoingCallList outgoing;
-  for (LSP::Result* result : std::initializer_list<LSP::Result*>{
-           &hover, &signatureHelp, &completion, &locations, &symbols, &formatting, &edit, &initialize, &actions, &any,
-           &highlights, &folding, &selections, &hints, &prepareRename, &resolved, &tokens, &callItems, &incoming,
-           &outgoing}) {
-    LSP::ResponseMessage response(result);
-    try {
-      response.Read(reader);
-    } catch (const std::exception&) {
-    }
+inline void ReadInto(LSP::xReader& reader, LSP::Result& result) {
+  LSP::ResponseMessage response(&result);
+  try {
+    response.Read(reader);
+  } catch (const std::exception&) {
   }
+}
+
+template <typename Result>
+void ReadIntoNew(LSP::xReader& reader) {
+  Result result;
+  ReadInto(reader, result);
+}
+
+template <typename... Results>
+void ReadIntoEach(LSP::xReader& reader) {
+  (ReadIntoNew<Results>(reader), ...);
+}
+
+inline void ReadIntoEveryResult(LSP::xReader& reader) {
+  LSP::SymbolInformationList symbols("file:///a.c");
+  LSP::InitializeResult initialize;
+  LSP::SemanticTokens tokens;
+  for (LSP::Result* result : std::initializer_list<LSP::Result*>{&symbols, &initialize, &tokens}) ReadInto(reader, *result);
   tokens.Decode(initialize.capabilities.semanticTokensProvider.legend);
+  ReadIntoEach<LSP::Hover, LSP::SignatureHelp, LSP::CompletionList, LSP::LocationsList, LSP::DocumentFormattingList,
+               LSP::WorkspaceEdit, LSP::CodeActionList, LSP::JsonResult, LSP::DocumentHighlightList,
+               LSP::FoldingRangeList, LSP::SelectionRangeList, LSP::InlayHintList, LSP::PrepareRenameResult,
+               LSP::ResolvedCompletionItem, LSP::CallHierarchyItemList, LSP::CallHierarchyIncomingCallList,
+               LSP::CallHierarchyOutgoingCallList>(reader);
 }
 
 }  // namespace fuzz

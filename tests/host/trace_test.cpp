@@ -32,19 +32,7 @@ void DrainQueue() {
 TEST(TraceEvent, DetailFollowsMessageAfterOneLineFeedOnlyWhenNotEmpty) {
   EXPECT_EQ(xTraceEvent(TraceType::Line, "Error", "boom", nullptr).text, "boom");
   EXPECT_EQ(xTraceEvent(TraceType::Line, "Error", "boom", "").text, "boom");
-  xTraceEvent full(TraceType::Notice, "task", "boom", "why");
-  EXPECT_EQ(full.text, "boom\nwhy");
-  EXPECT_EQ(full.title, "task");
-  EXPECT_EQ(full.type, TraceType::Notice);
-  EXPECT_TRUE(full.context.empty());
-}
-
-TEST(TraceEvent, LevelNamesAreTheProtocolTraceValues) {
-  EXPECT_EQ(TraceToString(LSP::TraceLevel::Off), "off");
-  EXPECT_EQ(TraceToString(LSP::TraceLevel::Messages), "messages");
-  EXPECT_EQ(TraceToString(LSP::TraceLevel::Verbose), "verbose");
-  EXPECT_EQ(TraceToString(static_cast<LSP::TraceLevel>(3)), "");
-  EXPECT_EQ(TraceToString(static_cast<LSP::TraceLevel>(-1)), "");
+  EXPECT_EQ(xTraceEvent(TraceType::Notice, "task", "boom", "why").text, "boom\nwhy");
 }
 
 TEST(TraceQueue, KeepsEveryWritersOrderUnderConcurrentWriters) {
@@ -69,28 +57,29 @@ TEST(TraceQueue, KeepsEveryWritersOrderUnderConcurrentWriters) {
   }
   for (std::thread& writer : writers) writer.join();
   EXPECT_TRUE(xTraceEvent::queue().Empty());
-}
-
-TEST(TraceQueue, WaitingPopWakesForALateWriterAndTimesOutOnSilence) {
-  DrainQueue();
+  // Silence times out; the untimed wait wakes for a late writer.
   xTraceEvent event;
   EXPECT_FALSE(xTraceEvent::queue().WaitPop(event, std::chrono::milliseconds(1)));
-  std::thread writer([] { xTraceEvent::Write(TraceType::Line, "Message", "late", nullptr); });
-  event = xTraceEvent::queue().WaitPop();
-  EXPECT_EQ(event.text, "late");
-  writer.join();
+  std::thread late([] { xTraceEvent::Write(TraceType::Line, "Message", "late", nullptr); });
+  EXPECT_EQ(xTraceEvent::queue().WaitPop().text, "late");
+  late.join();
 }
 
+// Each level by its protocol name, and the titles it lets through.
 TEST(Tracer, TitlesFollowTheLevelRules) {
   struct Case {
     LSP::TraceLevel level;
+    const char* name;
     std::vector<std::string> titles;
   } cases[] = {
-      {LSP::TraceLevel::Off, {"Error"}},
-      {LSP::TraceLevel::Messages, {"Message", "Error"}},
-      {LSP::TraceLevel::Verbose, {"Verbose", "Message", "Error"}},
+      {LSP::TraceLevel::Off, "off", {"Error"}},
+      {LSP::TraceLevel::Messages, "messages", {"Message", "Error"}},
+      {LSP::TraceLevel::Verbose, "verbose", {"Verbose", "Message", "Error"}},
   };
+  EXPECT_EQ(TraceToString(static_cast<LSP::TraceLevel>(3)), "");
+  EXPECT_EQ(TraceToString(static_cast<LSP::TraceLevel>(-1)), "");
   for (const Case& c : cases) {
+    EXPECT_EQ(TraceToString(c.level), c.name);
     lines.clear();
     vexil::Tracer tracer(Record, c.level);
     tracer.Verbose("v %d\n", 1);

@@ -3,58 +3,64 @@
 // the bounds on what an abusive stream can make them hold.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <string>
 #include <vector>
 
 #include "transport/frame_parser.h"
+#include "vexil_test/support.h"
 
 namespace {
 
 using Bodies = std::vector<std::string>;
+using vexil::FrameParser;
+using vexil_test::Frame;
 
-std::string Frame(const std::string& body) {
-  return "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
+// `bytes` fed in pieces of `chunk` (whole when 0) through `feed`.
+template <typename Feed>
+void FeedAll(const std::string& bytes, std::size_t chunk, Feed feed) {
+  if (chunk == 0) chunk = bytes.size();
+  for (std::size_t at = 0; at < bytes.size(); at += chunk) feed(bytes.data() + at, std::min(chunk, bytes.size() - at));
 }
 
-Bodies FeedAll(vexil::FrameParser& parser, const std::string& bytes, std::size_t chunk) {
-  Bodies bodies;
-  for (std::size_t at = 0; at < bytes.size(); at += chunk) {
-    parser.Feed(bytes.data() + at, std::min(chunk, bytes.size() - at), bodies);
-  }
-  return bodies;
-}
-
-std::vector<std::string> Lines(const std::string& bytes) {
-  vexil::LineSplitter splitter;
-  std::vector<std::string> lines;
-  splitter.Feed(bytes.data(), bytes.size(), lines);
-  return lines;
+// Sizes rather than megabytes of text when a big row fails.
+std::string Shown(const Bodies& bodies) {
+  std::string shown;
+  for (const std::string& body : bodies) shown += std::to_string(body.size()) + ":" + body.substr(0, 40) + " ";
+  return shown;
 }
 
 TEST(FrameParser, FramesSplitAtEveryBytePositionComeOutWhole) {
   const std::string stream = Frame(R"({"id":1})") + Frame(R"({"id":22,"result":"Content-Length: 3"})");
   const Bodies expected = {R"({"id":1})", R"({"id":22,"result":"Content-Length: 3"})"};
   for (std::size_t cut = 1; cut < stream.size(); ++cut) {
-    vexil::FrameParser parser;
+    FrameParser parser;
     Bodies bodies;
     parser.Feed(stream.data(), cut, bodies);
     parser.Feed(stream.data() + cut, stream.size() - cut, bodies);
     EXPECT_EQ(bodies, expected) << "cut at " << cut;
   }
-  vexil::FrameParser parser;
-  EXPECT_EQ(FeedAll(parser, stream, 1), expected);
 }
 
-// One stream fed whole: the bodies it yields and, where given, the stray output then held
-// (taken once: a second take is empty).
-TEST(FrameParser, HeadersQuirksAndStrayBytesOfAWholeStream) {
+// One stream fed whole or in pieces: the bodies it yields, the stray output then held
+// (taken once: a second take is empty) or only its newest bytes when it outgrew its
+// bound, and at most how much the parser held meanwhile.
+TEST(FrameParser, HeadersQuirksStrayBytesAndBounds) {
   const std::string broken = "Content-Length: 1073741825\r\n\r\nab";
+  std::string big(16u << 20, 'x');
+  big.front() = '{';
+  big.back() = '}';
+  const std::size_t pipe = 65536, bound = 8 * FrameParser::kOutputLimit;
   const struct Row {
     const char* why;
     std::string stream;
     Bodies bodies;
-    const char* output;
+    const char* output;        // exact; null: not checked
+    std::size_t chunk = 0;     // whole when 0
+    std::string newest = "";   // the output is the bound's worth ending with this
+    std::size_t held = 0;      // the most the parser may hold; 0: not checked
   } rows[] = {
+      {"frames fed byte by byte", Frame("{}") + Frame(R"({"id":1})"), {"{}", R"({"id":1})"}, "", 1},
       {"header name in any case", "content-LENGTH: 2\r\n\r\nab", {"ab"}, ""},
       {"extra header lines",
        "Content-Length: 5\r\nContent-Type: application/vscode-jsonrpc; charset=utf-8\r\n\r\nhello", {"hello"}, ""},
@@ -67,96 +73,62 @@ TEST(FrameParser, HeadersQuirksAndStrayBytesOfAWholeStream) {
       // The frame says 4 but only 3 bytes count: it completes with the next byte.
       {"byte FF is dropped and not counted", "Content-Length: 4\r\n\r\na\xFF" "bcd", {"abcd"}, nullptr},
       {"byte FF leaves the frame short", "Content-Length: 4\r\n\r\na\xFF" "bc", {}, nullptr},
+      {"one gibibyte is believed and waits for its body", "Content-Length: 1073741824\r\n\r\nab", {},
+       "Content-Length: ", 1},
       {"above one gibibyte the header is stray output", broken, {}, broken.c_str()},
+      {"and so it is byte by byte", broken, {}, broken.c_str(), 1},
       {"and the next frame is found", broken + Frame("{}"), {"{}"}, nullptr},
       {"a length that wraps a 32-bit count to 2 takes nothing", "Content-Length: 4294967298\r\n\r\nab" + Frame("{}"),
        {"{}"}, nullptr},
+      {"a 16 MiB body in pipe-sized chunks", Frame(big) + Frame("{}"), {big, "{}"}, "", pipe},
+      {"stray output keeps its newest mebibyte", std::string(3u << 20, 'n') + "the newest", {}, nullptr, pipe,
+       "the newest", bound},
+      {"framing goes on after it", std::string(5u << 20, 'n') + Frame("{}"), {"{}"}, "", pipe},
+      // Leading zeros are digits like any other: they are kept, but only the newest of them.
+      {"leading zeros keep their newest digits", "Content-Length: " + std::string(5u << 20, '0') + "2000000000", {},
+       nullptr, pipe, "2000000000", bound},
+      {"a length of zero keeps nothing it swallows", "Content-Length: 0\r\n\r\n" + std::string(32u << 20, 'x') + Frame("{}"),
+       {}, nullptr, pipe, "", 1024},
   };
   for (const Row& row : rows) {
-    vexil::FrameParser parser;
-    EXPECT_EQ(FeedAll(parser, row.stream, row.stream.size()), row.bodies) << row.why;
+    SCOPED_TRACE(row.why);
+    FrameParser parser;
+    Bodies bodies;
+    FeedAll(row.stream, row.chunk, [&](const char* data, std::size_t size) { parser.Feed(data, size, bodies); });
+    EXPECT_TRUE(bodies == row.bodies) << Shown(bodies);
+    if (row.held) { EXPECT_LE(parser.HeldBytes(), row.held); }
     const std::string output = parser.TakeOutput();
-    EXPECT_TRUE(!row.output || output == row.output) << row.why << ": " << output;
-    EXPECT_EQ(parser.TakeOutput(), "") << row.why;
+    if (row.output) { EXPECT_EQ(output, row.output); }
+    if (!row.newest.empty()) {
+      EXPECT_EQ(output.size(), FrameParser::kOutputLimit);
+      EXPECT_EQ(output.substr(output.size() - row.newest.size()), row.newest);
+    }
+    EXPECT_EQ(parser.TakeOutput(), "");
   }
 }
 
-TEST(FrameParser, SixteenMebibyteBodyInPipeSizedChunks) {
-  std::string body(16u << 20, 'x');
-  body.front() = '{';
-  body.back() = '}';
-  vexil::FrameParser parser;
-  Bodies bodies = FeedAll(parser, Frame(body) + Frame("{}"), 65536);
-  ASSERT_EQ(bodies.size(), 2u);
-  EXPECT_TRUE(bodies[0] == body);
-  EXPECT_EQ(bodies[1], "{}");
-}
-
-TEST(FrameParser, StrayOutputKeepsItsNewestMebibyte) {
-  vexil::FrameParser parser;
-  const std::string tail = "the newest stray bytes";
-  Bodies bodies = FeedAll(parser, std::string(3u << 20, 'n') + tail, 65536);
-  EXPECT_TRUE(bodies.empty());
-  EXPECT_LE(parser.HeldBytes(), 8 * vexil::FrameParser::kOutputLimit);
-  std::string output = parser.TakeOutput();
-  EXPECT_EQ(output.size(), vexil::FrameParser::kOutputLimit);
-  EXPECT_EQ(output.substr(output.size() - tail.size()), tail);
-
-  // Framing goes on as before.
-  EXPECT_EQ(FeedAll(parser, std::string(5u << 20, 'n') + Frame("{}"), 65536), Bodies{"{}"});
-  EXPECT_EQ(parser.TakeOutput(), "");
-}
-
-TEST(FrameParser, LengthsAboveOneGibibyteAreBrokenHeaders) {
-  // Just below the bound the frame is believed and waits for its body.
-  vexil::FrameParser believed;
-  EXPECT_TRUE(FeedAll(believed, "Content-Length: 1073741824\r\n\r\nab", 1).empty());
-  EXPECT_EQ(believed.TakeOutput(), "Content-Length: ");
-
-  // Above it the header stays stray output, fed byte by byte as well as whole.
-  const std::string broken = "Content-Length: 1073741825\r\n\r\nab";
-  vexil::FrameParser parser;
-  EXPECT_TRUE(FeedAll(parser, broken, 1).empty());
-  EXPECT_EQ(parser.TakeOutput(), broken);
-  // Leading zeros are digits like any other: they are kept, but only the newest of them.
-  vexil::FrameParser zeros;
-  FeedAll(zeros, "Content-Length: " + std::string(5u << 20, '0') + "2000000000", 65536);
-  EXPECT_LE(zeros.HeldBytes(), 8 * vexil::FrameParser::kOutputLimit);
-  std::string output = zeros.TakeOutput();
-  EXPECT_EQ(output.size(), vexil::FrameParser::kOutputLimit);
-  EXPECT_EQ(output.substr(output.size() - 10), "2000000000");
-}
-
-TEST(FrameParser, ALengthOfZeroKeepsNothingOfWhatItSwallows) {
-  vexil::FrameParser parser;
-  EXPECT_TRUE(FeedAll(parser, "Content-Length: 0\r\n\r\n" + std::string(32u << 20, 'x') + Frame("{}"), 65536).empty());
-  EXPECT_LT(parser.HeldBytes(), 1024u);
-}
-
-TEST(LineSplitter, CarriageReturnLineFeedAndBoth) {
-  EXPECT_EQ(Lines("w\r\nx\ny\rz\n"), (std::vector<std::string>{"w", "x", "y", "z"}));
-  EXPECT_EQ(Lines("\n\r\n"), (std::vector<std::string>{"", ""}));
-  EXPECT_EQ(Lines("a\xFF" "b\nunfinished"), std::vector<std::string>{"ab"});
-
-  // A CR LF pair split across two reads is still one line end.
-  vexil::LineSplitter splitter;
-  std::vector<std::string> lines;
-  splitter.Feed("one\r", 4, lines);
-  splitter.Feed("\ntwo\n", 5, lines);
-  EXPECT_EQ(lines, (std::vector<std::string>{"one", "two"}));
-}
-
-TEST(LineSplitter, LongLinesAreCutAtSixtyFourKibibytes) {
-  std::string head(vexil::LineSplitter::kLineLimit, 'h');
-  std::string stream = head + std::string(200000, 't') + "\nnext\r\n";
-  vexil::LineSplitter splitter;
-  std::vector<std::string> lines;
-  for (std::size_t at = 0; at < stream.size(); at += 4096) {
-    splitter.Feed(stream.data() + at, std::min<std::size_t>(4096, stream.size() - at), lines);
+// Line ends of every kind, a CR LF pair split between two reads, byte 0xFF dropped, an
+// unfinished line held back, and lines cut at the bound.
+TEST(LineSplitter, LineEndsAndLongLines) {
+  const std::string head(vexil::LineSplitter::kLineLimit, 'h');
+  const struct Row {
+    const char* why;
+    std::string stream;
+    std::size_t chunk;
+    std::vector<std::string> lines;
+  } rows[] = {
+      {"CR LF, LF and CR", "w\r\nx\ny\rz\n", 0, {"w", "x", "y", "z"}},
+      {"empty lines", "\n\r\n", 0, {"", ""}},
+      {"byte FF and an unfinished line", "a\xFF" "b\nunfinished", 0, {"ab"}},
+      {"CR LF split between reads", "one\r\ntwo\n", 4, {"one", "two"}},
+      {"cut at 64 KiB", head + std::string(200000, 't') + "\nnext\r\n", 4096, {head, "next"}},
+  };
+  for (const Row& row : rows) {
+    vexil::LineSplitter splitter;
+    std::vector<std::string> lines;
+    FeedAll(row.stream, row.chunk, [&](const char* data, std::size_t size) { splitter.Feed(data, size, lines); });
+    EXPECT_TRUE(lines == row.lines) << row.why << ": " << Shown(lines);
   }
-  ASSERT_EQ(lines.size(), 2u);
-  EXPECT_TRUE(lines[0] == head) << lines[0].size();
-  EXPECT_EQ(lines[1], "next");
 }
 
 }  // namespace

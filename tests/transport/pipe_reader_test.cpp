@@ -1,6 +1,6 @@
-// The readers over real pipes: queueing, end of file, stopping while the writer stays
-// silent, the dispatch hook, the error reader's lines, one big body, and the bounds on
-// what their queues hold while nobody takes from them.
+// The readers over real pipes and the queue behind them: queueing, end of file, stopping
+// while the writer stays silent, the dispatch hook, the error reader's lines, one big
+// body, bounded writes, and the bounds on what the queues hold while nobody takes.
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -9,6 +9,7 @@
 #include <thread>
 #include <vector>
 
+#include "transport/message_queue.h"
 #include "transport/pipe_io.h"
 #include "transport/pipe_reader.h"
 #include "transport/reader_thread.h"
@@ -18,10 +19,7 @@ namespace {
 
 using namespace std::chrono_literals;
 using vexil::MessageQueue;
-
-std::string Frame(const std::string& body) {
-  return "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
-}
+using vexil_test::Frame;
 
 void Send(const Poco::Pipe& pipe, const std::string& bytes) {
   ASSERT_EQ(vexil::WriteAll(pipe, bytes.data(), bytes.size(), std::chrono::steady_clock::now() + 60s), vexil::PipeWrite::Written);
@@ -35,6 +33,13 @@ struct RunningReader {
     thread.Start(reader);
   }
   ~RunningReader() { reader.Stop(); }
+  // Writes `bytes` (the reader drains the pipe meanwhile), closes the pipe and waits
+  // until the reader has taken all of it.
+  void SendAndClose(const std::string& bytes) {
+    Send(pipe, bytes);
+    pipe.close(Poco::Pipe::CLOSE_WRITE);
+    thread.Join();
+  }
 
   Poco::Pipe pipe;
   Reader reader;
@@ -47,35 +52,43 @@ std::string Pop(vexil::xPipeReader& reader) {
   return item;
 }
 
-TEST(PipeReader, QueuesBodiesInOrderAndFinishesAtEndOfFile) {
-  RunningReader<vexil::xPipeReader> running("stdout");
-  Poco::Pipe& pipe = running.pipe;
-  vexil::xPipeReader& reader = running.reader;
-  Send(pipe, "banner\n" + Frame(R"({"id":1})") + Frame(R"({"id":2})"));
-  EXPECT_EQ(Pop(reader), R"({"id":1})");
-  EXPECT_EQ(Pop(reader), R"({"id":2})");
-
-  Send(pipe, "stray " + std::string("Content-Length: 10\r\n\r\n{\"id\""));
-  pipe.close(Poco::Pipe::CLOSE_WRITE);
+// The last item in the queue, which must be the newest one sent.
+std::string Newest(MessageQueue& queue) {
   std::string item;
-  EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);  // half a body is dropped
-  running.thread.Join();
-  EXPECT_EQ(reader.TakeOutput(), "stray Content-Length: ");
-  EXPECT_EQ(reader.Errors(), "");
+  while (queue.TryPop(item) && queue.Size() > 0) {
+  }
+  return item;
+}
+
+TEST(PipeReader, QueuesBodiesInOrderWhateverTheirSizeAndFinishesAtEndOfFile) {
+  RunningReader<vexil::xPipeReader> running("stdout");
+  const std::string big = "\"" + std::string(16u << 20, 'y') + "\"";
+  std::thread writer([&] {
+    // Half a body at the end is dropped; the stray bytes before it are output.
+    running.SendAndClose("banner\n" + Frame(R"({"id":1})") + Frame(big) + Frame("{}") + "stray " +
+                         "Content-Length: 10\r\n\r\n{\"id\"");
+  });
+  EXPECT_EQ(Pop(running.reader), R"({"id":1})");
+  const std::string first = Pop(running.reader);
+  EXPECT_TRUE(first == big) << "got " << first.size() << " bytes";
+  EXPECT_EQ(Pop(running.reader), "{}");
+  std::string item;
+  EXPECT_EQ(running.reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);
+  writer.join();
+  EXPECT_EQ(running.reader.TakeOutput(), "stray Content-Length: ");
+  EXPECT_EQ(running.reader.Errors(), "");
 }
 
 TEST(PipeReader, StopEndsAReaderWhoseWriterStaysOpenAndSilent) {
   RunningReader<vexil::xPipeReader> running("stdout");
-  Poco::Pipe& pipe = running.pipe;
-  vexil::xPipeReader& reader = running.reader;
-  Send(pipe, "ready");  // once it is taken, the reader is in its loop
-  ASSERT_TRUE(transport_test::WaitFor([&] { return reader.TakeOutput() == "ready"; }));
+  Send(running.pipe, "ready");  // once it is taken, the reader is in its loop
+  ASSERT_TRUE(transport_test::WaitFor([&] { return running.reader.TakeOutput() == "ready"; }));
   auto stopped = std::chrono::steady_clock::now();
-  reader.Stop();
+  running.reader.Stop();
   running.thread.Join();  // a blocking read would hang here for good
   EXPECT_LT(std::chrono::steady_clock::now() - stopped, 2s);
   std::string item;
-  EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);
+  EXPECT_EQ(running.reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);
 }
 
 TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
@@ -97,9 +110,8 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
   for (const std::string& body : bodies) Send(pipe, Frame(body));
   for (const std::string& body : bodies) EXPECT_EQ(Pop(reader), body);
   // A failing hook is recorded as a read error; the record keeps its newest lines.
-  const std::string failing = Frame(R"({"jsonrpc":"2.0","method":"fake/fail"})");
   std::string failures;
-  for (int i = 0; i < 1000; ++i) failures += failing;
+  for (int i = 0; i < 1000; ++i) failures += Frame(R"({"jsonrpc":"2.0","method":"fake/fail"})");
   Send(pipe, failures);
   pipe.close(Poco::Pipe::CLOSE_WRITE);
   thread.Join();
@@ -114,52 +126,18 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
 
 TEST(PipeReader, ErrorReaderQueuesLinesAndKeepsNoOutput) {
   RunningReader<vexil::xPipeErrReader> running;
-  Poco::Pipe& pipe = running.pipe;
-  vexil::xPipeErrReader& reader = running.reader;
-  EXPECT_EQ(reader.Name(), "strderr");
-  Send(pipe, "w\r\nx\ny\rz\nlast");
-  pipe.close(Poco::Pipe::CLOSE_WRITE);
-  running.thread.Join();
-  for (const char* line : {"w", "x", "y", "z"}) EXPECT_EQ(Pop(reader), line);
-  EXPECT_EQ(reader.Messages().Size(), 0u);  // the unfinished line is dropped
-  EXPECT_EQ(reader.TakeOutput(), "");
-}
-
-TEST(PipeReader, SixteenMebibyteBodyThroughAPipe) {
-  RunningReader<vexil::xPipeReader> running("stdout");
-  Poco::Pipe& pipe = running.pipe;
-  vexil::xPipeReader& reader = running.reader;
-  std::string body = "\"" + std::string(16u << 20, 'y') + "\"";
-  std::thread writer([&] { Send(pipe, Frame(body) + Frame("{}")); });
-  std::string first = Pop(reader);
-  EXPECT_TRUE(first == body) << "got " << first.size() << " bytes";
-  EXPECT_EQ(Pop(reader), "{}");
-  writer.join();
-}
-
-// Writes `bytes` (the reader drains the pipe meanwhile), closes the pipe and waits until
-// the reader has taken all of it.
-template <typename Running>
-void Flood(Running& running, const std::string& bytes) {
-  Send(running.pipe, bytes);
-  running.pipe.close(Poco::Pipe::CLOSE_WRITE);
-  running.thread.Join();
-}
-
-// The last item in the queue, which must be the newest one sent.
-std::string Newest(MessageQueue& queue) {
-  std::string item;
-  while (queue.TryPop(item) && queue.Size() > 0) {
-  }
-  return item;
+  EXPECT_EQ(running.reader.Name(), "strderr");
+  running.SendAndClose("w\r\nx\ny\rz\nlast");
+  for (const char* line : {"w", "x", "y", "z"}) EXPECT_EQ(Pop(running.reader), line);
+  EXPECT_EQ(running.reader.Messages().Size(), 0u);  // the unfinished line is dropped
+  EXPECT_EQ(running.reader.TakeOutput(), "");
 }
 
 TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
   RunningReader<vexil::xPipeErrReader> err;
   std::string lines;
   for (int i = 0; lines.size() < 40u << 20; ++i) lines += "I[10:00:00.000] log line " + std::to_string(i) + std::string(60, '.') + "\n";
-  lines += "last line\n";
-  Flood(err, lines);
+  err.SendAndClose(lines + "last line\n");
   EXPECT_LE(err.reader.Messages().Bytes(), vexil::xPipeErrReader::kQueueLimit);
   EXPECT_GT(err.reader.Messages().Bytes(), vexil::xPipeErrReader::kQueueLimit / 2);
   EXPECT_EQ(Newest(err.reader.Messages()), "last line");
@@ -169,11 +147,38 @@ TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
                                          std::string(1000, 'p') + R"("}})");
   std::string frames;
   while (frames.size() < 100u << 20) frames += notification;
-  frames += Frame(R"({"id":1})");
-  Flood(out, frames);
+  out.SendAndClose(frames + Frame(R"({"id":1})"));
   EXPECT_LE(out.reader.Messages().Bytes(), vexil::xPipeReader::kQueueLimit);
   EXPECT_GT(out.reader.Messages().Bytes(), vexil::xPipeReader::kQueueLimit / 2);
   EXPECT_EQ(Newest(out.reader.Messages()), R"({"id":1})");
+}
+
+// The oldest items give way to the newest, the count stays right as items are taken, and
+// a lone item larger than the bound is still delivered.
+TEST(MessageQueue, KeepsTheNewestItemsWithinItsLimit) {
+  constexpr std::size_t kLimit = 10000;
+  constexpr int kPushed = 1000;
+  auto item = [](int index) { return "item " + std::to_string(index) + std::string(100, '.'); };
+  MessageQueue queue(kLimit);
+  for (int i = 0; i < kPushed; ++i) queue.Push(item(i));
+  const std::size_t kept = queue.Size();
+  ASSERT_GT(kept, 10u);
+  ASSERT_LT(kept, 100u);
+  EXPECT_LE(queue.Bytes(), kLimit);
+  EXPECT_GT(queue.Bytes() + MessageQueue::Footprint(item(kPushed)), kLimit);  // full, not merely shrunk
+  std::string taken;
+  for (std::size_t i = kPushed - kept; i < kPushed; ++i) {
+    ASSERT_TRUE(queue.TryPop(taken));
+    EXPECT_EQ(taken, item(static_cast<int>(i)));
+  }
+  EXPECT_EQ(queue.Bytes(), 0u);
+
+  queue.Push(item(1));
+  const std::string huge(3 * kLimit, 'h');
+  queue.Push(huge);
+  EXPECT_EQ(queue.Size(), 1u);
+  ASSERT_TRUE(queue.TryPop(taken));
+  EXPECT_TRUE(taken == huge);
 }
 
 TEST(PipeIo, BoundedWritesEndByTheirCauseWithoutSignallingTheProcess) {

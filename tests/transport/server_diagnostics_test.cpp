@@ -25,18 +25,14 @@ bool ReachesVersion(vexil::xServer& server, int version) {
   return WaitFor([&] { return server.Diagnostics().Version() == version; }, 60s);
 }
 
-class ServerDiagnostics : public ::testing::Test {
- protected:
-  void SetUp() override { TraceLog::Clear(); }
-};
+using ServerDiagnostics = FakeServerTest;
 
 TEST_F(ServerDiagnostics, IdlePublicationsAreStoredAndStillQueuedAsIgnoredReplies) {
-  vexil::xServer server(FakeStart({}, 2000, LSP::TraceLevel::Messages));
-  ASSERT_TRUE(server.Start());
-  Publish(server, R"({"documents":2,"count":4})");
-  ASSERT_TRUE(ReachesVersion(server, 4));
+  auto server = Started();
+  Publish(*server, R"({"documents":2,"count":4})");
+  ASSERT_TRUE(ReachesVersion(*server, 4));
 
-  auto second = server.Diagnostics().Of(Doc(1));
+  auto second = server->Diagnostics().Of(Doc(1));
   ASSERT_EQ(second.size(), 1u);
   EXPECT_EQ(second[0].message, "pass 1");
   EXPECT_EQ(second[0].range.start.line, 1);
@@ -44,69 +40,62 @@ TEST_F(ServerDiagnostics, IdlePublicationsAreStoredAndStillQueuedAsIgnoredReplie
   EXPECT_EQ(second[0].code, -1);
   EXPECT_EQ(second[0].codeText, "fake1");
   EXPECT_EQ(second[0].source, "fake");
-  EXPECT_TRUE(server.Diagnostics().Of("file:///fake/never.cpp").empty());
+  EXPECT_TRUE(server->Diagnostics().Of("file:///fake/never.cpp").empty());
 
   // The queue is untouched: the next request still passes over the four publications.
-  TextResult result;
-  Ask(server, "fake/echo", "", result);
-  EXPECT_TRUE(result.read);
+  EXPECT_TRUE(Ask(*server, "fake/echo").read);
   int ignored = 0;
   for (const std::string& text : TraceLog::Texts("Message")) {
     ignored += text.rfind("Ignoring Reply: ", 0) == 0 && text.find("publishDiagnostics") != std::string::npos;
   }
   EXPECT_EQ(ignored, 4);
 
-  Publish(server, R"({"documents":2,"count":2,"empty":true})");
-  ASSERT_TRUE(ReachesVersion(server, 6));
-  EXPECT_TRUE(server.Diagnostics().Of(Doc(0)).empty());
-  EXPECT_TRUE(server.Diagnostics().Of(Doc(1)).empty());
+  Publish(*server, R"({"documents":2,"count":2,"empty":true})");
+  ASSERT_TRUE(ReachesVersion(*server, 6));
+  EXPECT_TRUE(server->Diagnostics().Of(Doc(0)).empty());
+  EXPECT_TRUE(server->Diagnostics().Of(Doc(1)).empty());
 }
 
 TEST_F(ServerDiagnostics, ABurstKeepsOnlyTheNewestListOfEachDocument) {
-  vexil::xServer server(FakeStart({}, 2000, LSP::TraceLevel::Off));
-  ASSERT_TRUE(server.Start());
-  Publish(server, R"({"documents":1000,"count":10000})");
-  ASSERT_TRUE(ReachesVersion(server, 10000));
+  auto server = Started(2000, LSP::TraceLevel::Off);
+  Publish(*server, R"({"documents":1000,"count":10000})");
+  ASSERT_TRUE(ReachesVersion(*server, 10000));
   for (int document = 0; document < 1000; ++document) {
-    auto diagnostics = server.Diagnostics().Of(Doc(document));
+    auto diagnostics = server->Diagnostics().Of(Doc(document));
     ASSERT_EQ(diagnostics.size(), 1u) << Doc(document);
     EXPECT_EQ(diagnostics[0].message, "pass 9") << Doc(document);
   }
 }
 
 TEST_F(ServerDiagnostics, PastTheLimitTheDocumentsLongestWithoutAPublicationAreDropped) {
-  vexil::xServer server(FakeStart({}, 2000, LSP::TraceLevel::Messages));
-  ASSERT_TRUE(server.Start());
+  auto server = Started();
   const std::string twelveMiB = R"(,"count":1,"padding":12582912})";
-  Publish(server, R"({"documents":2,"count":2,"padding":12582912})");
-  Publish(server, R"({"from":0)" + twelveMiB);  // the first document is the newest again
-  Publish(server, R"({"from":2)" + twelveMiB);  // 36 MiB: the second one gives way
-  ASSERT_TRUE(ReachesVersion(server, 4));
-  EXPECT_TRUE(server.Diagnostics().Of(Doc(1)).empty());
-  EXPECT_EQ(server.Diagnostics().Of(Doc(0)).size(), 1u);
-  EXPECT_EQ(server.Diagnostics().Of(Doc(2)).size(), 1u);
-  EXPECT_LE(server.Diagnostics().Bytes(), vexil::DiagnosticsStore::kByteLimit);
-  Publish(server, R"({"count":0})");  // the reader's lines are traced by the host's next exchange
+  Publish(*server, R"({"documents":2,"count":2,"padding":12582912})");
+  Publish(*server, R"({"from":0)" + twelveMiB);  // the first document is the newest again
+  Publish(*server, R"({"from":2)" + twelveMiB);  // 36 MiB: the second one gives way
+  ASSERT_TRUE(ReachesVersion(*server, 4));
+  EXPECT_TRUE(server->Diagnostics().Of(Doc(1)).empty());
+  EXPECT_EQ(server->Diagnostics().Of(Doc(0)).size(), 1u);
+  EXPECT_EQ(server->Diagnostics().Of(Doc(2)).size(), 1u);
+  EXPECT_LE(server->Diagnostics().Bytes(), vexil::DiagnosticsStore::kByteLimit);
+  Publish(*server, R"({"count":0})");  // the reader's lines are traced by the host's next exchange
   EXPECT_EQ(TraceLog::Count("Diagnostics Dropped: " + Doc(1) + "\n"), 1);
   EXPECT_FALSE(TraceLog::Contains("Diagnostics Dropped: " + Doc(0)));
 }
 
 TEST_F(ServerDiagnostics, AMalformedPublicationIsDroppedWithoutFailingTheReader) {
-  vexil::xServer server(FakeStart({}, 2000, LSP::TraceLevel::Messages));
-  ASSERT_TRUE(server.Start());
+  auto server = Started();
   std::string bad = R"({"jsonrpc":"2.0","method":"textDocument/publishDiagnostics","params":{"uri":"file:///b.cpp","diagnostics":{}}})";
   std::string garbage = "Content-Length: " + std::to_string(bad.size()) + "\\r\\n\\r\\n" + bad;
   std::string escaped;
   for (char c : garbage) escaped += c == '"' ? std::string("\\\"") : std::string(1, c);
 
-  TextResult result;
-  Ask(server, "fake/echo", "{\"garbage\":\"" + escaped + "\"}", result);
-  EXPECT_TRUE(result.read);
-  EXPECT_EQ(server.Diagnostics().Version(), 0);
+  EXPECT_TRUE(Ask(*server, "fake/echo", "{\"garbage\":\"" + escaped + "\"}").read);
+  EXPECT_EQ(server->Diagnostics().Version(), 0);
   EXPECT_EQ(TraceLog::Count("Diagnostics Error: Expecting a array JSON object but found 3 JSON object .\n"), 1);
 
   TraceLog::Clear();
-  Ask(server, "fake/echo", "", result);
+  Ask(*server, "fake/echo");
   EXPECT_FALSE(TraceLog::Contains("Write Error"));
 }
 

@@ -22,7 +22,7 @@ std::string CurrentDirectory() {
 TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheTimeout) {
   xServerStart start = FakeStart({"", "ignored-by-sh"}, 0);
   start.useCommand = true;
-  start.executable = std::string("'") + VEXIL_FAKE_SERVER + "' 'stderr=hello world\\n'";
+  start.executable = std::string("'") + VEXIL_FAKE_SERVER + "' 'stderr=hello world\\r\\nsecond\\n'";
   vexil::xServer server(start);
   EXPECT_EQ(server.Id(), -1);
   ASSERT_TRUE(server.Start());
@@ -35,16 +35,39 @@ TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheT
   EXPECT_TRUE(server.Start());  // already running: nothing happens
   EXPECT_TRUE(TraceLog::Lines().empty());
 
-  EXPECT_TRUE(ErrorLineArrives(server, "hello world"));  // standard error, at verbose level
+  // Standard error, at verbose level, a line a trace line whatever its line end.
+  EXPECT_TRUE(ErrorLineArrives(server, "second"));
+  EXPECT_EQ(TraceLog::Count("Reply: hello world\n"), 1);
+}
 
-  xServerStart quiet = FakeStart();
-  quiet.timeout = -5;
-  quiet.argument1 = "";
-  vexil::xServer defaults(quiet);
-  TraceLog::Clear();
-  ASSERT_TRUE(defaults.Start());
-  EXPECT_EQ(TraceLog::Texts("Verbose")[2], "  Arguments: \n");
-  EXPECT_EQ(TraceLog::Texts("Verbose")[4], "     Timout: 200 (milliseconds)\n\n");
+// A direct launch's details with the defaults, the server's own working directory, and a
+// close that leaves a well-behaved server to end by itself.
+TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
+  const std::string before = CurrentDirectory();
+  xServerStart start = FakeStart();
+  start.timeout = -5;
+  start.directory = "/tmp";
+  int id;
+  {
+    vexil::xServer server(start);
+    ASSERT_TRUE(server.Start());
+    EXPECT_EQ(TraceLog::Texts("Verbose"), (Texts{" Executable: " VEXIL_FAKE_SERVER "\n", "  Directory: /tmp\n",
+                                                 "  Arguments: \n", "Use Command: No\n",
+                                                 "     Timout: 200 (milliseconds)\n\n"}));
+    EXPECT_EQ(CurrentDirectory(), before);
+    EXPECT_EQ(Ask(server, "fake/cwd").cwd, "/tmp");
+    id = server.Id();
+    TraceLog::Clear();
+  }
+  EXPECT_EQ(CurrentDirectory(), before);
+  EXPECT_EQ(TraceLog::Texts(), (Texts{"Closing language server.....\n", "Closing pipes.....\n",
+                                      "Waiting for threads to end....\n", "Language server close complete.\n\n"}));
+  // Its input closed, the fake ends by itself: nobody killed it. If it ended before the
+  // destructor's last look, the destructor has reaped it already.
+  int status = 0;
+  pid_t ended = 0;
+  EXPECT_TRUE(WaitFor([&] { return (ended = waitpid(id, &status, WNOHANG)) != 0; }));
+  EXPECT_TRUE(ended == -1 || (WIFEXITED(status) && WEXITSTATUS(status) == 0));
 }
 
 TEST_F(ServerStart, MissingExecutableOrDirectoryReportsInOrderWithTheHintOnce) {
@@ -86,39 +109,6 @@ TEST_F(ServerStart, ProgramsThatEndAtOnceThroughTheInterpreterOrNotAreFailedStar
   ASSERT_EQ(texts.size(), 4u);
   EXPECT_NE(texts[0].find("not found"), std::string::npos) << texts[0];
   EXPECT_EQ(Texts(texts.begin() + 1, texts.end()), (Texts{kFailedStart, kCheckDetails, kHint}));
-}
-
-TEST_F(ServerStart, WorkingDirectoryIsTheServersAndNotTheHosts) {
-  std::string before = CurrentDirectory();
-  xServerStart start = FakeStart();
-  start.directory = "/tmp";
-  {
-    vexil::xServer server(start);
-    ASSERT_TRUE(server.Start());
-    EXPECT_EQ(CurrentDirectory(), before);
-    TextResult result;
-    Ask(server, "fake/cwd", "", result);
-    EXPECT_EQ(result.cwd, "/tmp");
-  }
-  EXPECT_EQ(CurrentDirectory(), before);
-}
-
-TEST_F(ServerStart, CloseSequenceIsTracedAndLeavesAWellBehavedServerToEnd) {
-  int id;
-  {
-    vexil::xServer server(FakeStart());
-    ASSERT_TRUE(server.Start());
-    id = server.Id();
-    TraceLog::Clear();
-  }
-  EXPECT_EQ(TraceLog::Texts(), (Texts{"Closing language server.....\n", "Closing pipes.....\n",
-                                      "Waiting for threads to end....\n", "Language server close complete.\n\n"}));
-  // Its input closed, the fake ends by itself: nobody killed it. If it ended before the
-  // destructor's last look, the destructor has reaped it already.
-  int status = 0;
-  pid_t ended = 0;
-  EXPECT_TRUE(WaitFor([&] { return (ended = waitpid(id, &status, WNOHANG)) != 0; }));
-  EXPECT_TRUE(ended == -1 || (WIFEXITED(status) && WEXITSTATUS(status) == 0));
 }
 
 }  // namespace

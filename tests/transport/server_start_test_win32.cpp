@@ -37,11 +37,7 @@ std::string ReasonLine(DWORD code) {
   return "\nError Reason: " + reason + "\n";
 }
 
-std::string WorkingDirectoryOf(vexil::xServer& server) {
-  TextResult result;
-  Ask(server, "fake/cwd", "", result);
-  return result.cwd;
-}
+std::string WorkingDirectoryOf(vexil::xServer& server) { return Ask(server, "fake/cwd").cwd; }
 
 TEST_F(ServerStart, LaunchesDirectlyAndThroughCmdExeInItsOwnDirectory) {
   vexil_test::TempDirectory directory;

@@ -20,78 +20,16 @@ using namespace std::chrono_literals;
 using namespace transport_test;
 using Texts = std::vector<std::string>;
 
-class ServerTraffic : public ::testing::Test {
- protected:
-  void SetUp() override { TraceLog::Clear(); }
-
-  // A started fake server at `level`, tracing into the log.
-  std::unique_ptr<vexil::xServer> Started(int timeout = 2000, std::vector<std::string> directives = {},
-                                          LSP::TraceLevel level = LSP::TraceLevel::Messages) {
-    auto server = std::make_unique<vexil::xServer>(FakeStart(std::move(directives), timeout, level));
-    EXPECT_TRUE(server->Start());
-    TraceLog::Clear();
-    return server;
-  }
-};
+using ServerTraffic = FakeServerTest;
 
 std::string Sent(const std::string& body) {
   return "\nSent: Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body + "\n";
 }
 
-TEST_F(ServerTraffic, PromptReplyUsesNoTickAndIsTracedAsSentAndReceived) {
+// A notification is what Read(-1) waits for; numbered replies are passed over.
+TEST_F(ServerTraffic, ANotificationIsWhatAReadWithoutIdWaitsFor) {
   auto server = Started();
-  FakeParams none("");
-  LSP::RequestMessage request("fake/echo", &none);
   TextResult result;
-  LSP::ResponseMessage response(&result);
-  server->Write(request);
-  server->Read(request.id, response);
-  EXPECT_EQ(server->LastWaitTicks(), 0);
-  EXPECT_EQ(result.method, "fake/echo");
-  EXPECT_EQ(response.id, request.id);
-  EXPECT_FALSE(server->HaveErrors());
-  std::string reply = R"({"jsonrpc":"2.0","id":)" + std::to_string(request.id) +
-                      R"(,"result":{"method":"fake/echo","answers":[],"received":[]}})";
-  EXPECT_EQ(TraceLog::Texts(), (Texts{Sent(request.ToJSON()), "Reply: " + reply + "\n"}));
-}
-
-TEST_F(ServerTraffic, TimeOutsCountTicksTraceAndCancel) {
-  for (auto [timeout, ticks] : {std::pair{200, 3}, {1, 1}, {250, 3}}) {
-    auto server = Started(timeout);
-    TextResult result;
-    FakeParams none("");
-    LSP::RequestMessage request("fake/silent", &none);
-    LSP::ResponseMessage response(&result);
-    server->Write(request);
-    server->Read(request.id, response);
-    EXPECT_EQ(server->LastWaitTicks(), ticks) << "timeout " << timeout;
-    EXPECT_FALSE(result.read);
-    EXPECT_FALSE(server->HaveErrors());
-    std::string cancel = R"({"jsonrpc":"2.0","method":"$/cancelRequest","params":{"id":)" +
-                         std::to_string(request.id) + "}}";
-    EXPECT_EQ(TraceLog::Texts(), (Texts{Sent(request.ToJSON()), "Reply: Timed out waiting for reply......\n",
-                                        "Output: \n", kHint, Sent(cancel)}));
-    TraceLog::Clear();
-  }
-}
-
-TEST_F(ServerTraffic, IgnoredMessagesExtendTheCountdownByHalf) {
-  // Answering already, so that only its notifications' arrival is timed, not its start.
-  auto server = Started(30000);
-  TextResult result;
-  Ask(*server, "fake/echo", "", result);
-  server->Timeout(200);
-  TraceLog::Clear();
-  // Two notifications, then silence: the countdown goes 3, 4, 6 and six ticks run out.
-  Ask(*server, "fake/silent", R"({"notifications":2})", result);
-  EXPECT_EQ(server->LastWaitTicks(), 6);
-  Texts texts = TraceLog::Texts();
-  ASSERT_GE(texts.size(), 3u);
-  EXPECT_EQ(texts[1].rfind("Ignoring Reply: {\"jsonrpc\":\"2.0\",\"method\":\"fake/progress\"", 0), 0u);
-  EXPECT_EQ(texts[2].rfind("Ignoring Reply: {\"jsonrpc\":\"2.0\",\"method\":\"fake/progress\"", 0), 0u);
-
-  // A notification is what Read(-1) waits for; numbered replies are passed over.
-  TraceLog::Clear();
   FakeParams one(R"({"notifications":1,"stale":[7]})");
   LSP::RequestMessage request("fake/echo", &one);
   server->Write(request);
@@ -105,145 +43,134 @@ TEST_F(ServerTraffic, IgnoredMessagesExtendTheCountdownByHalf) {
   EXPECT_EQ(TraceLog::Count("Ignoring Reply: {\"jsonrpc\":\"2.0\",\"id\":7,\"result\":null}\n"), 1);
 }
 
-TEST_F(ServerTraffic, ErrorRepliesAreTakenOnlyForTheirOwnIdOrNone) {
-  auto server = Started(200);
-  TextResult result;
-  // A late error for another request is ignored; the wait then times out.
-  Ask(*server, "fake/echo", R"({"error":{"code":-32603,"message":"late","id":999}})", result);
-  EXPECT_FALSE(server->HaveErrors());
-  EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), 1);
+// What of the reply was read: nothing, only the envelope's id, or the id and the result.
+enum class Taken { Nothing, Id, Result };
 
-  for (const char* id : {"\"none\"", "\"same\""}) {
+// What the host read, its error state and its trace lines after one request to a fresh
+// fake server, whose reply the request's params script. In `traced`, "{id}" stands for the
+// request's id, "{request}" for the line sent with it, and a JSON object for a line sent.
+struct Exchange {
+  const char* name;
+  const char* method;
+  std::string params;
+  int timeout;
+  Taken taken;
+  int ticks;                // -1: not checked
+  bool errors;              // HaveErrors()
+  const char* message;      // ErrorMessage(); null: not checked
+  const char* title;        // traced is the whole trace under this title ("": all); null: each line once
+  Texts traced;
+  unsigned answers = 0;     // server requests the read reply says were answered
+  std::size_t data = 0;     // size of the data the read reply carries
+};
+
+std::string Expanded(std::string text, LSP::RequestMessage& request) {
+  if (text == "{request}") return Sent(request.ToJSON());
+  for (std::size_t at; (at = text.find("{id}")) != std::string::npos;) text.replace(at, 4, std::to_string(request.id));
+  return text.rfind("{\"", 0) == 0 ? Sent(text) : text;
+}
+
+TEST_F(ServerTraffic, RepliesTimeOutsErrorsAndServerRequests) {
+  const std::string timedOut = "Reply: Timed out waiting for reply......\n";
+  const Texts timeOut = {"{request}", timedOut, "Output: \n", kHint,
+                         R"({"jsonrpc":"2.0","method":"$/cancelRequest","params":{"id":{id}}})"};
+  const Texts readError = {"Read Error: boom\n\n", kHint};
+  const Exchange rows[] = {
+      {"a prompt reply takes no tick", "fake/echo", "", 2000, Taken::Result, 0, false, "", "",
+       {"{request}", R"(Reply: {"jsonrpc":"2.0","id":{id},"result":{"method":"fake/echo","answers":[],"received":[]}})" "\n"}},
+      {"a time-out counts ticks, traces and cancels", "fake/silent", "", 200, Taken::Nothing, 3, false, "", "", timeOut},
+      {"a time-out of 1 ms is one tick", "fake/silent", "", 1, Taken::Nothing, 1, false, "", "", timeOut},
+      {"a time-out rounds its ticks", "fake/silent", "", 250, Taken::Nothing, 3, false, "", "", timeOut},
+      {"each ignored message extends the countdown by half", "fake/silent", R"({"notifications":2})", 200, Taken::Nothing, 6,
+       false, "", nullptr,
+       {R"(Ignoring Reply: {"jsonrpc":"2.0","method":"fake/progress","params":{"left":2}})" "\n",
+        R"(Ignoring Reply: {"jsonrpc":"2.0","method":"fake/progress","params":{"left":1}})" "\n"}},
+      {"a late error for another request is ignored", "fake/echo",
+       R"({"error":{"code":-32603,"message":"late","id":999}})", 200, Taken::Nothing, -1, false, "", nullptr, {timedOut}},
+      {"an error without an id is taken", "fake/echo", R"({"error":{"code":-32603,"message":"boom","id":"none"}})",
+       2000, Taken::Nothing, 0, true, "boom", "Error", readError},
+      {"an error for this request is taken", "fake/echo", R"({"error":{"code":-32603,"message":"boom","id":"same"}})",
+       2000, Taken::Id, 0, true, "boom", "Error", readError},
+      // The server could not read the request; the envelope cannot read a null id and says so.
+      {"an error with a null id is taken", "fake/echo", R"({"error":{"code":-32700,"message":"boom","id":"null"}})",
+       2000, Taken::Nothing, 0, true, nullptr, "Error",
+       {"Error: Expecting a 'int' JSON object but found 'null' JSON object.\n\n", kHint}},
+      {"method not found is a warning that keeps its text", "fake/echo",
+       R"({"error":{"code":-32601,"message":"Unhandled method fake/echo"}})", 2000, Taken::Id, 0, false,
+       "Unhandled method fake/echo", "",
+       {"{request}", R"(Reply: {"jsonrpc":"2.0","id":{id},"error":{"code":-32601,"message":"Unhandled method fake/echo"}})" "\n",
+        "Warning: Unhandled method fake/echo\n\n"}},
+      {"an unparsable body is taken as the reply", "fake/echo", R"({"unparsable":true})", 2000, Taken::Nothing, 0, false, "",
+       nullptr, {"JSON Parse Failed:\nthis is not json\n", "Reply: this is not json\n"}},
+      {"server requests are answered and never taken as the reply", "fake/echo",
+       R"({"ask":["workspace/configuration","window/workDoneProgress/create","client/registerCapability","fake/unknown"]})",
+       2000, Taken::Result, 0, false, "", nullptr,
+       {R"(Ignoring Reply: {"jsonrpc":"2.0","id":0,"method":"workspace/configuration","params":{"items":[{"section":"a"},{"section":"b"}]}})" "\n",
+        R"({"jsonrpc":"2.0","id":0,"result":[null,null]})", R"({"jsonrpc":"2.0","id":1,"result":null})",
+        R"({"jsonrpc":"2.0","id":2,"result":null})",
+        R"({"jsonrpc":"2.0","id":3,"error":{"code":-32601,"message":"Method not found"}})"},
+       4},
+      {"a server request with the awaited id is not the reply", "fake/echo",
+       R"({"ask":["window/workDoneProgress/create"],"askSameId":true})", 2000, Taken::Result, 0, false, "", nullptr, {}, 1},
+      {"a 4 MB reply arrives whole", "fake/echo", R"({"size":4000000})", 30000, Taken::Result, -1, false, "", nullptr, {}, 0,
+       4000000},
+      {"a reply split in 7 writes after noise arrives whole", "fake/echo", R"({"split":7,"garbage":"warning: noise\n"})",
+       2000, Taken::Result, -1, false, "", nullptr, {}},
+  };
+  for (const Exchange& row : rows) {
+    SCOPED_TRACE(row.name);
+    // Answering already, so that only the reply is timed, not the server's start.
+    auto server = Started(30000);
+    Ask(*server, "fake/echo");
+    server->Timeout(row.timeout);
     TraceLog::Clear();
-    Ask(*server, "fake/echo", std::string(R"({"error":{"code":-32603,"message":"boom","id":)") + id + "}}", result);
-    EXPECT_TRUE(server->HaveErrors()) << id;
-    EXPECT_STREQ(server->ErrorMessage(), "boom");
-    EXPECT_EQ(TraceLog::Texts("Error"), (Texts{"Read Error: boom\n\n", kHint}));
+    FakeParams params(row.params);
+    LSP::RequestMessage request(row.method, &params);
+    TextResult result;
+    LSP::ResponseMessage response(&result);
+    server->Write(request);
+    server->Read(request.id, response);
+    EXPECT_EQ(response.id, row.taken == Taken::Nothing ? -1 : request.id);
+    EXPECT_EQ(result.read, row.taken == Taken::Result);
+    if (result.read) {
+      EXPECT_EQ(result.method, row.method);
+      EXPECT_EQ(result.answers, row.answers);
+      EXPECT_EQ(result.data.size(), row.data);
+    }
+    if (row.ticks >= 0) { EXPECT_EQ(server->LastWaitTicks(), row.ticks); }
+    EXPECT_EQ(server->HaveErrors(), row.errors);
+    if (row.message) { EXPECT_STREQ(server->ErrorMessage(), row.message); }
+    Texts expected;
+    for (const std::string& text : row.traced) expected.push_back(Expanded(text, request));
+    if (row.title) {
+      EXPECT_EQ(TraceLog::Texts(row.title), expected);
+    } else {
+      for (const std::string& line : expected) EXPECT_EQ(TraceLog::Count(line), 1) << line;
+    }
+    // Every write starts with a clean error state.
+    FakeParams none("");
+    LSP::NotificationMessage note("fake/note", &none);
+    server->Write(note);
+    EXPECT_STREQ(server->ErrorMessage(), "");
   }
-
-  // A null id is taken too (the server could not read the request), though the
-  // envelope cannot read a null id and says so.
-  TraceLog::Clear();
-  Ask(*server, "fake/echo", R"({"error":{"code":-32700,"message":"boom","id":"null"}})", result);
-  EXPECT_EQ(server->LastWaitTicks(), 0);
-  EXPECT_TRUE(server->HaveErrors());
-  EXPECT_EQ(TraceLog::Texts("Error"),
-            (Texts{"Error: Expecting a 'int' JSON object but found 'null' JSON object.\n\n", kHint}));
-
-  // Method not found is a warning: the error state stays clear but keeps the text.
-  TraceLog::Clear();
-  Ask(*server, "fake/echo", R"({"error":{"code":-32601,"message":"Unhandled method fake/echo"}})", result);
-  EXPECT_FALSE(server->HaveErrors());
-  EXPECT_STREQ(server->ErrorMessage(), "Unhandled method fake/echo");
-  EXPECT_EQ(TraceLog::Count("Warning: Unhandled method fake/echo\n\n"), 1);
-  EXPECT_TRUE(TraceLog::Texts("Error").empty());
-
-  // Every write starts with a clean error state.
-  FakeParams none("");
-  LSP::NotificationMessage note("fake/note", &none);
-  server->Write(note);
-  EXPECT_STREQ(server->ErrorMessage(), "");
 }
 
-TEST_F(ServerTraffic, UnparsableBodyIsTakenAsTheReplyAndLeavesTheResponseAlone) {
-  auto server = Started();
-  TextResult result;
-  LSP::ResponseMessage response = Ask(*server, "fake/echo", R"({"unparsable":true})", result);
-  EXPECT_FALSE(result.read);
-  EXPECT_EQ(response.id, -1);
-  EXPECT_FALSE(server->HaveErrors());
-  EXPECT_EQ(TraceLog::Count("JSON Parse Failed:\nthis is not json\n"), 1);
-  EXPECT_EQ(TraceLog::Count("Reply: this is not json\n"), 1);
-}
-
-TEST_F(ServerTraffic, ServerRequestsAreAnsweredAndNeverTakenAsTheReply) {
-  auto server = Started(2000, {}, LSP::TraceLevel::Messages);
-  TextResult result;
-  Ask(*server, "fake/echo",
-      R"({"ask":["workspace/configuration","window/workDoneProgress/create","client/registerCapability","fake/unknown"]})",
-      result);
-  EXPECT_EQ(result.method, "fake/echo");
-  EXPECT_EQ(result.answers, 4u);
-  EXPECT_EQ(TraceLog::Count(Sent(R"({"jsonrpc":"2.0","id":0,"result":[null,null]})")), 1);
-  EXPECT_EQ(TraceLog::Count(Sent(R"({"jsonrpc":"2.0","id":1,"result":null})")), 1);
-  EXPECT_EQ(TraceLog::Count(Sent(R"({"jsonrpc":"2.0","id":2,"result":null})")), 1);
-  EXPECT_EQ(TraceLog::Count(Sent(R"({"jsonrpc":"2.0","id":3,"error":{"code":-32601,"message":"Method not found"}})")),
-            1);
-  EXPECT_TRUE(TraceLog::Contains("Ignoring Reply: {\"jsonrpc\":\"2.0\",\"id\":0,\"method\":\"workspace/configuration\""));
-
-  // A server request that carries the awaited id is still not the reply.
-  TextResult same;
-  Ask(*server, "fake/echo", R"({"ask":["window/workDoneProgress/create"],"askSameId":true})", same);
-  EXPECT_EQ(same.method, "fake/echo");
-  EXPECT_EQ(same.answers, 1u);
-}
-
-TEST_F(ServerTraffic, StandardErrorLinesAreTracedAtVerboseLevelWhileWaiting) {
-  auto server = Started(2000, {}, LSP::TraceLevel::Verbose);
-  TextResult result;
-  Ask(*server, "fake/echo", R"({"stderr":"first\r\nsecond\n"})", result);
-  ASSERT_TRUE(ErrorLineArrives(*server, "second"));
-  EXPECT_EQ(TraceLog::Count("Reply: first\n"), 1);
-}
-
-TEST_F(ServerTraffic, BigAndSplitFramesArriveWhole) {
-  auto server = Started(30000);  // 4 MB through a sanitized build on a busy machine
-  TextResult big;
-  Ask(*server, "fake/echo", R"({"size":4000000})", big);
-  EXPECT_EQ(big.data.size(), 4000000u);
-  TextResult split;
-  Ask(*server, "fake/echo", R"({"split":7,"garbage":"warning: noise\n"})", split);
-  EXPECT_EQ(split.method, "fake/echo");
-}
-
-TEST_F(ServerTraffic, WriteAndReadAfterTheServerDied) {
-  auto server = Started();
-  TextResult result;
-  Ask(*server, "fake/echo", "", result);
-  FakeParams exitNow(R"({"code":3})");
-  LSP::NotificationMessage dummy("fake/none", &exitNow);
-  LSP::RequestMessage die("fake/exit", &exitNow);
-  server->Write(die);
-  EXPECT_TRUE(WaitFor([&] { return !server->IsRunning(); }));
-
-  TraceLog::Clear();
-  LSP::RequestMessage late("fake/echo", &exitNow);
-  server->Write(late);  // no SIGPIPE, no trace, error state untouched
-  server->Write(dummy);
-  EXPECT_TRUE(TraceLog::Lines().empty());
-  EXPECT_FALSE(server->HaveErrors());
-
-  LSP::ResponseMessage response(&result);
-  server->Read(late.id, response);
-  EXPECT_TRUE(server->HaveErrors());
-  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
-  EXPECT_EQ(TraceLog::Texts(), (Texts{"Error: A server read was requested but the server is not running.\n\n", kHint}));
-}
-
-// Kills the server once the read has passed over the notification `method` makes it send
-// first: the read is then under way, and its wait has to end with the server.
-void AskAndKillWhileAwaited(vexil::xServer& server, const char* method, const std::string& params) {
-  const int id = server.Id();
-  std::thread killer([id] {
-    WaitFor([] { return TraceLog::Contains("Ignoring Reply: "); }, 30s);
-    vexil_test::KillProcess(id);
-  });
-  TextResult result;
-  Ask(server, method, params, result);
-  killer.join();
-}
-
-TEST_F(ServerTraffic, AServerThatDiesWhileAwaitedEndsTheWaitAtOnce) {
-  auto server = Started(30000);
-  auto asked = std::chrono::steady_clock::now();
-  AskAndKillWhileAwaited(*server, "fake/silent", R"({"notifications":1})");
-  EXPECT_LT(std::chrono::steady_clock::now() - asked, 3s);
-  EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), 1);
-
-  // Killed in the middle of a frame: what it had sent of the header is the stray output.
-  auto crashing = Started(30000);
-  AskAndKillWhileAwaited(*crashing, "fake/stall", "");
-  EXPECT_EQ(TraceLog::Count("Output: Content-Length: \n"), 1);
+// Asks, and kills the server once the read has passed over the notification `method` makes
+// it send first: the read is then under way, and its wait has to end at once with the server.
+std::function<void(vexil::xServer&)> KilledWhileAwaited(const char* method, const std::string& params) {
+  return [method, params](vexil::xServer& server) {
+    const int id = server.Id();
+    std::thread killer([id] {
+      WaitFor([] { return TraceLog::Contains("Ignoring Reply: "); }, 30s);
+      vexil_test::KillProcess(id);
+    });
+    auto asked = std::chrono::steady_clock::now();
+    Ask(server, method, params);
+    killer.join();
+    EXPECT_LT(std::chrono::steady_clock::now() - asked, 3s);  // its time-out is 30 s
+    // Its output may end before its exit is seen: the next request fails fast only after.
+    EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
+  };
 }
 
 // A didOpen whose text is more than any pipe holds.
@@ -268,9 +195,7 @@ struct Misbehaviour {
 
 std::function<void(vexil::xServer&)> Answered(const std::string& params, bool read = true) {
   return [params, read](vexil::xServer& server) {
-    TextResult result;
-    Ask(server, "fake/echo", params, result);
-    EXPECT_EQ(result.read, read);
+    EXPECT_EQ(Ask(server, "fake/echo", params).read, read);
   };
 }
 
@@ -312,9 +237,27 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
          }));
        },
        {"Answer Failed: window/workDoneProgress/create: the server's input is closed\n"}, Next::TimesOut},
+      {"exited: writing to it fails quietly", {},
+       [](vexil::xServer& server) {
+         FakeParams exitNow(R"({"code":3})");
+         LSP::RequestMessage die("fake/exit", &exitNow);
+         server.Write(die);
+         EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
+         TraceLog::Clear();
+         server.Write(die);  // no SIGPIPE, no trace, error state untouched
+         EXPECT_TRUE(TraceLog::Lines().empty());
+         EXPECT_FALSE(server.HaveErrors());
+       },
+       {}, Next::FailsFast},
+      {"dies while a read waits", {}, KilledWhileAwaited("fake/silent", R"({"notifications":1})"),
+       {"Reply: Timed out waiting for reply......\n"}, Next::FailsFast, 30000},
+      // What it had sent of the header is the stray output.
+      {"dies in the middle of a frame", {}, KilledWhileAwaited("fake/stall", ""), {"Output: Content-Length: \n"},
+       Next::FailsFast, 30000},
       {"died: Start launches it again", {},
        [](vexil::xServer& server) {
-         KillServer(server);
+         vexil_test::KillProcess(server.Id());
+         EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
          EXPECT_TRUE(server.Start());
        },
        {}, Next::Works},
@@ -343,13 +286,14 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
 
     TraceLog::Clear();
     begin = std::chrono::steady_clock::now();
-    TextResult result;
-    Ask(server, "fake/echo", "", result);
+    const bool read = Ask(server, "fake/echo").read;
     EXPECT_LT(std::chrono::steady_clock::now() - begin, 30s);
-    EXPECT_EQ(result.read, row.next == Next::Works);
+    EXPECT_EQ(read, row.next == Next::Works);
     EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), row.next == Next::TimesOut ? 1 : 0);
     if (row.next == Next::FailsFast) {
       EXPECT_STREQ(server.ErrorMessage(), "A server read was requested but the server is not running.");
+      EXPECT_EQ(TraceLog::Count("Error: A server read was requested but the server is not running.\n\n"), 1);
+      EXPECT_TRUE(TraceLog::Contains(kHint));
     }
     EXPECT_FALSE(TraceLog::Contains("Write Error"));  // a failed answer is no reader error
     if (has("hang")) vexil_test::KillProcess(server.Id());

@@ -2,9 +2,9 @@
 // that script the fake server per request, and start records that launch it.
 #pragma once
 
-
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
 #include <functional>
 #include <memory>
@@ -50,15 +50,12 @@ class TraceLog {
     return texts;
   }
   static int Count(const std::string& text) {
-    int count = 0;
-    for (const TraceLine& line : Lines()) count += line.text == text;
-    return count;
+    const std::vector<std::string> texts = Texts();
+    return static_cast<int>(std::count(texts.begin(), texts.end(), text));
   }
   static bool Contains(const std::string& piece) {
-    for (const TraceLine& line : Lines()) {
-      if (line.text.find(piece) != std::string::npos) return true;
-    }
-    return false;
+    const std::vector<std::string> texts = Texts();
+    return std::any_of(texts.begin(), texts.end(), [&](const std::string& text) { return text.find(piece) != std::string::npos; });
   }
 
  private:
@@ -91,14 +88,10 @@ inline xServerStart FakeStart(std::vector<std::string> directives = {}, int time
   start.level = level;
   start.timeout = timeout;
   start.executable = VEXIL_FAKE_SERVER;
-  directives.resize(7);
-  start.argument1 = directives[0];
-  start.argument2 = directives[1];
-  start.argument3 = directives[2];
-  start.argument4 = directives[3];
-  start.argument5 = directives[4];
-  start.argument6 = directives[5];
-  start.argument7 = directives[6];
+  std::string xServerStart::*slots[] = {&xServerStart::argument1, &xServerStart::argument2, &xServerStart::argument3,
+                                        &xServerStart::argument4, &xServerStart::argument5, &xServerStart::argument6,
+                                        &xServerStart::argument7};
+  for (std::size_t i = 0; i < 7 && i < directives.size(); ++i) start.*slots[i] = directives[i];
   return start;
 }
 
@@ -137,15 +130,15 @@ class TextResult : public LSP::Result {
   unsigned answers = 0;
 };
 
-// Sends one request scripted by `params` and reads its reply into `result`.
-inline LSP::ResponseMessage Ask(vexil::xServer& server, const char* method, const std::string& params,
-                                TextResult& result) {
+// Sends one request scripted by `params` and reads its reply.
+inline TextResult Ask(vexil::xServer& server, const char* method, const std::string& params = "") {
   FakeParams scripted(params);
   LSP::RequestMessage request(method, &scripted);
+  TextResult result;
   LSP::ResponseMessage response(&result);
   server.Write(request);
   server.Read(request.id, response);
-  return response;
+  return result;
 }
 
 // Polls `condition` until it holds or `limit` has passed.
@@ -162,8 +155,7 @@ inline bool WaitFor(const std::function<bool()>& condition, std::chrono::millise
 // order: ask until `line` has come through, once.
 inline bool ErrorLineArrives(vexil::xServer& server, const std::string& line) {
   return WaitFor([&] {
-    TextResult result;
-    Ask(server, "fake/echo", "", result);
+    Ask(server, "fake/echo");
     return TraceLog::Count("Reply: " + line + "\n") == 1;
   });
 }
@@ -180,16 +172,19 @@ inline std::unique_ptr<vexil::xServer> FailedStart(const xServerStart& start) {
   return nullptr;
 }
 
-// Each test of a server's start reads only its own trace lines.
-class ServerStart : public ::testing::Test {
+// Each test of the fake server reads only its own trace lines.
+class FakeServerTest : public ::testing::Test {
  protected:
   void SetUp() override { TraceLog::Clear(); }
-};
 
-// Ends a fake server this test started, by its process id.
-inline void KillServer(vexil::xServer& server) {
-  vexil_test::KillProcess(server.Id());
-  WaitFor([&] { return !server.IsRunning(); });
-}
+  // A started fake server at `level`, the lines of its start cleared from the log.
+  static std::unique_ptr<vexil::xServer> Started(int timeout = 2000, LSP::TraceLevel level = LSP::TraceLevel::Messages) {
+    auto server = std::make_unique<vexil::xServer>(FakeStart({}, timeout, level));
+    EXPECT_TRUE(server->Start());
+    TraceLog::Clear();
+    return server;
+  }
+};
+using ServerStart = FakeServerTest;
 
 }  // namespace transport_test

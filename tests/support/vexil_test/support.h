@@ -1,5 +1,5 @@
-// Portable helpers for tests: a temporary directory removed with its contents, and
-// control over processes a test started (the library itself never kills a child).
+// Portable helpers for tests: a temporary directory removed with its contents, control
+// over processes a test started (the library itself never kills a child), and framing.
 #pragma once
 
 #include <filesystem>
@@ -30,5 +30,10 @@ std::filesystem::path MemoryBackedBase();
 void KillProcess(int id);
 // Whether the process `id` still exists (an exited but unreaped child counts as existing).
 bool ProcessExists(int id);
+
+// `body` as a server frames it on the wire.
+inline std::string Frame(const std::string& body) {
+  return "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
+}
 
 }  // namespace vexil_test

@@ -1,11 +1,14 @@
-// Typed member access: defaults for missing and null members, the exact texts of type
-// mismatches, and the JSON library's assertions surfacing as AssertException.
+// Parsing with readable error texts; typed member access: defaults for missing and null
+// members, the exact texts of type mismatches, the JSON library's assertions surfacing as
+// AssertException; and compact writing: member order, omitted empty strings, escaping and
+// raw values.
 #include <gtest/gtest.h>
 
 #include <stdexcept>
 #include <string>
 
 #include "json/members.h"
+#include "json/rapidjson.h"
 #include "vexil/json/json.h"
 
 namespace {
@@ -41,7 +44,65 @@ std::string Mismatch(const char* expected, const char* found) {
   return std::string("Expecting a '") + expected + "' JSON object but found '" + found + "' JSON object.";
 }
 
+// A model object whose members are written by a callback, for writer tests.
+template <typename WriteMembers>
+class Members : public LSP::JsonObject {
+ public:
+  explicit Members(WriteMembers write) : write_(write) {}
+  const char* Name() const override { return "members"; }
+  void Read(const LSP::xObject&) override {}
+  void Write(LSP::xWriter& writer) override { write_(writer); }
+
+ private:
+  WriteMembers write_;
+};
+
+template <typename WriteMembers>
+std::string Written(WriteMembers write) {
+  Members<WriteMembers> object(write);
+  return LSP::ToJsonText(object);
+}
+
 }  // namespace
+
+TEST(xReader, ParseErrorsShowTextAndCaretUnderTheOffset) {
+  const std::pair<const char*, const char*> rows[] = {
+      {"{\"a\":}", "Invalid value.\n\n\n{\"a\":}\n     ^"},
+      {"", "The document is empty.\n\n\n\n^"},
+      {"{} {}", "The document root must not be followed by other values.\n\n\n{} {}\n   ^"},
+      {"[1,", "Invalid value.\n\n\n[1,\n   ^"},
+      {"{\"s\":\"\\x\"}", "Invalid escape character in string.\n\n\n{\"s\":\"\\x\"}\n      ^"},
+  };
+  LSP::xReader reader;
+  for (const auto& [text, error] : rows) {
+    EXPECT_FALSE(reader.Parse(text)) << text;
+    EXPECT_EQ(reader.Error(), error) << text;
+  }
+  EXPECT_TRUE(reader.Parse("{\"a\":1}"));
+  EXPECT_EQ(reader.Error(), "");
+  EXPECT_EQ(reader.Root().Int("a"), 1);
+}
+
+// The document's named objects, and a model class read from the document by its name.
+TEST(xReader, NamedObjectsOfTheDocument) {
+  struct Named : LSP::JsonObject {
+    const char* Name() const override { return "X"; }
+    void Read(const LSP::xObject& value) override { seen = value.Int("v"); }
+    using LSP::JsonObject::Read;
+    void Write(LSP::xWriter&) override {}
+    int seen = 0;
+  } named;
+  LSP::xReader reader;
+  ASSERT_TRUE(reader.Parse(R"({"position":{"line":3},"X":{"v":9}})"));
+  EXPECT_EQ(reader.Object("position").Int("line"), 3);
+  EXPECT_EQ(ErrorText([&] { reader.Object("range"); }), "Document does not contain 'range' JSON object.");
+  named.Read(reader);
+  EXPECT_EQ(named.seen, 9);
+  ASSERT_TRUE(reader.Parse(R"({"Y":{}})"));
+  EXPECT_EQ(ErrorText([&] { named.Read(reader); }), "Document does not contain 'X' JSON object.");
+  ASSERT_TRUE(reader.Parse("[1]"));
+  EXPECT_EQ(ErrorText([&] { reader.Object("x"); }).rfind("assert: ", 0), 0u);
+}
 
 TEST(xObject, MissingAndNullMembersYieldTheFixedDefaults) {
   for (const char* json : {R"({})", R"({"v":null})", "null"}) {
@@ -158,4 +219,53 @@ TEST(Members, LookUpsGiveWhatxObjectGives) {
       same([&](const auto& v) { return std::to_string(static_cast<int>(v.Object(name).Value().GetType())); });
     }
   }
+}
+
+TEST(xWriter, MembersInCallOrderWithEmptyStringsLeftOut) {
+  EXPECT_EQ(Written([](LSP::xWriter& w) {
+              w.String("empty", "");
+              w.Int("z", -1);
+              w.UInt("a", 4000000000u);
+              w.Bool("t", true);
+              w.Int64("big", -5000000000LL);
+              w.UInt64("ubig", 18446744073709551615ULL);
+              w.Null("n");
+              w.Integers("none", {});
+              w.Integers("ints", {1, 2});
+              w.Strings("strs", {"x", ""});
+              w.RequiredString("text", "");
+            }),
+            R"({"z":-1,"a":4000000000,"t":true,"big":-5000000000,"ubig":18446744073709551615,"n":null,)"
+            R"("none":[],"ints":[1,2],"strs":["x",""],"text":""})");
+  EXPECT_EQ(Written([](LSP::xWriter& w) { w.String("only", ""); }), "{}");
+}
+
+TEST(xWriter, EscapesControlCharactersAndKeepsUtf8Bytes) {
+  std::string text = "tab\there \"quoted\" back\\slash\nline\x01\x1f caf\xc3\xa9 \xe2\x82\xac";
+  std::string json = Written([&](LSP::xWriter& w) { w.String("s", text); });
+  EXPECT_EQ(json, "{\"s\":\"tab\\there \\\"quoted\\\" back\\\\slash\\nline\\u0001\\u001F caf\xc3\xa9 \xe2\x82\xac\"}");
+  LSP::xReader reader;
+  ASSERT_TRUE(reader.Parse(json));
+  EXPECT_EQ(reader.Root().String("s"), text);
+  std::string withNul("a\0b", 3);
+  EXPECT_EQ(Written([&](LSP::xWriter& w) { w.String("s", withNul); }), "{\"s\":\"a\\u0000b\"}");
+}
+
+TEST(xWriter, RawValuesAreCopiedVerbatim) {
+  LSP::xReader options;
+  ASSERT_TRUE(options.Parse(R"({"opts":{"b":[1,"two",null],"a":{"x":1.5}}})"));
+  const LSP::JsonValue& value = options.Root().Object("opts").Value();
+  EXPECT_EQ(Written([&](LSP::xWriter& w) {
+              w.Raw("initializationOptions", value);
+              w.StartArray("raw");
+              w.RawValue("{\"pre\":true}", LSP::JsonType::Object);
+              w.EndArray();
+            }),
+            R"({"initializationOptions":{"b":[1,"two",null],"a":{"x":1.5}},"raw":[{"pre":true}]})");
+}
+
+TEST(xWriter, MisuseRaisesAssertException) {
+  EXPECT_EQ(ErrorText([] { Written([](LSP::xWriter& w) { w.RawValue("1", LSP::JsonType::Number); }); }).rfind("assert: ", 0), 0u);
+  EXPECT_EQ(ErrorText([] { Written([](LSP::xWriter& w) { w.EndArray(); }); }).rfind("assert: ", 0), 0u);
+  EXPECT_EQ(ErrorText([] { Written([](LSP::xWriter& w) { w.Int(nullptr, 1); }); }), "assert: str != 0");
 }
