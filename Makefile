@@ -11,12 +11,14 @@ WINDOWS_BUILD   ?= build-windows
 WINDOWS_SYSROOT  = $(abspath $(WINDOWS_BUILD))/sysroot
 WINE_ENV         = WINEPREFIX=$(abspath $(WINDOWS_BUILD))/wineprefix WINEARCH=win32 WINEDEBUG=-all
 
+COVERAGE_BUILD ?= build-coverage
+
 FUZZ_BUILD   ?= build-fuzz
 FUZZ_SECONDS ?= 60
 
 STRESS_RUNS ?= 10
 
-.PHONY: all deps configure build test stress demo bench asan tsan fuzz clean windows-deps windows test-windows
+.PHONY: all deps configure build test stress demo package bench asan tsan coverage fuzz clean windows-deps windows test-windows
 
 all: build
 
@@ -41,6 +43,10 @@ stress: build
 demo: build
 	$(BUILD)/tools/vexil/vexil demo
 
+# Debian packages in $(BUILD)/packages: libvexil0, libvexil-dev and vexil.
+package: build
+	cd $(BUILD) && cpack
+
 # The memory check runs first, in a process of its own, so that no other benchmark's freed
 # memory hides its growth. The other repetitions are interleaved at random, so a load that
 # comes and goes on a shared machine weighs on a figure and its floor alike.
@@ -61,6 +67,19 @@ tsan: deps
 	cmake -S . -B build-tsan -G $(GENERATOR) -DCMAKE_BUILD_TYPE=Debug -DVEXIL_SANITIZE=thread
 	cmake --build build-tsan
 	TSAN_OPTIONS=halt_on_error=1:second_deadlock_stack=1 $(CTEST) --test-dir build-tsan
+
+# Line and branch coverage of src/ by the whole suite, from an instrumented build of its own.
+# Counters are reset first, so the figures are those of this run alone; the report is printed
+# even when a test failed, and the target then fails with the suite.
+coverage:
+	scripts/install-coverage-deps.sh
+	cmake -S . -B $(COVERAGE_BUILD) -G $(GENERATOR) -DCMAKE_BUILD_TYPE=Debug -DVEXIL_COVERAGE=ON \
+	  -DVEXIL_BUILD_BENCH=OFF
+	cmake --build $(COVERAGE_BUILD)
+	find $(COVERAGE_BUILD) -name '*.gcda' -delete
+	$(CTEST) --test-dir $(COVERAGE_BUILD); status=$$?; \
+	gcovr --root . --filter 'src/' --exclude-unreachable-branches --exclude-throw-branches \
+	  --print-summary --txt $(COVERAGE_BUILD)/coverage.txt $(COVERAGE_BUILD) && exit $$status
 
 # libFuzzer targets under address and undefined-behaviour sanitizers, built with clang in a
 # directory of their own; each runs FUZZ_SECONDS from the corpus in tests/fuzz/corpus.
@@ -93,4 +112,4 @@ test-windows: windows
 	$(WINE_ENV) $(CTEST) --test-dir $(WINDOWS_BUILD); status=$$?; $(WINE_ENV) wineserver -k; exit $$status
 
 clean:
-	rm -rf $(BUILD) build-asan build-tsan $(FUZZ_BUILD) $(WINDOWS_BUILD)
+	rm -rf $(BUILD) build-asan build-tsan $(COVERAGE_BUILD) $(FUZZ_BUILD) $(WINDOWS_BUILD)

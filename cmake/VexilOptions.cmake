@@ -8,6 +8,12 @@ if(VEXIL_SANITIZE)
   add_link_options(-fsanitize=${VEXIL_SANITIZE})
 endif()
 
+option(VEXIL_COVERAGE "Instrument every target for gcov line and branch coverage (gcc)" OFF)
+if(VEXIL_COVERAGE)
+  add_compile_options(--coverage -O0)
+  add_link_options(--coverage)
+endif()
+
 option(VEXIL_FUZZ "Build the fuzz targets with libFuzzer (clang)" OFF)
 if(VEXIL_FUZZ)
   # RapidJSON's parse stack does arithmetic on its null start; that one check reports and

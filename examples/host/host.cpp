@@ -2,6 +2,7 @@
 // position, and end the server. Usage: vexil_host FILE LINE COLUMN (counted from 1).
 #include <cstdio>
 #include <cstdlib>
+#include <filesystem>
 #include <fstream>
 #include <sstream>
 
@@ -16,9 +17,15 @@ int main(int argc, char** argv) {
     std::fprintf(stderr, "usage: vexil_host FILE LINE COLUMN\n");
     return 2;
   }
-  std::ifstream file(argv[1]);
+  // Servers know files by URI, and a URI names an absolute path.
+  const std::string path = std::filesystem::absolute(argv[1]).string();
+  std::ifstream file(path);
   std::stringstream text;
   text << file.rdbuf();
+  if (!file || FileToUri(path.c_str()).empty()) {
+    std::fprintf(stderr, "vexil_host: cannot read %s\n", argv[1]);
+    return 1;
+  }
 
   xServerStart start;
   start.name = "clangd";
@@ -30,7 +37,7 @@ int main(int argc, char** argv) {
   if (!server->Start(xServerInitialise())) return 1;
 
   LSP::DidOpenTextDocumentParams open;
-  open.textDocument.uri = FileToUri(argv[1]);
+  open.textDocument.uri = FileToUri(path.c_str());
   open.textDocument.languageId = xLanguages().LanguageId("cpp");
   open.textDocument.version = 1;
   open.textDocument.text = text.str();

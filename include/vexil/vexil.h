@@ -1,6 +1,6 @@
 // Everything a host uses, in one include: records, trace types and the trace queue, the
-// connection interface and its exports, the LSP model, the language table, URI functions
-// and the directory watchers.
+// connection interface and its exports, the LSP model, the language table, URI functions,
+// the directory watchers and the watcher tasks. Every public header is listed here.
 #pragma once
 
 #include "vexil/export.h"
@@ -29,3 +29,5 @@
 #include "vexil/watch/change_event.h"
 #include "vexil/watch/watcher_ex.h"
 #include "vexil/watch/watcher.h"
+#include "vexil/task/watcher_options.h"
+#include "vexil/task/watcher_task.h"

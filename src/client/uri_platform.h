@@ -1,5 +1,5 @@
 // The platform half of the path and URI conversion: each platform file converts one
-// non-empty text into a buffer of the platform's path size.
+// non-empty text within the platform's path limit.
 #pragma once
 
 #include <cstddef>
@@ -7,7 +7,8 @@
 
 namespace vexil {
 
-// The platform's path buffer, terminator included: longer results are refused.
+// Windows' path buffer (MAX_PATH), terminator included: longer results are refused there.
+// POSIX systems allow PATH_MAX instead.
 constexpr std::size_t kPathBufferSize = 260;
 
 // Both return "" when the platform refuses the conversion.

@@ -1,5 +1,6 @@
 // Path and URI conversion where the shell's URL functions do not exist: RFC 8089 file URIs
 // with an empty authority, every byte but unreserved characters and '/' percent-encoded.
+#include <climits>
 #include <string>
 
 #include "client/uri_platform.h"
@@ -16,7 +17,8 @@ bool IsUnreserved(unsigned char byte) {
          byte == '-' || byte == '.' || byte == '_' || byte == '~';
 }
 
-bool FitsBuffer(const std::string& text) { return text.size() < kPathBufferSize; }
+// Paths and URIs as long as the system's own paths may be, terminator included.
+bool FitsBuffer(const std::string& text) { return text.size() < PATH_MAX; }
 
 // The value of one hex digit, or -1.
 int HexValue(char digit) {

@@ -2,6 +2,7 @@
 // rename answers and selection chains come in several shapes; each is read as sent.
 #include "vexil/protocol/document_features.h"
 
+#include "json/json_depth.h"
 #include "json/json_errors.h"
 #include "protocol/json_arrays.h"
 #include "protocol/raw_json.h"
@@ -40,8 +41,8 @@ void SelectionRangeParams::Write(xWriter& writer) {
 void SelectionRange::Read(const xObject& value) {
   range.Read(value.Object("range"));
   for (xObject parent = value.Object("parent"); !parent.IsNull(); parent = parent.Object("parent")) {
-    if (parents.size() == static_cast<std::size_t>(kMaxNesting))
-      ThrowFormatted("More than %d nested '%s' JSON objects.", kMaxNesting, "parent");
+    if (parents.size() == static_cast<std::size_t>(kNestingLimit))
+      ThrowFormatted("parent\nFailed to read JSON object: nested deeper than %d levels", kNestingLimit);
     parents.emplace_back();
     parents.back().Read(parent.Object("range"));
   }

@@ -9,11 +9,6 @@
 
 namespace LSP {
 
-// How deep a chain of nested values (selection-range parents) may go. Deeper is taken as
-// malformed rather than walked: a hostile or broken reply must not exhaust the stack or
-// the memory of the host.
-constexpr int kMaxNesting = 1000;
-
 // Appends every element of `array` read as a T. An element that cannot be read is
 // reported with the caught text and the array's type number.
 template <typename T>

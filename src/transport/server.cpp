@@ -21,6 +21,9 @@ namespace {
 constexpr int kDefaultTimeoutMs = 200;
 // A server still running this long after its launch counts as started.
 constexpr long kStartupGraceMs = 150;
+// How long an ended server's error reader may take to read the rest of its pipe; more
+// only when a process the server started holds the pipe open.
+constexpr std::chrono::milliseconds kLastWordsWait{500};
 
 }  // namespace
 
@@ -64,6 +67,9 @@ xServer::~xServer() {
   tracer_.Verbose("Waiting for threads to end....\n");
   if (streams_) streams_->JoinReaders();
   deferred_.Deliver();
+  // A server that outlives its connection (one that stopped reading) is collected once it
+  // ends, never ended here.
+  process_.Abandon();
   tracer_.Verbose("Language server close complete.\n\n");
 }
 
@@ -126,6 +132,7 @@ bool xServer::Launch() {
 }
 
 void xServer::ReportFailedStart(const std::string& reason, bool hint) {
+  AwaitLastWords();
   if (tracer_.Messages()) {
     TraceEarlyErrorLines();
     TraceStrayOutput();
@@ -138,6 +145,10 @@ void xServer::ReportFailedStart(const std::string& reason, bool hint) {
       "Make sure the executable and directory details are correct and if required the system PATH is also "
       "correct.\n");
   if (hint) tracer_.Error("%s", kTraceLevelHint);
+}
+
+void xServer::AwaitLastWords() {
+  if (streams_) streams_->errThread.TryJoin(kLastWordsWait);
 }
 
 void xServer::TraceLaunchDetails() {

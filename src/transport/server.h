@@ -106,6 +106,9 @@ class xServer {
   void DrainErrorLines();
   void ReportTimeOut();
   void CancelRequest(int id);
+  // Once the server has ended: waits briefly for the rest of its standard error, so that
+  // the trace shows why it ended.
+  void AwaitLastWords();
   void Dispatch(ServerStreams& streams, LSP::xReader& message);
   void StoreDiagnostics(const LSP::xObject& notification);
   std::vector<LSP::WorkspaceFolder> Folders();

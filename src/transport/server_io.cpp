@@ -112,6 +112,10 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
       if (--countdown == 0) break;
     }
     if (wait != MessageQueue::Wait::Taken) {
+      if (wait == MessageQueue::Wait::Finished) {
+        AwaitLastWords();
+        DrainErrorLines();
+      }
       ReportTimeOut();
       CancelRequest(id);
       return "";

@@ -105,6 +105,8 @@ void MonitorBackend::DeliverOne(Delivery& delivery) {
   if (!Listed(delivery.id)) return;
   if (delivery.kind == Delivery::Kind::Batch) {
     handlers_.event(delivery.id, delivery.batch);
+  } else if (delivery.kind == Delivery::Kind::Limit) {
+    handlers_.limitReached(delivery.id, delivery.text);
   } else {
     handlers_.watchError(delivery.id);
   }

@@ -27,14 +27,18 @@ enum ChangeAction : unsigned {
 // other changes of one read are gathered between the renames, in the order they happened.
 using ChangeBatch = std::set<std::pair<std::string, unsigned>>;
 
-// The three callbacks. They run on the worker thread, outside the monitor's lock, except
-// the error text of a failed add, which runs on the caller's thread. A handler may add and
-// remove watches, and may even destroy the monitor: the worker then ends once the handler
-// has returned, without waiting for itself, and calls nothing more.
+// The callbacks. They run on the worker thread, outside the monitor's lock, except the
+// reports of a failed add, which run on the caller's thread. A handler may add and remove
+// watches, and may even destroy the monitor: the worker then ends once the handler has
+// returned, without waiting for itself, and calls nothing more.
 struct MonitorHandlers {
   std::function<void(std::int64_t id, const ChangeBatch& batch)> event;
   std::function<void(std::int64_t id)> watchError;
   std::function<void(const std::string& message)> errorText;
+  // Optional: the system's limit on watched directories (Linux's inotify watches) left
+  // directory `path` of watch `id`'s tree unwatched. When set, such directories come here
+  // instead of through errorText, so that a caller can say it once for a whole tree.
+  std::function<void(std::int64_t id, const std::string& path)> limitReached = nullptr;
 };
 
 // How one watch looks at its root. The watchers a host starts use the defaults; the other
@@ -44,9 +48,9 @@ struct WatchOptions {
   // The whole tree below the root, or only the root's own entries.
   bool recursive = true;
   // Also report, as kActionModified, every file whose content at a name is new: written to
-  // (and closed after writing), or put there by a rename or a move into the tree, which is
-  // how editors save atomically. Directories are never reported as modified. A name written
-  // in several steps may be reported once per read that saw a step.
+  // (on Linux once its writer closes it; on Windows as the system reports writes, which may
+  // be more than once per save), or put there by a rename or a move into the tree, which is
+  // how editors save atomically. Directories are never reported as modified.
   bool modifications = false;
 };
 

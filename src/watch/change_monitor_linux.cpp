@@ -49,6 +49,7 @@ class InotifyBackend final : public MonitorBackend {
   // Waits up to `timeoutMs` (-1: for good) for a buffer of events and reads it.
   Wait ReadOnce(char* buffer, std::size_t& length, int timeoutMs, int& error);
   void Collect(ReadOutcome outcome, Deliveries& deliveries);
+  void Unwatched(ReadOutcome& outcome, Deliveries& deliveries) const;
   std::vector<std::int64_t> WatchIds() const;
 
   UniqueFd inotify_;
@@ -77,9 +78,18 @@ std::error_code InotifyBackend::AddWatch(const std::string& root, std::int64_t i
     error = tree_.AddRoot(root, id, options, outcome);
     if (!error) watches_[id] = WatchState::Active;
   }
-  for (const std::string& text : outcome.errors) ReportNow(text);
+  Deliveries reports;
+  Unwatched(outcome, reports);
+  for (const Delivery& report : reports) {
+    if (report.kind == Delivery::Kind::Limit) ReportLimitNow(report.id, report.text);
+    if (report.kind == Delivery::Kind::Text) ReportNow(report.text);
+  }
   if (!error) return {};
-  ReportNow(CannotOpenDirectory(error));
+  if (error == ENOSPC && HearsLimits()) {
+    ReportLimitNow(id, root);
+  } else {
+    ReportNow(CannotOpenDirectory(error));
+  }
   return {error, std::generic_category()};
 }
 
@@ -140,7 +150,7 @@ Wait InotifyBackend::ReadOnce(char* buffer, std::size_t& length, int timeoutMs, 
 
 // Batches first, so that a watch's last changes reach the host before it is declared gone.
 void InotifyBackend::Collect(ReadOutcome outcome, Deliveries& deliveries) {
-  for (std::string& text : outcome.errors) deliveries.push_back({Delivery::Kind::Text, 0, {}, std::move(text)});
+  Unwatched(outcome, deliveries);
   for (auto& [id, batches] : outcome.batches) batches.MoveInto(id, deliveries);
   for (std::int64_t id : outcome.rootsGone) {
     deliveries.push_back({Delivery::Kind::WatchError, id, {}, {}});
@@ -152,6 +162,17 @@ void InotifyBackend::Collect(ReadOutcome outcome, Deliveries& deliveries) {
     deliveries.push_back({Delivery::Kind::WatchError, id, {}, {}});
     tree_.Remove(id);
     state = WatchState::Silent;
+  }
+}
+
+// Directories the watch limit left out go to the limit handler when there is one, else they
+// are error texts like any other directory that cannot be watched.
+void InotifyBackend::Unwatched(ReadOutcome& outcome, Deliveries& deliveries) const {
+  for (std::string& text : outcome.errors) deliveries.push_back({Delivery::Kind::Text, 0, {}, std::move(text)});
+  for (auto& [ids, path] : outcome.limited) {
+    if (!HearsLimits()) deliveries.push_back({Delivery::Kind::Text, 0, {}, CannotWatchDirectory(path, ENOSPC)});
+    for (std::int64_t id : ids)
+      if (HearsLimits()) deliveries.push_back({Delivery::Kind::Limit, id, {}, path});
   }
 }
 

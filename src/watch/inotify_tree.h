@@ -21,11 +21,17 @@ struct ReadOutcome {
   std::map<std::int64_t, BatchList> batches;
   // Watches whose root was deleted or moved away; the tree has already forgotten them.
   std::vector<std::int64_t> rootsGone;
-  // Subdirectories that could not be watched, as error texts.
+  // Subdirectories that could not be watched, as error texts...
   std::vector<std::string> errors;
+  // ...except those that the system's limit on watches left out, with the watches they
+  // belong to.
+  std::vector<std::pair<std::vector<std::int64_t>, std::string>> limited;
   // The kernel dropped events: every watch may have missed some.
   bool overflow = false;
 };
+
+// The error text of a directory that cannot be watched, with the system's reason.
+std::string CannotWatchDirectory(const std::string& path, int error);
 
 class InotifyTree {
  public:
@@ -43,7 +49,7 @@ class InotifyTree {
 
   // Watches `root`, and with a recursive watch every directory below it, for watch `id`.
   // Returns 0, or the errno of the root's own watch; subdirectories that cannot be watched
-  // go to `outcome`'s errors.
+  // go to `outcome`'s errors or, for the watch limit, its limited directories.
   int AddRoot(const std::string& root, std::int64_t id, const WatchOptions& options, ReadOutcome& outcome);
   // Forgets watch `id` and drops the descriptors no other watch needs.
   void Remove(std::int64_t id);

@@ -17,7 +17,9 @@ namespace {
 
 constexpr std::uint32_t kEntryEvents = IN_CREATE | IN_DELETE | IN_MOVED_FROM | IN_MOVED_TO | IN_DELETE_SELF |
                                        IN_MOVE_SELF | IN_EXCL_UNLINK | IN_ONLYDIR;
-constexpr std::uint32_t kContentEvents = IN_MODIFY | IN_CLOSE_WRITE;
+// A file's new content is complete when its writer closes it. Each write (IN_MODIFY) would
+// report one ordinary save several times, the first of them before the content is all there.
+constexpr std::uint32_t kContentEvents = IN_CLOSE_WRITE;
 constexpr std::uint32_t kSelfEvents = IN_DELETE_SELF | IN_MOVE_SELF | IN_IGNORED | IN_UNMOUNT;
 // Ancestors held open while a new subtree is walked, each one descriptor.
 constexpr int kHeldLevels = 32;
@@ -99,6 +101,10 @@ std::size_t HoldFrom(const std::vector<Event>& events, std::size_t carried) {
 }
 
 }  // namespace
+
+std::string CannotWatchDirectory(const std::string& path, int error) {
+  return "Cannot watch directory: " + path + ": " + std::error_code(error, std::generic_category()).message() + "\n";
+}
 
 // Both halves of one move, by cookie.
 struct InotifyTree::MoveHalves {
@@ -282,8 +288,10 @@ void InotifyTree::AddSubtree(const std::string& path, const Owners& owners, Read
   if (descriptor < 0) {
     // Gone, replaced or renamed before we got to it: its parent's events tell the rest.
     if (errno == ENOENT || errno == ENOTDIR || errno == ELOOP) return;
-    outcome.errors.push_back("Cannot watch directory: " + path + ": " +
-                             std::error_code(errno, std::generic_category()).message() + "\n");
+    if (errno != ENOSPC) return outcome.errors.push_back(CannotWatchDirectory(path, errno));
+    std::vector<std::int64_t> ids;
+    for (const auto& owner : owners) ids.push_back(owner.first);
+    outcome.limited.emplace_back(std::move(ids), path);
     return;
   }
   Adopt(descriptor, identity, owners);

@@ -18,8 +18,9 @@
 namespace vexil {
 
 // One report of the worker, gathered under the backend's lock and handed over after it.
+// A Limit carries the directory left unwatched as its text.
 struct Delivery {
-  enum class Kind { Batch, WatchError, Text };
+  enum class Kind { Batch, WatchError, Text, Limit };
   Kind kind;
   std::int64_t id;
   ChangeBatch batch;
@@ -79,6 +80,9 @@ class MonitorBackend : public std::enable_shared_from_this<MonitorBackend> {
   void LoopEnded() { stopped_ = true; }
   // A failed add, told at once on the calling thread.
   void ReportNow(const std::string& text) const { handlers_.errorText(text); }
+  // Whether directories left out by the watch limit go to a handler of their own.
+  bool HearsLimits() const { return static_cast<bool>(handlers_.limitReached); }
+  void ReportLimitNow(std::int64_t id, const std::string& path) const { handlers_.limitReached(id, path); }
 
  private:
   bool Listed(std::int64_t id);

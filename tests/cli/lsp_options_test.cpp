@@ -1,8 +1,13 @@
-// The `vexil lsp` command line: server arguments up to the first action, positions read
-// from the right of FILE:LINE:COL, and each kind of bad usage refused before any launch.
+// The `vexil` command lines: server arguments up to the first action, values after '=' or
+// in the next argument, positions read from the right of FILE:LINE:COL, files resolved
+// against the root, each kind of bad usage refused before any launch, and a task's
+// command line split into words as a shell would.
 #include <gtest/gtest.h>
 
+#include <filesystem>
+
 #include "lsp_options.h"
+#include "run_words.h"
 
 namespace {
 
@@ -13,9 +18,9 @@ using Args = std::vector<std::string>;
 
 TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   cli::LspOptions options = ParseLspOptions(
-      {"--trace", "verbose", "--timeout", "900", "--json", "--", "clangd", "--log=error", "--pretty", "--hover",
-       "c:/odd:name.cpp:15:18", "--range-format", "a.cpp:1:2:3:4", "--rename", "a.cpp:5:6:Limit",
-       "--workspace-symbols", "Rect", "--close", "a.cpp"});
+      {"--trace", "verbose", "--timeout=900", "--json", "--root=src", "--", "clangd", "--log=error", "--pretty",
+       "--hover", "c:/odd:name.cpp:15:18", "--range-format=a.cpp:1:2:3:4", "--rename", "a.cpp:5:6:Limit",
+       "--workspace-symbols", "Rect", "--close", "a.cc"});
   EXPECT_EQ(options.session.trace, LSP::TraceLevel::Verbose);
   EXPECT_EQ(options.session.timeout, 900);
   EXPECT_TRUE(options.json);
@@ -33,6 +38,9 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   EXPECT_EQ(options.actions[2].line, 5);
   EXPECT_EQ(options.actions[3].text, "Rect");
   EXPECT_EQ(options.actions[4].kind, ActionKind::Close);
+  const std::filesystem::path root = std::filesystem::absolute("src").lexically_normal();
+  EXPECT_EQ(options.session.root, root.string());
+  EXPECT_EQ(options.actions[4].path, (root / "a.cc").string());
   EXPECT_EQ(cli::Describe(options.actions[2]), "rename a.cpp:5:6 -> Limit");
 }
 
@@ -47,12 +55,25 @@ TEST(LspOptions, BadUsageIsRefusedWithAReason) {
       {"--", "clangd", "--rename", "a.cpp:1:1:"},           // no new name
       {"--", "clangd", "--hover"},                          // no operand
       {"--", "clangd", "--open", "notes.txt"},              // no language for .txt
+      {"--json=yes", "--", "clangd", "--open", "a.cpp"},    // a flag takes no value
+      {"--root", "--", "clangd"},                           // the value is taken, then "--" is missing
       {"--", "s", "1", "2", "3", "4", "5", "6", "7", "8", "--open", "a.cpp"},
   };
   for (const Args& arguments : bad) {
     EXPECT_THROW(ParseLspOptions(arguments), UsageError) << ::testing::PrintToString(arguments);
   }
   EXPECT_EQ(ParseLspOptions({"--language", "plaintext", "--", "s", "--open", "notes.txt"}).session.language, "plaintext");
+  EXPECT_THROW(ParseLspOptions({"--help"}), cli::HelpRequested);
+}
+
+TEST(TaskCommand, RunIsSplitIntoWordsAsAShellWould) {
+  const std::vector<std::pair<std::string, Args>> cases = {
+      {"g++ -c $FN", {"g++", "-c", "$FN"}},
+      {"  make   '$FB.o'  ", {"make", "$FB.o"}},
+      {"echo 'a b'\"c \\\" d\"e\\ f ''", {"echo", "a bc \" de f", ""}},
+  };
+  for (const auto& [text, words] : cases) EXPECT_EQ(cli::SplitWords(text), words) << text;
+  EXPECT_THROW(cli::SplitWords("echo 'open"), UsageError);
 }
 
 }  // namespace

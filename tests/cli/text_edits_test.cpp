@@ -1,9 +1,26 @@
-// Edits shown as unified diffs whose hunks carry the right line numbers.
+// Edits shown as unified diffs whose hunks carry the right line numbers; byte columns and
+// UTF-16 units converted both ways.
 #include <gtest/gtest.h>
 
+#include "columns.h"
 #include "text_edits.h"
 
 namespace {
+
+// Columns people give count bytes; the protocol's count UTF-16 units; past the end of a
+// line both count one a byte, and invalid bytes one each.
+TEST(TextEdits, ByteColumnsAndUtf16UnitsConvertBothWays) {
+  const std::string line = "a\xC3\xA9\xF0\x9F\x98\x80\xE9z";  // a é 😀 (Latin-1 é) z
+  const std::vector<std::pair<std::size_t, int>> pairs = {{0, 0}, {1, 1}, {3, 2}, {7, 4}, {8, 5}, {9, 6}, {12, 9}};
+  for (const auto& [bytes, units] : pairs) {
+    EXPECT_EQ(cli::UnitsOf(line, bytes), units) << bytes;
+    EXPECT_EQ(cli::BytesOf(line, units), bytes) << units;
+  }
+  EXPECT_EQ(cli::NotUtf8At("ok\n\xC3\xA9\n"), "");
+  EXPECT_EQ(cli::NotUtf8At("ok\nab\xE9z"), "line 2, column 3");
+  EXPECT_EQ(cli::NotUtf8At("\xC3"), "line 1, column 1");       // cut short
+  EXPECT_EQ(cli::NotUtf8At("\xC0\xAF"), "line 1, column 1");   // overlong
+}
 
 TEST(TextEdits, DiffsShowRemovalsBeforeAdditionsInSeparateHunks) {
   std::string before;

@@ -9,15 +9,22 @@
 
 namespace {
 
-TEST(Languages, LooksUpExtensionsExactlyAsGiven) {
+// Every extension of the table, then what must not be found: other cases, a leading dot or a
+// whole file name, an id that is not an extension, an extension list, nothing at all.
+TEST(Languages, LooksUpEveryExtensionExactlyAsGiven) {
   const xLanguages languages;
   const std::pair<const char*, const char*> found[] = {
-      {"h", "c"},          {"c", "c"},       {"hpp", "cpp"},   {"c++", "cpp"},   {"h++", "cpp"},
-      {"bat", "bat"},      {"cmd", "bat"},   {"cs", "csharp"}, {"py", "python"}, {"cshtml", "razor"},
-      {"xls", "xsl"},      {"ts", "typescript"}, {"yaml", "yaml"}, {"r", "r"},   {"vb", "vb"}};
+      {"cmd", "bat"},     {"bat", "bat"},   {"c", "c"},           {"h", "c"},
+      {"cpp", "cpp"},     {"cxx", "cpp"},   {"c++", "cpp"},       {"hpp", "cpp"},
+      {"hxx", "cpp"},     {"h++", "cpp"},   {"cs", "csharp"},     {"go", "go"},
+      {"html", "html"},   {"java", "java"}, {"lua", "lua"},       {"py", "python"},
+      {"r", "r"},         {"cshtml", "razor"}, {"rb", "ruby"},    {"rs", "rust"},
+      {"sql", "sql"},     {"ts", "typescript"}, {"vb", "vb"},     {"xml", "xml"},
+      {"xls", "xsl"},     {"yaml", "yaml"}};
   for (const auto& row : found) EXPECT_STREQ(languages.LanguageId(row.first), row.second) << row.first;
-  for (const char* missing : {"CPP", ".cpp", "js", "json", "md", "htm", "yml", "xsl", "css", "", "cpp;h"})
-    EXPECT_STREQ(languages.LanguageId(missing), "") << missing;
+  const char* missing[] = {"CPP", "Py", "R", ".cpp", "main.cpp", "tar.gz", "d.ts", "cpp ", "js", "json",
+                           "md", "htm", "yml", "xsl", "css", "python", "", "cpp;h", ";"};
+  for (const char* extension : missing) EXPECT_STREQ(languages.LanguageId(extension), "") << extension;
   EXPECT_STREQ(languages.LanguageId(nullptr), "");
 }
 

@@ -37,12 +37,8 @@ TEST(ClientCapabilities, WorkspaceAndTextDocumentOpenAsServersExpect) {
 
 TEST(ClientCapabilities, ValueListsAreLeftOutOnlyWhenEmptied) {
   LSP::CompletionItemKindCapabilities kinds;
-  EXPECT_EQ(kinds.valueSet.size(), 25u);
   kinds.valueSet.clear();
   EXPECT_EQ(Written(kinds), R"("completionItemKind":{})");
-  LSP::SymbolKindCapabilities symbols;
-  EXPECT_EQ(symbols.valueSet.front(), 1);
-  EXPECT_EQ(symbols.valueSet.back(), 26);
   // String lists are written even when emptied.
   LSP::HoverClientCapabilities hover;
   hover.contentFormat.clear();

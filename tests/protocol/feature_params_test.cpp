@@ -29,66 +29,6 @@ T AtPosition(int line, int character) {
 
 std::string Json(LSP::JsonObject& value) { return LSP::ToJsonText(value); }
 
-TEST(FeatureParams, PositionRequestsWriteDocumentPositionThenTheirOwnMembers) {
-  auto position = AtPosition<LSP::TextDocumentPositionParams>(3, 7);
-  EXPECT_EQ(Json(position), std::string("{") + kDocument + R"(,"position":{"line":3,"character":7}})");
-
-  auto completion = AtPosition<LSP::CompletionParams>(1, 2);
-  EXPECT_EQ(Json(completion), std::string("{") + kDocument +
-                                  R"(,"position":{"line":1,"character":2},"context":{"triggerKind":1}})");
-  completion.context.triggerKind = 2;
-  completion.context.triggerCharacter = ".";
-  EXPECT_EQ(Json(completion), std::string("{") + kDocument +
-                                  R"(,"position":{"line":1,"character":2},"context":{"triggerKind":2,"triggerCharacter":"."}})");
-
-  auto references = AtPosition<LSP::ReferenceParams>(0, 0);
-  references.context.includeDeclaration = true;
-  EXPECT_EQ(Json(references), std::string("{") + kDocument +
-                                  R"(,"position":{"line":0,"character":0},"context":{"includeDeclaration":true}})");
-
-  auto rename = AtPosition<LSP::RenameParams>(4, 5);
-  rename.newName = "Limit";
-  EXPECT_EQ(Json(rename), std::string("{") + kDocument + R"(,"position":{"line":4,"character":5},"newName":"Limit"})");
-}
-
-TEST(FeatureParams, DocumentRequestsAndNotificationsWriteExactlyTheirMembers) {
-  auto symbols = WithDocument<LSP::DocumentSymbolParams>();
-  auto save = WithDocument<LSP::DidSaveTextDocumentParams>();
-  auto close = WithDocument<LSP::DidCloseTextDocumentParams>();
-  const std::string documentOnly = std::string("{") + kDocument + "}";
-  EXPECT_EQ(Json(symbols), documentOnly);
-  EXPECT_EQ(Json(save), documentOnly);
-  EXPECT_EQ(Json(close), documentOnly);
-
-  auto formatting = WithDocument<LSP::DocumentFormattingParams>();
-  formatting.options.tabSize = 2;
-  EXPECT_EQ(Json(formatting), std::string("{") + kDocument + R"(,"options":{"tabSize":2,"insertSpaces":true}})");
-
-  auto rangeFormatting = WithDocument<LSP::DocumentRangeFormattingParams>();
-  rangeFormatting.range = LSP::Range(LSP::Position(1, 0), LSP::Position(2, 0));
-  rangeFormatting.options.insertSpaces = false;
-  EXPECT_EQ(Json(rangeFormatting),
-            std::string("{") + kDocument +
-                R"(,"range":{"start":{"line":1,"character":0},"end":{"line":2,"character":0}},)"
-                R"("options":{"tabSize":4,"insertSpaces":false}})");
-
-  LSP::DidOpenTextDocumentParams open;
-  open.textDocument.uri = "file:///a.c";
-  open.textDocument.languageId = "c";
-  open.textDocument.version = 1;
-  EXPECT_EQ(Json(open), R"({"textDocument":{"uri":"file:///a.c","languageId":"c","version":1,"text":""}})");
-
-  LSP::DidChangeTextDocumentParams change;
-  change.textDocument = LSP::VersionedTextDocumentIdentifier("file:///a.c", 2);
-  change.contentChanges.resize(2);
-  change.contentChanges[0].range.reset(new LSP::Range(LSP::Position(0, 1), LSP::Position(0, 2)));
-  change.contentChanges[0].text = "x";
-  change.contentChanges[1].text = "whole";
-  EXPECT_EQ(Json(change), R"({"textDocument":{"uri":"file:///a.c","version":2},"contentChanges":[)"
-                          R"({"range":{"start":{"line":0,"character":1},"end":{"line":0,"character":2}},"text":"x"},)"
-                          R"({"text":"whole"}]})");
-}
-
 TEST(FeatureParams, WorkspaceSymbolQueryIsWrittenEvenWhenEmpty) {
   LSP::WorkspaceSymbolParams params;
   EXPECT_EQ(Json(params), R"({"query":""})");
@@ -123,7 +63,34 @@ TEST(FeatureParams, CodeActionContextGivesDiagnosticsBackInTheProtocolsShape) {
   EXPECT_EQ(Json(built), R"({"start":{"line":3,"character":0},"end":{"line":3,"character":1},"code":42,"message":"m"})");
 }
 
-TEST(FeatureParams, NewerRequestsAndNotificationsWriteExactlyTheirMembers) {
+TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
+  auto position = AtPosition<LSP::TextDocumentPositionParams>(3, 7);
+  auto completion = AtPosition<LSP::CompletionParams>(1, 2);
+  auto triggered = AtPosition<LSP::CompletionParams>(1, 2);
+  triggered.context.triggerKind = 2;
+  triggered.context.triggerCharacter = ".";
+  auto references = AtPosition<LSP::ReferenceParams>(0, 0);
+  references.context.includeDeclaration = true;
+  auto rename = AtPosition<LSP::RenameParams>(4, 5);
+  rename.newName = "Limit";
+  auto symbols = WithDocument<LSP::DocumentSymbolParams>();
+  auto save = WithDocument<LSP::DidSaveTextDocumentParams>();
+  auto close = WithDocument<LSP::DidCloseTextDocumentParams>();
+  auto formatting = WithDocument<LSP::DocumentFormattingParams>();
+  formatting.options.tabSize = 2;
+  auto rangeFormatting = WithDocument<LSP::DocumentRangeFormattingParams>();
+  rangeFormatting.range = LSP::Range(LSP::Position(1, 0), LSP::Position(2, 0));
+  rangeFormatting.options.insertSpaces = false;
+  LSP::DidOpenTextDocumentParams open;
+  open.textDocument.uri = "file:///a.c";
+  open.textDocument.languageId = "c";
+  open.textDocument.version = 1;
+  LSP::DidChangeTextDocumentParams change;
+  change.textDocument = LSP::VersionedTextDocumentIdentifier("file:///a.c", 2);
+  change.contentChanges.resize(2);
+  change.contentChanges[0].range.reset(new LSP::Range(LSP::Position(0, 1), LSP::Position(0, 2)));
+  change.contentChanges[0].text = "x";
+  change.contentChanges[1].text = "whole";
   LSP::ExecuteCommandParams execute;
   execute.command = "run";
   auto selection = WithDocument<LSP::SelectionRangeParams>();
@@ -143,12 +110,27 @@ TEST(FeatureParams, NewerRequestsAndNotificationsWriteExactlyTheirMembers) {
   callsBuilt.item.uri = "file:///a.c";
   LSP::ApplyWorkspaceEditResult answer;
   answer.failureReason = "read-only";
+  const std::string document = std::string("{") + kDocument;
   const std::pair<LSP::JsonObject*, std::string> rows[] = {
+      {&position, document + R"(,"position":{"line":3,"character":7}})"},
+      {&completion, document + R"(,"position":{"line":1,"character":2},"context":{"triggerKind":1}})"},
+      {&triggered, document + R"(,"position":{"line":1,"character":2},"context":{"triggerKind":2,"triggerCharacter":"."}})"},
+      {&references, document + R"(,"position":{"line":0,"character":0},"context":{"includeDeclaration":true}})"},
+      {&rename, document + R"(,"position":{"line":4,"character":5},"newName":"Limit"})"},
+      {&symbols, document + "}"},
+      {&save, document + "}"},
+      {&close, document + "}"},
+      {&formatting, document + R"(,"options":{"tabSize":2,"insertSpaces":true}})"},
+      {&rangeFormatting, document + R"(,"range":{"start":{"line":1,"character":0},"end":{"line":2,"character":0}},)"
+                                    R"("options":{"tabSize":4,"insertSpaces":false}})"},
+      {&open, R"({"textDocument":{"uri":"file:///a.c","languageId":"c","version":1,"text":""}})"},
+      {&change, R"({"textDocument":{"uri":"file:///a.c","version":2},"contentChanges":[)"
+                R"({"range":{"start":{"line":0,"character":1},"end":{"line":0,"character":2}},"text":"x"},)"
+                R"({"text":"whole"}]})"},
       {&execute, R"({"command":"run"})"},
-      {&selection, std::string("{") + kDocument +
-                       R"(,"positions":[{"line":1,"character":2},{"line":3,"character":4}]})"},
-      {&hints, std::string("{") + kDocument + R"(,"range":{"start":{"line":0,"character":0},"end":{"line":9,"character":0}}})"},
-      {&willSave, std::string("{") + kDocument + R"(,"reason":3})"},
+      {&selection, document + R"(,"positions":[{"line":1,"character":2},{"line":3,"character":4}]})"},
+      {&hints, document + R"(,"range":{"start":{"line":0,"character":0},"end":{"line":9,"character":0}}})"},
+      {&willSave, document + R"(,"reason":3})"},
       {&configuration, R"({"settings":null})"},
       {&folders, R"({"event":{"added":[{"uri":"file:///b","name":"b"}],"removed":[]}})"},
       {&resolveBuilt, R"({"label":"push_back"})"},
@@ -157,7 +139,7 @@ TEST(FeatureParams, NewerRequestsAndNotificationsWriteExactlyTheirMembers) {
                     R"("end":{"line":0,"character":0}}}})"},
       {&answer, R"({"applied":false,"failureReason":"read-only"})"},
   };
-  for (const auto& [params, expected] : rows) EXPECT_EQ(Json(*params), expected);
+  for (const auto& [params, expected] : rows) EXPECT_EQ(Json(*params), expected) << expected;
 
   execute.arguments = R"([{"file":"a.c"},2])";
   configuration.settings = R"({"pylsp":{"plugins":{}}})";

@@ -140,13 +140,3 @@ TEST(Envelope, BadIdsRaiseConversionAndTypeErrors) {
   EXPECT_NO_THROW(response.Read(reader));
   EXPECT_EQ(response.id, 1);
 }
-
-TEST(Envelope, DebugFlagIsTheHostsOwn) {
-  LSP::ResponseMessage response(nullptr);
-  EXPECT_FALSE(response.WantDebug());
-  response.WantDebug(true);
-  EXPECT_TRUE(response.WantDebug());
-  std::string text = "unchanged";
-  EXPECT_TRUE(LSP::ResponseMessage::ReadDebug(text));
-  EXPECT_EQ(text, "unchanged");
-}

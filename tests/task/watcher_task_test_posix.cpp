@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <atomic>
 #include <chrono>
 #include <filesystem>
 #include <fstream>
@@ -105,6 +106,14 @@ TEST_F(WatcherTaskTest, ChangedFilesWithWatchedExtensionsRunTheCommand) {
   EXPECT_EQ(xWatcher_Have("cpp"), nullptr);
 }
 
+// A task whose trace callback tries to release it on any notice (a plain function: global).
+std::atomic<xWatcherTask*> releasing{nullptr};
+
+void ReleaseOnNotice(TraceType type, const char* title, const char* text) {
+  watchtest::RecordTrace(type, title, text);
+  if (xWatcherTask* task = releasing.load(); task && type == TraceType::Notice) task->Release();
+}
+
 TEST_F(WatcherTaskTest, RegistryKnowsTasksByName) {
   xWatcherOptions options = Options("true");
   EXPECT_EQ(xWatcher_Task("none", options, {}), nullptr);
@@ -130,12 +139,22 @@ TEST_F(WatcherTaskTest, RegistryKnowsTasksByName) {
   }
   std::vector<std::string> directories{Dir()};
   for (const auto& entry : unwatchable) directories.push_back(entry.first);
-  xWatcherTask* missing = xWatcher_Task("missing", options, directories);
+  xWatcherOptions releasingOptions = options;
+  releasingOptions.trace = ReleaseOnNotice;
+  xWatcherTask* missing = xWatcher_Task("missing", releasingOptions, directories);
+  missing->AddExtension(".cpp");
   missing->Start();
   for (const auto& [directory, reason] : unwatchable) {
     EXPECT_TRUE(Traced(Error("Watcher Task: 'missing' => Cannot watch directory: " + directory + ": " + reason + "\n")))
         << directory;
   }
+  // Its callback, on the watching thread, cannot release the task: that would wait for itself.
+  releasing = missing;
+  watchtest::Touch(dir_ / "new.cpp");
+  EXPECT_TRUE(WaitForLine(Error(
+      "Watcher Task: 'missing' => Release refused: called from the task's own callback, it would wait for itself.\n")));
+  EXPECT_EQ(xWatcher_Have("missing"), missing);
+  releasing = nullptr;
   missing->Release();
   first->Release();
   EXPECT_EQ(xWatcher_Have("twice"), nullptr);

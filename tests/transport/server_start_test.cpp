@@ -15,10 +15,10 @@ using Texts = std::vector<std::string>;
 
 TEST_F(ServerStart, ProcessThatExitsAtOnceIsAFailedStartWithItsOutput) {
   xServerStart start = FakeStart({"stdout=banner\\n;exit=0"}, 200, LSP::TraceLevel::Messages);
-  vexil::xServer server(start);
-  EXPECT_FALSE(server.Start());
+  auto server = FailedStart(start);
+  ASSERT_TRUE(server);
   EXPECT_EQ(TraceLog::Texts(), (Texts{"banner\n", kFailedStart, kCheckDetails, kHint}));
-  EXPECT_FALSE(server.HaveErrors());
+  EXPECT_FALSE(server->HaveErrors());
 }
 
 TEST_F(ServerStart, DestructorReturnsPromptlyWhileServerAndGrandchildHoldThePipes) {
@@ -32,10 +32,11 @@ TEST_F(ServerStart, DestructorReturnsPromptlyWhileServerAndGrandchildHoldThePipe
   vexil_test::KillProcess(id);
 
   // The server is gone but what it left behind keeps the pipes for 20 s more: neither
-  // the failed start nor the destructor may wait for it.
+  // the failed start nor the destructor may wait for it. (The start fails unless a busy
+  // machine kept the server past the start's look.)
   auto orphaned = std::make_unique<vexil::xServer>(FakeStart({"grandchild=20000;exit=0"}));
   closing = std::chrono::steady_clock::now();
-  EXPECT_FALSE(orphaned->Start());
+  orphaned->Start();
   orphaned.reset();
   EXPECT_LT(std::chrono::steady_clock::now() - closing, 2s);
 }

@@ -72,17 +72,16 @@ TEST_F(ServerStart, MissingExecutableOrDirectoryReportsInOrderWithTheHintOnce) {
 TEST_F(ServerStart, ProgramsThatEndAtOnceThroughTheInterpreterOrNotAreFailedStarts) {
   xServerStart truth = FakeStart({}, 200, LSP::TraceLevel::Off);
   truth.executable = "true";
-  vexil::xServer exitsAtOnce(truth);
-  EXPECT_FALSE(exitsAtOnce.Start());
+  auto exitsAtOnce = FailedStart(truth);
+  ASSERT_TRUE(exitsAtOnce);
   EXPECT_EQ(TraceLog::Texts(), (Texts{kFailedStart, kCheckDetails, kHint}));
 
   // Through the interpreter a missing program is the interpreter's to report.
-  TraceLog::Clear();
   xServerStart command = FakeStart({}, 200, LSP::TraceLevel::Messages);
   command.useCommand = true;
   command.executable = "no-such-language-server-here --stdio";
-  vexil::xServer missing(command);
-  EXPECT_FALSE(missing.Start());
+  auto missing = FailedStart(command);
+  ASSERT_TRUE(missing);
   Texts texts = TraceLog::Texts();
   ASSERT_EQ(texts.size(), 4u);
   EXPECT_NE(texts[0].find("not found"), std::string::npos) << texts[0];

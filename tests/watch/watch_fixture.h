@@ -32,12 +32,12 @@ inline void Touch(const std::string& path) { std::ofstream(path).put('x'); }
 // Guards whatever a test collects from callbacks and lets the test thread wait on it.
 class Shared {
  public:
+  // Notifies under the lock: a waiter that returns may end the process, and a callback
+  // thread must not touch this object after it could have.
   template <typename Change>
   void Update(Change change) {
-    {
-      std::lock_guard<std::mutex> lock(mutex_);
-      change();
-    }
+    std::lock_guard<std::mutex> lock(mutex_);
+    change();
     changed_.notify_all();
   }
 

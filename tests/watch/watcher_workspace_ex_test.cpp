@@ -10,7 +10,6 @@
 #include <memory>
 #include <thread>
 #include <tuple>
-#include <utility>
 
 #include "watch_callbacks.h"
 
@@ -133,17 +132,17 @@ TEST_F(WatcherWorkspaceExTest, BelowVerboseOnlyErrorLinesAreWritten) {
 }
 
 // What the change callback below acts on: the callbacks are plain functions.
-xWatcherWorkspaceEx* acting = nullptr;
+std::atomic<xWatcherWorkspaceEx*> acting{nullptr};
 std::string secondRoot;
 bool started = false;
 
 void ActOnChange(xWatcherProjectEx* project, xChangeEvent* event) {
   RecordChange(project, event);
   if (event->name == "start") {
-    acting->Start("second", secondRoot.c_str(), nullptr);
+    acting.load()->Start("second", secondRoot.c_str(), nullptr);
     Recorded().shared.Update([] { started = true; });
   }
-  if (event->name == "destroy") delete std::exchange(acting, nullptr);
+  if (event->name == "destroy") delete acting.exchange(nullptr);
 }
 
 TEST_F(WatcherWorkspaceExTest, CallbackMayStartProjectsAndDestroyingItsWatcherIsReported) {
@@ -151,7 +150,7 @@ TEST_F(WatcherWorkspaceExTest, CallbackMayStartProjectsAndDestroyingItsWatcherIs
   secondRoot = second.Path().string();
   started = false;
   acting = xWatcher_WorkspaceEx(ActOnChange, RecordTrace, LSP::TraceLevel::Messages);
-  acting->Start("first", first.Path().string().c_str(), nullptr);
+  acting.load()->Start("first", first.Path().string().c_str(), nullptr);
 
   Touch(first / "start");
   ASSERT_TRUE(Recorded().shared.WaitUntil([] { return started; })) << "Start hung in the callback";

@@ -20,8 +20,6 @@ void CloseInput();
 long WriteOutput(int stream, const char* bytes, unsigned size);
 std::string CurrentDirectory();
 [[noreturn]] void SleepUntilKilled();
-// Ends the process abruptly, as a crash would.
-[[noreturn]] void Crash();
 // Starts this program again with `argument`, inheriting the standard streams.
 void SpawnSelf(const std::string& argument);
 unsigned long ProcessId();

@@ -40,11 +40,6 @@ void SleepUntilKilled() {
   for (;;) pause();
 }
 
-void Crash() {
-  kill(getpid(), SIGKILL);
-  for (;;) pause();
-}
-
 void SpawnSelf(const std::string& argument) {
   std::vector<char*> argv = {const_cast<char*>(self.c_str()), const_cast<char*>(argument.c_str()), nullptr};
   pid_t child;

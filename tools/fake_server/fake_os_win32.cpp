@@ -24,7 +24,9 @@ void PrepareProcess(const char*, unsigned lifetimeSeconds) {
 
 long ReadInput(char* buffer, unsigned size) { return _read(0, buffer, size); }
 
-void CloseInput() { _close(0); }
+// The runtime's descriptor is left alone: the system's handle behind it is what the
+// client writes to.
+void CloseInput() { CloseHandle(reinterpret_cast<HANDLE>(_get_osfhandle(0))); }
 
 long WriteOutput(int stream, const char* bytes, unsigned size) { return _write(stream, bytes, size); }
 
@@ -34,11 +36,6 @@ std::string CurrentDirectory() {
 }
 
 void SleepUntilKilled() {
-  for (;;) Sleep(INFINITE);
-}
-
-void Crash() {
-  TerminateProcess(GetCurrentProcess(), 9);
   for (;;) Sleep(INFINITE);
 }
 

@@ -23,8 +23,8 @@
 //   pause=MS                  wait MS milliseconds before the next directive
 //   fail-once=PATH            exit with code 1 unless PATH exists, creating it
 //   diagnose                  publish diagnostics of opened and changed documents (below)
-// Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/crash" (half a
-// frame, then killed after params.delay ms), "fake/cwd", "fake/received" (the notifications seen so far),
+// Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/stall" (a
+// notification and half a frame, then nothing until killed), "fake/cwd", "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
 // params: delay (ms), stderr, garbage (raw stdout text), notifications (count), stale
 // (ids answered first), ask (methods sent to the client, each answer awaited), chatter
@@ -369,10 +369,12 @@ void Diagnose(const rapidjson::Value& params) {
 void HandleRequest(const std::string& method, const rapidjson::Value& params, const std::string& id,
                    const Options& options) {
   if (method == "fake/exit") std::_Exit(IntParam(params, "code"));
-  if (method == "fake/crash") {
-    fake::WriteRaw(fake::kStdout, "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
-    Pause(IntParam(params, "delay"));
-    fake::Crash();
+  if (method == "fake/stall") {
+    // In one write: a client that has read the notification has been sent the half frame,
+    // and can end the server in the middle of it.
+    fake::WriteRaw(fake::kStdout, fake::Frame(R"({"jsonrpc":"2.0","method":"fake/progress","params":{}})") +
+                                      "Content-Length: 100\r\n\r\n{\"jsonrpc\":");
+    fake::SleepUntilKilled();
   }
   Prelude(method, params);
   if (method == "fake/silent") return;

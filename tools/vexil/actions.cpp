@@ -1,56 +1,50 @@
-// Performing one action: its params built with zero-based positions, one call of the
-// connection, and the reply kept with the failure state the library reports.
+// Performing one action: its params built with zero-based positions in UTF-16 units, one
+// call of the connection, and the reply kept with the failure state the library reports.
 #include "actions.h"
 
-#include <chrono>
-#include <thread>
-
+#include "columns.h"
 #include "vexil/client/uri.h"
 
 namespace cli {
 namespace {
 
-struct ActionName {
-  ActionKind kind;
-  const char* option;
-  bool query;
+const std::vector<ActionInfo> kActions = {
+    {ActionKind::Open, "--open", Operand::File, "textDocument/didOpen", false, "open the file (didOpen)"},
+    {ActionKind::Hover, "--hover", Operand::Position, "textDocument/hover", true, "the hover text"},
+    {ActionKind::Definition, "--definition", Operand::Position, "textDocument/definition", true,
+     "where the symbol is defined"},
+    {ActionKind::Declaration, "--declaration", Operand::Position, "textDocument/declaration", true,
+     "where it is declared"},
+    {ActionKind::TypeDefinition, "--type-definition", Operand::Position, "textDocument/typeDefinition", true,
+     "where its type is defined"},
+    {ActionKind::Implementation, "--implementation", Operand::Position, "textDocument/implementation", true,
+     "its implementations"},
+    {ActionKind::References, "--references", Operand::Position, "textDocument/references", true,
+     "its uses, declaration included"},
+    {ActionKind::Completion, "--completion", Operand::Position, "textDocument/completion", true,
+     "completions, one a line"},
+    {ActionKind::Signature, "--signature", Operand::Position, "textDocument/signatureHelp", true,
+     "the signatures of the call"},
+    {ActionKind::Symbols, "--symbols", Operand::File, "textDocument/documentSymbol", true, "the file's symbols"},
+    {ActionKind::WorkspaceSymbols, "--workspace-symbols", Operand::Query, "workspace/symbol", true,
+     "symbols of the workspace matching QUERY"},
+    {ActionKind::Format, "--format", Operand::File, "textDocument/formatting", true, "formatting, as a diff"},
+    {ActionKind::RangeFormat, "--range-format", Operand::Range, "textDocument/rangeFormatting", true,
+     "formatting of the range, as a diff"},
+    {ActionKind::Rename, "--rename", Operand::Rename, "textDocument/rename", true,
+     "the edits of a rename, as a diff (not applied)"},
+    {ActionKind::Change, "--change", Operand::File, "textDocument/didChange", false, "send the file's current text"},
+    {ActionKind::Save, "--save", Operand::File, "textDocument/didSave", false, "tell the server it was saved"},
+    {ActionKind::Close, "--close", Operand::File, "textDocument/didClose", false, "close it"},
+    {ActionKind::Diagnostics, "--diagnostics", Operand::File, "textDocument/diagnostic", true,
+     "its errors and warnings: path:line:col: severity: message [source code]"},
 };
-
-constexpr ActionName kActionNames[] = {
-    {ActionKind::Open, "--open", false},
-    {ActionKind::Hover, "--hover", true},
-    {ActionKind::Definition, "--definition", true},
-    {ActionKind::Declaration, "--declaration", true},
-    {ActionKind::TypeDefinition, "--type-definition", true},
-    {ActionKind::Implementation, "--implementation", true},
-    {ActionKind::References, "--references", true},
-    {ActionKind::Completion, "--completion", true},
-    {ActionKind::Signature, "--signature", true},
-    {ActionKind::Symbols, "--symbols", true},
-    {ActionKind::WorkspaceSymbols, "--workspace-symbols", true},
-    {ActionKind::Format, "--format", true},
-    {ActionKind::RangeFormat, "--range-format", true},
-    {ActionKind::Rename, "--rename", true},
-    {ActionKind::Change, "--change", false},
-    {ActionKind::Save, "--save", false},
-    {ActionKind::Close, "--close", false},
-    {ActionKind::Diagnostics, "--diagnostics", true},
-};
-
-const ActionName& NameOf(ActionKind kind) {
-  for (const ActionName& name : kActionNames) {
-    if (name.kind == kind) return name;
-  }
-  return kActionNames[0];
-}
-
-LSP::Position ZeroBased(int line, int column) { return LSP::Position(line - 1, column - 1); }
 
 template <typename P>
 P Positioned(Session& session, const Action& action) {
   P params;
-  params.textDocument.uri = session.Document(action.file);
-  params.position = ZeroBased(action.line, action.column);
+  params.textDocument.uri = session.Document(action.path);
+  params.position = ProtocolPosition(action.path, action.line, action.column);
   return params;
 }
 
@@ -75,7 +69,7 @@ std::vector<FileEdits> Edits(const LSP::WorkspaceEdit& edit) {
 }
 
 std::vector<FileEdits> Formatting(Session& session, const Action& action) {
-  std::string uri = session.Document(action.file);
+  std::string uri = session.Document(action.path);
   std::vector<LSP::TextEdit> edits;
   if (action.kind == ActionKind::Format) {
     LSP::DocumentFormattingParams params;
@@ -84,34 +78,20 @@ std::vector<FileEdits> Formatting(Session& session, const Action& action) {
   } else {
     LSP::DocumentRangeFormattingParams params;
     params.textDocument.uri = uri;
-    params.range = LSP::Range(ZeroBased(action.line, action.column), ZeroBased(action.endLine, action.endColumn));
+    params.range = LSP::Range(ProtocolPosition(action.path, action.line, action.column),
+                              ProtocolPosition(action.path, action.endLine, action.endColumn));
     edits = session.Server().TextDocument_RangeFormatting(&params);
   }
-  return {{AbsolutePath(action.file), edits}};
-}
-
-// A server that announced a provider answers the pull, which stores its report; any other
-// publishes by itself after didOpen, so the store is watched until the time-out.
-std::vector<LSP::Diagnostic> Diagnostics(Session& session, const Action& action) {
-  xLanguageServer& server = session.Server();
-  int before = server.DiagnosticsVersion();
-  LSP::TextDocumentIdentifier document;
-  document.uri = session.Document(action.file);
-  server.TextDocument_PullDiagnostics(&document);
-  auto deadline = std::chrono::steady_clock::now() + std::chrono::milliseconds(session.Timeout());
-  while (server.DiagnosticsVersion() == before && std::chrono::steady_clock::now() < deadline) {
-    std::this_thread::sleep_for(std::chrono::milliseconds(20));
-  }
-  return server.TextDocument_Diagnostics(document.uri.c_str());
+  return {{action.path, edits}};
 }
 
 void Ask(Session& session, const Action& action, Outcome& outcome) {
   xLanguageServer& server = session.Server();
   switch (action.kind) {
-    case ActionKind::Open: session.Document(action.file); break;
-    case ActionKind::Change: session.Change(action.file); break;
-    case ActionKind::Save: session.Save(action.file); break;
-    case ActionKind::Close: session.Close(action.file); break;
+    case ActionKind::Open: session.Document(action.path); break;
+    case ActionKind::Change: session.Change(action.path); break;
+    case ActionKind::Save: session.Save(action.path); break;
+    case ActionKind::Close: session.Close(action.path); break;
     case ActionKind::Hover: {
       auto params = Positioned<LSP::TextDocumentPositionParams>(session, action);
       outcome.hover = server.TextDocument_Hover(&params);
@@ -129,7 +109,7 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
     }
     case ActionKind::Symbols: {
       LSP::DocumentSymbolParams params;
-      params.textDocument.uri = session.Document(action.file);
+      params.textDocument.uri = session.Document(action.path);
       outcome.symbols = server.TextDocument_DocumentSymbol(&params);
       break;
     }
@@ -141,7 +121,7 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
     }
     case ActionKind::Format:
     case ActionKind::RangeFormat: outcome.edits = Formatting(session, action); break;
-    case ActionKind::Diagnostics: outcome.diagnostics = Diagnostics(session, action); break;
+    case ActionKind::Diagnostics: outcome.diagnostics = session.Diagnostics(action.path); break;
     case ActionKind::Rename: {
       auto params = Positioned<LSP::RenameParams>(session, action);
       params.newName = action.text;
@@ -154,22 +134,32 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
 
 }  // namespace
 
-const char* OptionName(ActionKind kind) { return NameOf(kind).option; }
+const std::vector<ActionInfo>& Actions() { return kActions; }
 
-bool ActionOfOption(const std::string& option, ActionKind& kind) {
-  for (const ActionName& name : kActionNames) {
-    if (option == name.option) {
-      kind = name.kind;
-      return true;
-    }
-  }
-  return false;
+const ActionInfo& InfoOf(ActionKind kind) {
+  for (const ActionInfo& info : kActions)
+    if (info.kind == kind) return info;
+  return kActions.front();
 }
 
-bool IsQuery(ActionKind kind) { return NameOf(kind).query; }
+const ActionInfo* ActionOfOption(const std::string& option) {
+  for (const ActionInfo& info : kActions)
+    if (option == info.option) return &info;
+  return nullptr;
+}
+
+const char* OperandForm(Operand operand) {
+  switch (operand) {
+    case Operand::File: return "FILE";
+    case Operand::Position: return "FILE:LINE:COL";
+    case Operand::Range: return "FILE:L1:C1:L2:C2";
+    case Operand::Rename: return "FILE:LINE:COL:NEWNAME";
+    default: return "QUERY";
+  }
+}
 
 std::string Describe(const Action& action) {
-  std::string name = std::string(OptionName(action.kind)).substr(2);
+  std::string name = std::string(InfoOf(action.kind).option).substr(2);
   if (action.kind == ActionKind::WorkspaceSymbols) return name + " " + action.text;
   std::string where = action.file;
   if (action.line > 0) where += ":" + std::to_string(action.line) + ":" + std::to_string(action.column);
@@ -182,7 +172,7 @@ Outcome Perform(Session& session, const Action& action) {
   Outcome outcome;
   session.Mark();
   Ask(session, action, outcome);
-  outcome.failed = session.Failed(outcome.why);
+  outcome.failed = session.Failed(InfoOf(action.kind).method, outcome.why);
   return outcome;
 }
 

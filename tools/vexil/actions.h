@@ -1,5 +1,15 @@
 // What `vexil lsp` can be asked to do, one action per document notification or feature
 // request, and what each action got back from the server.
+//
+// Conventions every action keeps (new ones join the table in actions.cpp):
+// - an action is one option, "--NAME OPERAND" or "--NAME=OPERAND", performed in order after
+//   the server's command; FILE operands are resolved against --root, must exist and hold
+//   UTF-8 text, and are opened (didOpen) before their first action;
+// - lines and columns count from 1, columns in bytes as compilers print them, both ways;
+// - readable output starts with the action as Describe() names it, then its answer indented,
+//   "(none)" for an empty one; --json writes one object per line (see render.h);
+// - a failure is one reason in Outcome::why: printed, and the exit status becomes 1; a
+//   method the server does not offer reads "SERVER does not support METHOD".
 #pragma once
 
 #include <string>
@@ -14,10 +24,22 @@ enum class ActionKind {
   Signature, Symbols, WorkspaceSymbols, Format, RangeFormat, Rename, Change, Save, Close, Diagnostics
 };
 
-// Lines and columns count from 1, as people do.
+// How an action's operand is written on the command line.
+enum class Operand { File, Position, Range, Rename, Query };
+
+struct ActionInfo {
+  ActionKind kind;
+  const char* option;  // "--hover"
+  Operand operand;
+  const char* method;  // the protocol method it sends
+  bool query;          // whether it prints an answer
+  const char* help;    // one line for --help
+};
+
 struct Action {
   ActionKind kind = ActionKind::Open;
-  std::string file;
+  std::string file;  // as given
+  std::string path;  // absolute, resolved against the root
   int line = 0;
   int column = 0;
   int endLine = 0;
@@ -43,12 +65,12 @@ struct Outcome {
   std::string why;  // when failed
 };
 
-// The option that asks for `kind`, e.g. "--hover".
-const char* OptionName(ActionKind kind);
-// The kind `option` asks for; false when it names no action.
-bool ActionOfOption(const std::string& option, ActionKind& kind);
-// Whether the action sends a request whose answer is printed.
-bool IsQuery(ActionKind kind);
+const std::vector<ActionInfo>& Actions();
+const ActionInfo& InfoOf(ActionKind kind);
+// The action `option` asks for (without any "=OPERAND"), or null.
+const ActionInfo* ActionOfOption(const std::string& option);
+// The operand as the help text writes it: "FILE:LINE:COL".
+const char* OperandForm(Operand operand);
 // The action as a person would name it: "hover main.cpp:15:18".
 std::string Describe(const Action& action);
 

@@ -6,7 +6,7 @@
 #include <filesystem>
 
 #include "commands.h"
-#include "lsp_options.h"
+#include "options.h"
 #include "session.h"
 #include "text_edits.h"
 #include "trace_sink.h"
@@ -32,7 +32,7 @@ std::string Elapsed(std::chrono::steady_clock::time_point start) {
 Action At(ActionKind kind, const std::string& path, const std::string& needle, std::size_t offset) {
   Action action;
   action.kind = kind;
-  action.file = path;
+  action.file = action.path = path;
   std::vector<std::string> lines = SplitLines(ReadText(path));
   for (std::size_t line = 0; line < lines.size(); ++line) {
     std::size_t at = lines[line].find(needle);
@@ -52,12 +52,22 @@ int LineOf(const std::string& path, const std::string& needle) {
   }
 }
 
+std::string DemoHelp() {
+  return "Usage: vexil demo [--examples=DIR]\n"
+         "Show the library driving clangd over DIR/cpp and pylsp over DIR/python (hover, definition,\n"
+         "references, completion, symbols, formatting, rename), then a workspace watcher and a\n"
+         "watcher task over a temporary directory. DIR defaults to the source tree's examples.\n";
+}
+
 int RunDemo(const Arguments& arguments) {
   std::string examples = VEXIL_EXAMPLES;
-  if (arguments.size() == 2 && arguments[0] == "--examples") examples = arguments[1];
-  else if (!arguments.empty()) throw UsageError("demo takes only --examples DIR");
+  OptionReader reader(arguments);
+  while (!reader.Done()) {
+    if (reader.Is("--examples")) examples = reader.Value();
+    else reader.Unknown();
+  }
   examples = AbsolutePath(examples);
-  EchoTrace(false);  // failures are explained by the checks; the trace would drown them
+  ShowTrace(LSP::TraceLevel::Off);  // failures are explained by the checks; the trace would drown them
   auto start = std::chrono::steady_clock::now();
   std::printf("vexil demo: the library driving real language servers and a directory watcher\n");
   try {

@@ -58,7 +58,7 @@ std::string At(const Action& action) {
 
 Outcome Checked(Session& session, const Action& action, const std::string& title) {
   Outcome outcome = Perform(session, action);
-  Expect(!outcome.failed, title + " " + Describe(action) + " failed: " + outcome.why);
+  Expect(!outcome.failed, title + " " + Describe(action) + ": " + outcome.why);
   return outcome;
 }
 
@@ -117,7 +117,7 @@ void ShowAssistance(Session& session, const Tour& tour, const std::string& main)
 
   Action symbols;
   symbols.kind = ActionKind::Symbols;
-  symbols.file = main.substr(0, main.rfind('/') + 1) + tour.symbolsFile;
+  symbols.file = symbols.path = main.substr(0, main.rfind('/') + 1) + tour.symbolsFile;
   std::vector<std::string> names;
   for (const LSP::SymbolInformation& symbol : Checked(session, symbols, tour.title).symbols) {
     names.push_back(std::string(SymbolKindName(symbol.kind)) + " " + symbol.name);
@@ -135,7 +135,7 @@ void ShowEdits(Session& session, const Tour& tour, const Action& call, const std
   if (tour.format) {
     Action format;
     format.kind = ActionKind::Format;
-    format.file = main;
+    format.file = format.path = main;
     Outcome formatted = Checked(session, format, tour.title);
     Expect(!formatted.edits.empty() && !formatted.edits[0].edits.empty(),
            tour.title + " proposed no formatting for " + Name(main) + ", whose layout is odd on purpose");
@@ -166,9 +166,7 @@ void Run(const Tour& tour, const std::string& examples) {
   Session session(options);
   auto start = std::chrono::steady_clock::now();
   std::string why;
-  bool started = session.Start();
-  bool failed = session.Failed(why);
-  Expect(started && !failed, tour.title + " did not start (is it installed? `make deps` installs it): " + why);
+  Expect(session.Start(why), why + " (is it installed? `make deps` installs it)");
   Report("start", "process " + std::to_string(session.Server().Id()) + ", initialized in " + Elapsed(start));
 
   std::string main = directory + "/" + tour.files.back();

@@ -1,39 +1,103 @@
-// `vexil lsp`: starts one server, performs the actions in order, prints each answer, and
-// ends the server. Any failed action makes the exit status 1.
+// `vexil lsp`: checks the files, starts one server, performs the actions in order, prints
+// each answer, and ends the server. Any failure makes the exit status 1; an interrupt
+// ends the server with it.
 #include <iostream>
 
 #include "commands.h"
+#include "host_process.h"
 #include "lsp_options.h"
 #include "render.h"
 #include "trace_sink.h"
+#include "vexil/client/uri.h"
 
 namespace cli {
+namespace {
+
+constexpr const char* kDetails = " (rerun with --trace verbose for details)";
+
+// A failure before any answer, in the form asked for.
+int Fail(const LspOptions& options, const std::string& action, const std::string& why) {
+  if (options.json) PrintJsonError(std::cout, action, why);
+  std::cout.flush();
+  std::cerr << "vexil: " << why << "\n";
+  return 1;
+}
+
+// Servers rename only what they know: with no index, the files they have opened.
+void NoteOpenOnly(Session& session, const Outcome& outcome) {
+  for (const FileEdits& file : outcome.edits)
+    if (!session.IsOpen(file.path)) return;
+  std::cerr << "vexil: note: " << session.Program() << " proposed edits only in files it has opened; "
+            << "files it has not indexed are not included (open them first with --open)\n";
+}
+
+}  // namespace
+
+std::string LspHelp() {
+  std::string text =
+      "Usage: vexil lsp [OPTION]... -- SERVER [ARG]... ACTION...\n"
+      "Start the language server SERVER (with up to seven ARGs), perform the actions in order,\n"
+      "print each answer, then end the server.\n"
+      "\n"
+      "Options:\n"
+      "  --root=DIR        workspace root, the server's directory and the base of relative FILEs\n"
+      "                    (default: the current directory)\n"
+      "  --timeout=MS      wait for each answer (default 5000; initialize waits at least 10000)\n"
+      "  --language=ID     language id of every file, instead of the one its extension gives\n"
+      "  --json            one JSON object per answer and per failure (JSON Lines)\n"
+      "  --trace=LEVEL     show the library's trace on stderr: off, messages or verbose\n"
+      "  --help            show this help\n"
+      "\n"
+      "Actions (lines and columns count from 1, columns in bytes):\n";
+  for (const ActionInfo& info : Actions()) {
+    std::string left = std::string("  ") + info.option + " " + OperandForm(info.operand);
+    text += left + std::string(left.size() < 42 ? 42 - left.size() : 1, ' ') + info.help + "\n";
+  }
+  return text +
+         "A file is opened before its first action. Exit status: 0 success, 1 a file, the server\n"
+         "or an action failed, 2 bad usage, 130 or 143 when interrupted.\n";
+}
 
 int RunLsp(const Arguments& arguments) {
   LspOptions options = ParseLspOptions(arguments);
+  ShowTrace(options.session.trace);
+  if (FileToUri(options.session.root.c_str()).empty()) {
+    return Fail(options, "start", options.session.root + ": the root cannot be written as a file URI");
+  }
+  for (const Action& action : options.actions) {
+    if (action.file.empty()) continue;
+    try {
+      CheckDocument(action.path, action.file);
+    } catch (const Failure& failure) {
+      return Fail(options, std::string(InfoOf(action.kind).option).substr(2), failure.what());
+    }
+  }
   Session session(options.session);
   std::string why;
-  bool started = session.Start();
-  if (session.Failed(why) || !started) {
-    std::cerr << "vexil: " << options.session.program << " did not start: "
-              << (why.empty() ? "the server is not running" : why) << "\n";
-    return 1;
+  if (!session.Start(why)) {
+    if (Interrupted()) return 128 + Interrupted();
+    if (options.session.trace != LSP::TraceLevel::Verbose) why += kDetails;
+    return Fail(options, "start", why);
   }
   int status = 0;
   for (const Action& action : options.actions) {
+    if (Interrupted()) break;
     Outcome outcome = Perform(session, action);
+    if (Interrupted()) break;
     if (options.json) PrintJson(std::cout, action, outcome);
-    else PrintReadable(std::cout, action, outcome);
+    else if (!outcome.failed) PrintReadable(std::cout, action, outcome);
+    std::cout.flush();
     if (outcome.failed) {
       status = 1;
-      if (!IsQuery(action.kind)) std::cerr << "vexil: " << Describe(action) << " failed: " << outcome.why << "\n";
+      std::cerr << "vexil: " << Describe(action) << ": " << outcome.why << "\n";
+    } else if (action.kind == ActionKind::Rename && !outcome.edits.empty()) {
+      NoteOpenOnly(session, outcome);
     }
   }
-  std::cout.flush();
-  if (!session.Stop()) {
-    std::cerr << "vexil: " << options.session.program << " did not end after exit\n";
-    status = 1;
-  }
+  if (Interrupted()) return 128 + Interrupted();
+  // The library waits about a second for the server to end; the answers are in, and a
+  // slower server is ended rather than left running.
+  if (!session.Stop()) EndChildren();
   return status;
 }
 

@@ -2,19 +2,7 @@
 // the first action option, so servers keep options of their own (--log=error).
 #include "lsp_options.h"
 
-#include <cstdlib>
-
 namespace cli {
-
-int PositiveNumber(const std::string& text, const std::string& what) {
-  char* end = nullptr;
-  long value = std::strtol(text.c_str(), &end, 10);
-  if (text.empty() || *end != '\0' || value < 1 || value > 1000000000) {
-    throw UsageError(what + " must be a positive number, not '" + text + "'");
-  }
-  return static_cast<int>(value);
-}
-
 namespace {
 
 constexpr std::size_t kMaxServerArguments = 7;  // the start record's argument slots
@@ -41,10 +29,12 @@ void ReadPosition(const std::string& text, Action& action) {
   action.column = PositiveNumber(pieces[2], "COL");
 }
 
-void ReadOperand(const std::string& text, Action& action) {
-  switch (action.kind) {
-    case ActionKind::WorkspaceSymbols: action.text = text; break;
-    case ActionKind::Rename: {
+void ReadOperand(const std::string& text, Operand operand, Action& action) {
+  switch (operand) {
+    case Operand::Query: action.text = text; break;
+    case Operand::File: action.file = text; break;
+    case Operand::Position: ReadPosition(text, action); break;
+    case Operand::Rename: {
       std::size_t colon = text.rfind(':');
       if (colon == std::string::npos || colon + 1 == text.size()) {
         throw UsageError("expected FILE:LINE:COL:NEWNAME, not '" + text + "'");
@@ -53,7 +43,7 @@ void ReadOperand(const std::string& text, Action& action) {
       ReadPosition(text.substr(0, colon), action);
       break;
     }
-    case ActionKind::RangeFormat: {
+    case Operand::Range: {
       std::vector<std::string> pieces = SplitFromRight(text, 4, "FILE:L1:C1:L2:C2");
       action.file = pieces[0];
       action.line = PositiveNumber(pieces[1], "L1");
@@ -62,9 +52,6 @@ void ReadOperand(const std::string& text, Action& action) {
       action.endColumn = PositiveNumber(pieces[4], "C2");
       break;
     }
-    case ActionKind::Open: case ActionKind::Symbols: case ActionKind::Format: case ActionKind::Change:
-    case ActionKind::Save: case ActionKind::Close: case ActionKind::Diagnostics: action.file = text; break;
-    default: ReadPosition(text, action); break;
   }
 }
 
@@ -75,30 +62,29 @@ LSP::TraceLevel TraceLevelOf(const std::string& text) {
   throw UsageError("--trace takes off, messages or verbose, not '" + text + "'");
 }
 
-// Reads the options before "--"; returns the index after "--".
-std::size_t ReadOptions(const std::vector<std::string>& arguments, LspOptions& options) {
-  std::size_t i = 0;
-  auto value = [&](const std::string& option) -> const std::string& {
-    if (i + 1 >= arguments.size()) throw UsageError(option + " needs a value");
-    return arguments[++i];
-  };
-  for (; i < arguments.size() && arguments[i] != "--"; ++i) {
-    const std::string& option = arguments[i];
-    if (option == "--trace") options.session.trace = TraceLevelOf(value(option));
-    else if (option == "--timeout") options.session.timeout = PositiveNumber(value(option), "--timeout");
-    else if (option == "--root") options.session.root = value(option);
-    else if (option == "--language") options.session.language = value(option);
-    else if (option == "--json") options.json = true;
-    else throw UsageError("unknown option '" + option + "'");
+const ActionInfo* ActionAt(const OptionReader& reader) {
+  return reader.Done() ? nullptr : ActionOfOption(reader.Current().substr(0, reader.Current().find('=')));
+}
+
+// Reads the options up to "--".
+void ReadOptions(OptionReader& reader, LspOptions& options) {
+  while (!reader.Done() && reader.Current() != "--") {
+    if (reader.Is("--trace")) options.session.trace = TraceLevelOf(reader.Value());
+    else if (reader.Is("--timeout")) options.session.timeout = PositiveNumber(reader.Value(), "--timeout");
+    else if (reader.Is("--root")) options.session.root = reader.Value();
+    else if (reader.Is("--language")) options.session.language = reader.Value();
+    else if (reader.Is("--json")) reader.Flag(), options.json = true;
+    else if (ActionAt(reader)) throw UsageError(reader.Current() + " is an action: it follows '-- SERVER [ARG]...'");
+    else reader.Unknown();
   }
-  if (i == arguments.size()) throw UsageError("the server command must follow '--'");
-  return i + 1;
+  if (reader.Done()) throw UsageError("the server command must follow '--'");
+  reader.Take();
 }
 
 void CheckLanguages(const LspOptions& options) {
   if (!options.session.language.empty()) return;
   for (const Action& action : options.actions) {
-    if (!action.file.empty() && TableLanguageOf(action.file).empty()) {
+    if (!action.file.empty() && KnownLanguageOf(action.file).empty()) {
       throw UsageError("no language id is known for '" + action.file + "'; give one with --language ID");
     }
   }
@@ -109,24 +95,25 @@ void CheckLanguages(const LspOptions& options) {
 LspOptions ParseLspOptions(const std::vector<std::string>& arguments) {
   LspOptions options;
   options.session.name = "vexil-lsp";
-  std::size_t i = ReadOptions(arguments, options);
-  if (i == arguments.size()) throw UsageError("the server command must follow '--'");
-  options.session.program = arguments[i++];
-  Action action;
-  for (; i < arguments.size() && !ActionOfOption(arguments[i], action.kind); ++i) {
-    options.session.arguments.push_back(arguments[i]);
-  }
+  OptionReader reader(arguments);
+  ReadOptions(reader, options);
+  if (reader.Done()) throw UsageError("the server command must follow '--'");
+  options.session.program = reader.Take();
+  while (!reader.Done() && !ActionAt(reader)) options.session.arguments.push_back(reader.Take());
   if (options.session.arguments.size() > kMaxServerArguments) throw UsageError("a server takes at most seven arguments");
-  for (; i < arguments.size(); ++i) {
-    if (!ActionOfOption(arguments[i], action.kind)) throw UsageError("unknown action '" + arguments[i] + "'");
-    if (++i == arguments.size()) throw UsageError(arguments[i - 1] + " needs a value");
-    Action next;
-    next.kind = action.kind;
-    ReadOperand(arguments[i], next);
-    options.actions.push_back(next);
+  while (!reader.Done()) {
+    const ActionInfo* info = ActionAt(reader);
+    if (!info) throw UsageError("unknown action '" + reader.Current() + "'");
+    Action action;
+    action.kind = info->kind;
+    ReadOperand(reader.Value(), info->operand, action);
+    options.actions.push_back(action);
   }
   if (options.actions.empty()) throw UsageError("no action given");
   options.session.root = AbsolutePath(options.session.root.empty() ? "." : options.session.root);
+  for (Action& action : options.actions) {
+    if (!action.file.empty()) action.path = ResolvePath(options.session.root, action.file);
+  }
   CheckLanguages(options);
   return options;
 }

@@ -2,20 +2,14 @@
 // actions that follow it, checked before anything is launched.
 #pragma once
 
-#include <stdexcept>
 #include <string>
 #include <vector>
 
 #include "actions.h"
+#include "options.h"
 #include "session.h"
 
 namespace cli {
-
-// Bad usage; the text says what was wrong, the caller adds the usage text.
-class UsageError : public std::runtime_error {
- public:
-  using std::runtime_error::runtime_error;
-};
 
 struct LspOptions {
   SessionOptions session;
@@ -23,10 +17,8 @@ struct LspOptions {
   std::vector<Action> actions;
 };
 
-// `text` as a number from 1 up; throws UsageError naming `what` otherwise.
-int PositiveNumber(const std::string& text, const std::string& what);
-
-// `arguments` are those after "lsp". Throws UsageError.
+// `arguments` are those after "lsp". Files are resolved against the root, not yet checked.
+// Throws UsageError, or HelpRequested for "--help".
 LspOptions ParseLspOptions(const std::vector<std::string>& arguments);
 
 }  // namespace cli

@@ -4,54 +4,75 @@
 #include <iostream>
 
 #include "commands.h"
-#include "lsp_options.h"
+#include "host_process.h"
 
 namespace {
 
-const char kUsage[] =
-    "usage: vexil lsp [--trace off|messages|verbose] [--timeout MS] [--root DIR] [--language ID] [--json]\n"
-    "                 -- SERVER [ARGS...] ACTION...\n"
-    "       vexil watch DIR...\n"
-    "       vexil task --ext EXT[,EXT...] --run 'COMMAND with $FN tags' [--shell] [--timeout MS] DIR...\n"
-    "       vexil demo [--examples DIR]\n"
-    "\n"
-    "lsp actions, performed in order (lines and columns count from 1):\n"
-    "  --open FILE                --hover FILE:LINE:COL         --definition FILE:LINE:COL\n"
-    "  --declaration FILE:LINE:COL --type-definition FILE:LINE:COL --implementation FILE:LINE:COL\n"
-    "  --references FILE:LINE:COL --completion FILE:LINE:COL    --signature FILE:LINE:COL\n"
-    "  --symbols FILE             --workspace-symbols QUERY     --format FILE\n"
-    "  --range-format FILE:L1:C1:L2:C2  --rename FILE:LINE:COL:NEWNAME\n"
-    "  --change FILE (sends its current text)  --save FILE  --close FILE\n"
-    "  --diagnostics FILE (path:line:col: severity: message [source code])\n"
-    "A file is opened before its first action. Trace lines go to stderr; the time-out is\n"
-    "5000 ms and the root the current directory unless given.\n"
-    "task: runs the command for each changed file with a watched extension; without --shell\n"
-    "the first word of --run is the program and the rest one argument; tags: $FN full name,\n"
-    "$F file name, $FB base name, $EXT extension, $FDD directory.\n"
-    "exit status: 0 success, 1 a server or request failed, 2 bad usage\n";
+struct Command {
+  const char* name;
+  int (*run)(const cli::Arguments&);
+  std::string (*help)();
+  const char* synopsis;
+};
 
-int Dispatch(const cli::Arguments& arguments) {
+const Command kCommands[] = {
+    {"lsp", cli::RunLsp, cli::LspHelp, "[OPTION]... -- SERVER [ARG]... ACTION...  ask a language server"},
+    {"watch", cli::RunWatch, cli::WatchHelp, "DIR...  print every change below the directories"},
+    {"task", cli::RunTask, cli::TaskHelp, "--ext EXT[,EXT]... --run COMMAND [OPTION]... DIR...  run a command "
+                                           "for each changed file"},
+    {"demo", cli::RunDemo, cli::DemoHelp, "[--examples DIR]  show the library driving clangd, pylsp and watchers"},
+};
+
+std::string Usage() {
+  std::string text = "Usage:";
+  for (const Command& command : kCommands) {
+    text += std::string(text == "Usage:" ? " " : "       ") + "vexil " + command.name + " " + command.synopsis + "\n";
+  }
+  return text +
+         "       vexil --help | --version\n"
+         "\n'vexil COMMAND --help' shows a command's options. Exit status: 0 success, 1 failure,\n"
+         "2 bad usage, 130 or 143 when interrupted by Ctrl-C or SIGTERM.\n";
+}
+
+const Command* Find(const std::string& name) {
+  for (const Command& command : kCommands)
+    if (name == command.name) return &command;
+  return nullptr;
+}
+
+int Run(const cli::Arguments& arguments, std::string& helpName) {
   if (arguments.empty()) throw cli::UsageError("no command given");
-  const std::string& command = arguments[0];
-  cli::Arguments rest(arguments.begin() + 1, arguments.end());
-  if (command == "lsp") return cli::RunLsp(rest);
-  if (command == "watch") return cli::RunWatch(rest);
-  if (command == "task") return cli::RunTask(rest);
-  if (command == "demo") return cli::RunDemo(rest);
-  if (command == "--help" || command == "-h" || command == "help") {
-    std::cout << kUsage;
+  const std::string& name = arguments[0];
+  if (name == "--version") {
+    std::cout << "vexil " VEXIL_VERSION "\n";
     return 0;
   }
-  throw cli::UsageError("unknown command '" + command + "'");
+  if (name == "--help" || name == "-h" || name == "help") {
+    std::cout << Usage();
+    return 0;
+  }
+  const Command* command = Find(name);
+  if (!command) throw cli::UsageError("unknown command '" + name + "'");
+  helpName = "vexil " + name;
+  try {
+    return command->run(cli::Arguments(arguments.begin() + 1, arguments.end()));
+  } catch (const cli::HelpRequested&) {
+    std::cout << command->help();
+    return 0;
+  }
 }
 
 }  // namespace
 
 int main(int argc, char** argv) {
+  // A task's command, run by the task itself: nothing of the host's set-up applies.
+  if (argc == 2 && argv[1][0] == cli::kWordSeparator) return cli::RunWords(argv[1]);
+  cli::WatchProcess();
+  std::string helpName = "vexil";
   try {
-    return Dispatch(cli::Arguments(argv + 1, argv + argc));
+    return Run(cli::Arguments(argv + 1, argv + argc), helpName);
   } catch (const cli::UsageError& error) {
-    std::cerr << "vexil: " << error.what() << "\n\n" << kUsage;
+    std::cerr << "vexil: " << error.what() << ". Try '" << helpName << " --help'\n";
     return 2;
   } catch (const std::exception& error) {
     std::cerr << "vexil: " << error.what() << "\n";

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <filesystem>
 
+#include "columns.h"
 #include "text_edits.h"
 #include "vexil/client/text_edits.h"
 #include "vexil/client/uri.h"
@@ -20,9 +21,7 @@ std::string Relative(const std::string& path) {
 }
 
 std::string SourceLine(const std::string& path, int line) {
-  std::vector<std::string> lines = SplitLines(ReadText(path));
-  if (line < 0 || static_cast<std::size_t>(line) >= lines.size()) return "";
-  std::string text = lines[static_cast<std::size_t>(line)];
+  std::string text = LineOf(path, line);
   text.erase(0, text.find_first_not_of(" \t"));
   return text;
 }
@@ -65,7 +64,7 @@ void PrintDiagnostics(std::ostream& out, const std::string& path, const std::vec
     std::string origin = diagnostic.source + (diagnostic.source.empty() || diagnostic.codeText.empty() ? "" : " ") +
                          diagnostic.codeText;
     LSP::Location location;
-    location.uri = FileToUri(AbsolutePath(path).c_str());
+    location.uri = FileToUri(path.c_str());
     location.range = diagnostic.range;
     out << Where(location) << ": "
         << SeverityName(diagnostic.severity) << ": " << diagnostic.message
@@ -82,8 +81,9 @@ void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files) {
 }  // namespace
 
 std::string Where(const LSP::Location& location) {
-  return Relative(UriToFile(location.uri.c_str())) + ":" + std::to_string(location.range.start.line + 1) + ":" +
-         std::to_string(location.range.start.character + 1);
+  std::string path = UriToFile(location.uri.c_str());
+  return Relative(path) + ":" + std::to_string(location.range.start.line + 1) + ":" +
+         std::to_string(ByteColumn(path, location.range.start));
 }
 
 const char* SymbolKindName(int kind) {
@@ -92,6 +92,14 @@ const char* SymbolKindName(int kind) {
                                       "constant", "string", "number", "boolean", "array", "object", "key",
                                       "null", "enum member", "struct", "event", "operator", "type parameter"};
   return kind >= 1 && kind <= 26 ? names[kind - 1] : "symbol";
+}
+
+const char* CompletionKindName(int kind) {
+  static const char* const names[] = {"text", "method", "function", "constructor", "field", "variable", "class",
+                                      "interface", "module", "property", "unit", "value", "enum", "keyword",
+                                      "snippet", "color", "file", "reference", "folder", "enum member", "constant",
+                                      "struct", "event", "operator", "type parameter"};
+  return kind >= 1 && kind <= 25 ? names[kind - 1] : "text";
 }
 
 const char* SeverityName(int severity) {
@@ -115,12 +123,8 @@ std::string EditsAsDiff(const FileEdits& file) {
 }
 
 void PrintReadable(std::ostream& out, const Action& action, const Outcome& outcome) {
-  if (!IsQuery(action.kind)) return;
+  if (!InfoOf(action.kind).query) return;
   out << Describe(action) << "\n";
-  if (outcome.failed) {
-    out << "  failed: " << outcome.why << "\n";
-    return;
-  }
   switch (action.kind) {
     case ActionKind::Hover: {
       std::string text = HoverText(outcome.hover);
@@ -141,7 +145,7 @@ void PrintReadable(std::ostream& out, const Action& action, const Outcome& outco
     case ActionKind::Format:
     case ActionKind::RangeFormat:
     case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
-    case ActionKind::Diagnostics: PrintDiagnostics(out, action.file, outcome.diagnostics); break;
+    case ActionKind::Diagnostics: PrintDiagnostics(out, action.path, outcome.diagnostics); break;
     default: PrintLocations(out, outcome.locations); break;
   }
 }

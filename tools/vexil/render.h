@@ -1,5 +1,13 @@
 // Printing what an action got back: a readable form (locations with their source line,
-// one completion per line, hover text as is, edits as a diff) or one JSON object.
+// one completion per line, hover text as is, edits as a diff) or JSON Lines.
+//
+// JSON Lines: one object per query action, in order, and one per failure:
+//   {"action":"hover","file":"main.cpp","line":15,"column":18,"failed":false,"result":...}
+//   {"action":"start","failed":true,"error":"clangd exited with status 1: ..."}
+// "file", "line", "column" and "text" (a query or new name) echo the operand; "result" is
+// a text (hover), or an array of objects with "path" (absolute), "line", "column",
+// "endLine", "endColumn" (from 1, columns in bytes) and the answer's own members. Every
+// "kind" and "severity" is a name ("function", "error"), as in the readable form.
 #pragma once
 
 #include <ostream>
@@ -10,13 +18,17 @@
 namespace cli {
 
 void PrintReadable(std::ostream& out, const Action& action, const Outcome& outcome);
-// One line of JSON; lines and columns count from 1, as on the command line.
 void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome);
+// The object of a failure that belongs to no answer: "start", or an action whose file failed.
+void PrintJsonError(std::ostream& out, const std::string& action, const std::string& why);
 
-// "path:line:col" of a location, the path relative to the current directory when below it.
+// "path:line:col" of a location, the path relative to the current directory when below it
+// and the column in bytes.
 std::string Where(const LSP::Location& location);
 // The name of a protocol symbol kind ("class", "function", ...), or "symbol".
 const char* SymbolKindName(int kind);
+// The name of a completion item kind ("method", "keyword", ...), or "text".
+const char* CompletionKindName(int kind);
 // "error", "warning", "info" or "hint"; a diagnostic without a severity counts as an error.
 const char* SeverityName(int severity);
 // The hover's text: its markup value, or else its marked strings one after the other.

@@ -1,29 +1,32 @@
 // The JSON form of an action's result, one object per line, written with the library's
-// writer. Lines and columns count from 1 here, as they do on the command line.
+// writer. Lines and columns count from 1 here, columns in bytes, as on the command line.
 #include "render.h"
 
+#include "columns.h"
 #include "vexil/client/uri.h"
 #include "vexil/json/json.h"
 
 namespace cli {
 namespace {
 
-void Point(LSP::xWriter& writer, const char* line, const char* column, const LSP::Position& position) {
+void Point(LSP::xWriter& writer, const char* line, const char* column, const std::string& path,
+           const LSP::Position& position) {
   writer.Int(line, position.line + 1);
-  writer.Int(column, position.character + 1);
+  writer.Int(column, ByteColumn(path, position));
 }
 
-void Span(LSP::xWriter& writer, const LSP::Range& range) {
-  Point(writer, "line", "column", range.start);
-  Point(writer, "endLine", "endColumn", range.end);
+// The path and the range in it.
+void Span(LSP::xWriter& writer, const std::string& path, const LSP::Range& range) {
+  writer.RequiredString("path", path);
+  Point(writer, "line", "column", path, range.start);
+  Point(writer, "endLine", "endColumn", path, range.end);
 }
 
 void Locations(LSP::xWriter& writer, const std::vector<LSP::Location>& locations) {
   writer.StartArray("result");
   for (const LSP::Location& location : locations) {
     writer.StartObject();
-    writer.RequiredString("path", UriToFile(location.uri.c_str()));
-    Span(writer, location.range);
+    Span(writer, UriToFile(location.uri.c_str()), location.range);
     writer.EndObject();
   }
   writer.EndArray();
@@ -36,8 +39,7 @@ void Symbols(LSP::xWriter& writer, const char* name, const std::vector<LSP::Symb
     writer.RequiredString("name", symbol.name);
     writer.RequiredString("kind", SymbolKindName(symbol.kind));
     writer.String("container", symbol.containerName);
-    writer.RequiredString("path", UriToFile(symbol.location.uri.c_str()));
-    Span(writer, symbol.location.range);
+    Span(writer, UriToFile(symbol.location.uri.c_str()), symbol.location.range);
     if (!symbol.children.empty()) Symbols(writer, "children", symbol.children);
     writer.EndObject();
   }
@@ -49,8 +51,7 @@ void Edits(LSP::xWriter& writer, const std::vector<FileEdits>& files) {
   for (const FileEdits& file : files) {
     for (const LSP::TextEdit& edit : file.edits) {
       writer.StartObject();
-      writer.RequiredString("path", file.path);
-      Span(writer, edit.range);
+      Span(writer, file.path, edit.range);
       writer.RequiredString("newText", edit.newText);
       writer.EndObject();
     }
@@ -63,7 +64,7 @@ void Completion(LSP::xWriter& writer, const LSP::CompletionList& list) {
   for (const LSP::CompletionItem& item : list.items) {
     writer.StartObject();
     writer.RequiredString("label", item.label);
-    writer.Int("kind", item.kind);
+    writer.RequiredString("kind", CompletionKindName(item.kind));
     writer.String("detail", item.detail);
     writer.String("insertText", item.insertText);
     writer.EndObject();
@@ -87,12 +88,11 @@ void Signature(LSP::xWriter& writer, const LSP::SignatureHelp& help) {
   writer.Int("activeParameter", help.activeParameter);
 }
 
-void Diagnostics(LSP::xWriter& writer, const std::string& file, const std::vector<LSP::Diagnostic>& diagnostics) {
+void Diagnostics(LSP::xWriter& writer, const std::string& path, const std::vector<LSP::Diagnostic>& diagnostics) {
   writer.StartArray("result");
   for (const LSP::Diagnostic& diagnostic : diagnostics) {
     writer.StartObject();
-    writer.RequiredString("path", AbsolutePath(file));
-    Span(writer, diagnostic.range);
+    Span(writer, path, diagnostic.range);
     writer.RequiredString("severity", SeverityName(diagnostic.severity));
     writer.RequiredString("message", diagnostic.message);
     writer.String("source", diagnostic.source);
@@ -112,7 +112,7 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
     case ActionKind::Format:
     case ActionKind::RangeFormat:
     case ActionKind::Rename: Edits(writer, outcome.edits); break;
-    case ActionKind::Diagnostics: Diagnostics(writer, action.file, outcome.diagnostics); break;
+    case ActionKind::Diagnostics: Diagnostics(writer, action.path, outcome.diagnostics); break;
     default: Locations(writer, outcome.locations); break;
   }
 }
@@ -120,10 +120,10 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
 }  // namespace
 
 void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome) {
-  if (!IsQuery(action.kind)) return;
+  if (!InfoOf(action.kind).query && !outcome.failed) return;
   LSP::xWriter writer;
   writer.StartObject();
-  writer.RequiredString("action", std::string(OptionName(action.kind)).substr(2));
+  writer.RequiredString("action", std::string(InfoOf(action.kind).option).substr(2));
   writer.String("file", action.file);
   if (action.line > 0) {
     writer.Int("line", action.line);
@@ -133,6 +133,16 @@ void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome) 
   writer.Bool("failed", outcome.failed);
   if (outcome.failed) writer.RequiredString("error", outcome.why);
   else Result(writer, action, outcome);
+  writer.EndObject();
+  out << writer.GetString() << "\n";
+}
+
+void PrintJsonError(std::ostream& out, const std::string& action, const std::string& why) {
+  LSP::xWriter writer;
+  writer.StartObject();
+  writer.RequiredString("action", action);
+  writer.Bool("failed", true);
+  writer.RequiredString("error", why);
   writer.EndObject();
   out << writer.GetString() << "\n";
 }

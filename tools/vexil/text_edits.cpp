@@ -5,6 +5,8 @@
 #include <algorithm>
 #include <sstream>
 
+#include "columns.h"
+
 namespace cli {
 namespace {
 

@@ -5,8 +5,7 @@
 #include <memory>
 
 #include "commands.h"
-#include "interrupt.h"
-#include "lsp_options.h"
+#include "host_process.h"
 #include "session.h"
 #include "trace_sink.h"
 #include "vexil/watch/watcher_ex.h"
@@ -36,29 +35,37 @@ void PrintChange(xWatcherProjectEx* project, xChangeEvent* event) {
 
 }  // namespace
 
+std::string WatchHelp() {
+  return "Usage: vexil watch DIR...\n"
+         "Print every file and directory created, removed or renamed below the directories, one\n"
+         "line each (\"DIR: added NAME\"), until Ctrl-C.\n";
+}
+
 int RunWatch(const Arguments& arguments) {
-  if (arguments.empty()) throw UsageError("watch needs at least one directory");
-  for (const std::string& directory : arguments) {
-    std::error_code error;
-    if (!std::filesystem::is_directory(directory, error)) {
-      std::fprintf(stderr, "vexil: not a directory: %s\n", directory.c_str());
-      return 1;
-    }
+  std::vector<std::string> directories;
+  OptionReader reader(arguments);
+  while (!reader.Done()) {
+    if (reader.IsOption()) reader.Unknown();
+    directories.push_back(reader.Take());
   }
-  PrepareForInterrupt();
+  if (directories.empty()) throw UsageError("watch needs at least one directory");
+  for (const std::string& directory : directories) {
+    std::error_code error;
+    if (!std::filesystem::is_directory(directory, error)) throw Failure(directory + ": not a directory");
+  }
   std::unique_ptr<xWatcherWorkspaceEx> watcher(xWatcher_WorkspaceEx(&PrintChange, &TraceToStderr, LSP::TraceLevel::Off));
   int errors = TraceErrors();
-  for (const std::string& directory : arguments) {
+  for (const std::string& directory : directories) {
     std::string root = AbsolutePath(directory);
     watcher->Start(directory.c_str(), root.c_str(), nullptr);
   }
   if (TraceErrors() != errors) return 1;
-  std::fprintf(stderr, "vexil: watching %zu director%s; Ctrl-C ends\n", arguments.size(),
-               arguments.size() == 1 ? "y" : "ies");
-  WaitForInterrupt();
+  std::fprintf(stderr, "vexil: watching %zu director%s; Ctrl-C ends\n", directories.size(),
+               directories.size() == 1 ? "y" : "ies");
+  int signal = WaitForInterrupt();
   watcher.reset();
   std::fprintf(stderr, "vexil: stopped watching\n");
-  return 0;
+  return 128 + signal;
 }
 
 }  // namespace cli

@@ -1,5 +1,6 @@
 // Conversion between file paths and "file" URIs, as the protocol names documents and roots.
-// Both give "" for empty input and for a conversion that fails or exceeds 259 characters.
+// Both give "" for empty input and for a conversion that fails or whose result exceeds the
+// platform's path limit: 259 characters on Windows, PATH_MAX - 1 (4095 on Linux) on POSIX.
 #pragma once
 
 #include <string>

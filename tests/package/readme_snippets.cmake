@@ -1,0 +1,32 @@
+# vexil_readme_snippets(README OUT): writes OUT, a program whose functions hold the README's
+# ```cpp blocks as their bodies, after only #include <vexil/vexil.h>. The names a snippet
+# takes from the host around it are the functions' parameters, and OnTrace.
+function(vexil_readme_snippets readme out)
+  set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS "${readme}")
+  file(READ "${readme}" rest)
+  set(code "// Generated from ${readme}: its C++ snippets, compiled and linked.\n#include <vexil/vexil.h>\n\n")
+  string(APPEND code "void OnTrace(TraceType, const char*, const char*) {}\n\n")
+  set(count 0)
+  while(TRUE)
+    string(FIND "${rest}" "```cpp\n" start)
+    if(start EQUAL -1)
+      break()
+    endif()
+    math(EXPR start "${start} + 7")
+    string(SUBSTRING "${rest}" ${start} -1 rest)
+    string(FIND "${rest}" "\n```" end)
+    string(SUBSTRING "${rest}" 0 ${end} body)
+    math(EXPR count "${count} + 1")
+    string(APPEND code "void Snippet${count}([[maybe_unused]] xLanguageServer* server,\n"
+                       "    [[maybe_unused]] const std::vector<std::string>& openDocuments) {\n${body}\n}\n\n")
+    math(EXPR end "${end} + 4")
+    string(SUBSTRING "${rest}" ${end} -1 rest)
+  endwhile()
+  if(count EQUAL 0)
+    message(FATAL_ERROR "${readme} has no C++ snippet")
+  endif()
+  string(APPEND code "int main() { return 0; }\n")
+  # Rewritten only when the snippets change, so that an unchanged README builds nothing.
+  file(WRITE "${out}.new" "${code}")
+  configure_file("${out}.new" "${out}" COPYONLY)
+endfunction()
