@@ -6,6 +6,7 @@
 #include "vexil/export.h"
 #include "vexil/host/trace.h"
 #include "vexil/host/records.h"
+#include "vexil/host/server_messages.h"
 #include "vexil/host/language_server.h"
 #include "vexil/json/json.h"
 #include "vexil/protocol/message.h"

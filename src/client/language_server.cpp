@@ -58,6 +58,7 @@ bool LanguageServer::Initialize(const xServerInitialise& init) {
   InitializeParams params(init.processId, FileToUri(init.rootPath.c_str()), server.Level(),
                           InitializationOptions(init.options));
   params.workspaceFolders = init.workspaceFolders;
+  params.capabilities.additions = features.capabilities;
   server.WorkspaceFolders(params.workspaceFolders);
   {
     LongerWait wait(server, kInitializeTimeoutMs);
@@ -72,7 +73,7 @@ bool LanguageServer::Initialize(const xServerInitialise& init) {
 bool LanguageServer::Initialized() {
   if (!initialized || !IsRunning()) return false;
   InitializedParams params;
-  Notify("initialized", &params);
+  Send("initialized", &params);
   return true;
 }
 
@@ -92,9 +93,13 @@ bool LanguageServer::Shutdown() {
 
 bool LanguageServer::Exit() {
   if (IsRunning()) {
-    Notify("exit", nullptr);
+    // Answered before "exit": a server must never wait on a host that is going away.
+    server.DeclineHostRequests();
+    Send("exit", nullptr);
     if (!AwaitEnd()) return false;
   }
+  // While the object is whole: the handler may still call Reply.
+  server.FinishMessages();
   Erase(this);
   delete this;
   return true;

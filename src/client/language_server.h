@@ -3,6 +3,8 @@
 // one protocol message.
 #pragma once
 
+#include "client/client_features.h"
+#include "client/json_params.h"
 #include "host/trace_line.h"
 #include "transport/server.h"
 #include "vexil/host/language_server.h"
@@ -48,6 +50,19 @@ class LanguageServer final : public xLanguageServer {
   std::vector<Diagnostic> TextDocument_Diagnostics(const char* uri) override;
   int DiagnosticsVersion() override { return server.Diagnostics().Version(); }
   std::vector<Diagnostic> TextDocument_PullDiagnostics(TextDocumentIdentifier* document) override;
+  bool Enable(const char* feature) override;
+  // Qualified: inside the class the bare name is the member function's.
+  LSP::ServerCapabilities ServerCapabilities() override { return result.capabilities; }
+  const char* ServerCapabilitiesJson() override { return result.capabilitiesJson.c_str(); }
+  std::string Request(const char* method, const char* paramsJson) override;
+  bool Notify(const char* method, const char* paramsJson) override;
+  void SetMessageHandler(xMessageHandler handler, void* userData) override;
+  bool Reply(const char* idJson, const char* resultJson) override { return server.Reply(idJson, resultJson); }
+  bool ReplyError(const char* idJson, int code, const char* message) override {
+    return server.ReplyError(idJson, code, message);
+  }
+  void Cancel() override { server.CancelWait(); }
+  bool SetEnvironment(const char* name, const char* value) override { return server.Environment(name, value); }
 
  protected:
   // Sends "initialized" once the handshake succeeded and the server still runs.
@@ -58,18 +73,23 @@ class LanguageServer final : public xLanguageServer {
  private:
   void TraceInitialise(const xServerInitialise& init) const;
   // The one request pattern: send `method` with `params`, wait for the reply to its id
-  // and read the reply's result into `holder`, which stays empty on any failure.
-  void Request(const char* method, Params* params, Result& holder);
+  // and read the reply's result into `holder`, which stays empty on any failure. True
+  // when the reply came and carried no error.
+  bool Request(const char* method, Params* params, Result& holder);
   // The request pattern for a holder made here, returned with whatever it was given.
   template <typename Holder>
   Holder Ask(const char* method, Params* params, Holder holder = Holder());
-  void Notify(const char* method, Params* params);
+  bool Send(const char* method, Params* params);
+  // Checks a method and its params given as JSON text; false, with the error state set
+  // and traced, when they cannot be sent.
+  bool Prepared(const char* method, const char* paramsJson, JsonParams& params);
   // Polls until the process has ended or the limit has passed; true when it ended.
   bool AwaitEnd();
 
   vexil::xServer server;
   bool initialized = false;
   InitializeResult result;
+  EnabledFeatures features;
 };
 
 template <typename Holder>

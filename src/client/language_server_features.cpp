@@ -26,16 +26,17 @@ class WithReferenceContext : public Params {
 
 }  // namespace
 
-void LanguageServer::Request(const char* method, Params* params, Result& holder) {
+bool LanguageServer::Request(const char* method, Params* params, Result& holder) {
   RequestMessage request(method, params);
   server.Write(request);
   ResponseMessage response(&holder);
   server.Read(request.id, response);
+  return response.id == request.id && !response.HaveError() && !server.HaveErrors();
 }
 
-void LanguageServer::Notify(const char* method, Params* params) {
+bool LanguageServer::Send(const char* method, Params* params) {
   NotificationMessage notification(method, params);
-  server.Write(notification);
+  return server.Write(notification);
 }
 
 CompletionList LanguageServer::TextDocument_Completion(CompletionParams* params) {
@@ -95,15 +96,15 @@ WorkspaceEdit LanguageServer::TextDocument_Rename(RenameParams* params) {
 }
 
 void LanguageServer::TextDocument_DidChange(DidChangeTextDocumentParams* params) {
-  Notify("textDocument/didChange", params);
+  Send("textDocument/didChange", params);
 }
 
 void LanguageServer::TextDocument_DidClose(DidCloseTextDocumentParams* params) {
-  Notify("textDocument/didClose", params);
+  Send("textDocument/didClose", params);
 }
 
-void LanguageServer::TextDocument_DidOpen(DidOpenTextDocumentParams* params) { Notify("textDocument/didOpen", params); }
+void LanguageServer::TextDocument_DidOpen(DidOpenTextDocumentParams* params) { Send("textDocument/didOpen", params); }
 
-void LanguageServer::TextDocument_DidSave(DidSaveTextDocumentParams* params) { Notify("textDocument/didSave", params); }
+void LanguageServer::TextDocument_DidSave(DidSaveTextDocumentParams* params) { Send("textDocument/didSave", params); }
 
 }  // namespace LSP

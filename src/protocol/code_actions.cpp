@@ -2,6 +2,8 @@
 // (command arguments, published diagnostics) travel as the JSON text the server sent.
 #include "vexil/protocol/code_actions.h"
 
+#include "json/json_depth.h"
+#include "json/json_errors.h"
 #include "protocol/json_arrays.h"
 #include "protocol/raw_json.h"
 
@@ -91,7 +93,13 @@ void ExecuteCommandParams::Write(xWriter& writer) {
   WriteRawJson(writer, "arguments", arguments);
 }
 
-void JsonResult::Read(const xObject& value) { json = RawJsonText(value); }
+void JsonResult::Read(const xObject& value) {
+  // Written out recursively: deeper nesting could exhaust a host thread's stack.
+  if (!NestedWithin(value.Value(), kNestingLimit)) {
+    ThrowFormatted("result\nFailed to read JSON value: nested deeper than %d levels", kNestingLimit);
+  }
+  json = RawJsonText(value);
+}
 
 void ApplyWorkspaceEditParams::Read(const xObject& value) {
   label = value.String("label");

@@ -5,6 +5,7 @@
 #include "json/json_depth.h"
 #include "json/rapidjson.h"
 #include "protocol/json_arrays.h"
+#include "protocol/raw_json.h"
 
 namespace LSP {
 
@@ -37,6 +38,11 @@ void InitializeParams::Write(xWriter& writer) {
   if (!workspaceFolders.empty()) WriteArray(writer, "workspaceFolders", workspaceFolders);
 }
 
-void InitializeResult::Read(const xObject& value) { capabilities.Read(value.Object("capabilities")); }
+void InitializeResult::Read(const xObject& value) {
+  xObject read = value.Object("capabilities");
+  // Kept before the model reads it: a reading that fails still leaves the text.
+  capabilitiesJson = NestedWithin(read.Value(), kNestingLimit) ? RawJsonText(read) : "";
+  capabilities.Read(read);
+}
 
 }  // namespace LSP

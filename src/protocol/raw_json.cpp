@@ -2,8 +2,8 @@
 // verbatim. Text is parsed again only when it is written, which is rare (a resolve, a call).
 #include "protocol/raw_json.h"
 
+#include "json/json_depth.h"
 #include "json/json_errors.h"
-#include "json/rapidjson.h"
 
 namespace LSP {
 namespace {
@@ -15,6 +15,18 @@ void Parse(JsonDocument& document, const char* name, const std::string& json) {
 }
 
 }  // namespace
+
+bool ParseJsonText(const std::string& json, JsonDocument& document, std::string& error) {
+  document.Parse<rapidjson::kParseIterativeFlag>(json.c_str(), json.size());
+  if (document.HasParseError()) {
+    error = rapidjson::GetParseError_En(document.GetParseError());
+  } else if (!NestedWithin(document, kNestingLimit)) {
+    error = "nested deeper than " + std::to_string(kNestingLimit) + " levels";
+  } else {
+    return true;
+  }
+  return false;
+}
 
 std::string RawJsonText(const xObject& value) {
   if (value.IsNull()) return "";

@@ -4,9 +4,13 @@
 
 #include <string>
 
-#include "vexil/json/json.h"
+#include "json/rapidjson.h"
 
 namespace LSP {
+
+// Parses `json` (iteratively); false, with the parser's English text in `error`, when it is
+// not JSON or nests deeper than the library may walk when writing it out.
+bool ParseJsonText(const std::string& json, JsonDocument& document, std::string& error);
 
 // The value as compact JSON text; "" for a null or missing value.
 std::string RawJsonText(const xObject& value);

@@ -37,6 +37,23 @@ void ReadLeniently(const xObject& value, Options& options) {
   }
 }
 
+// Reads the synchronisation member leniently: a malformed setting stays at its default.
+void ReadDocumentSync(const xObject& capabilities, TextDocumentSyncOptions& sync, bool& save) {
+  xObject value = capabilities.Object("textDocumentSync");
+  if (value.IsInt()) {
+    sync.change = value.AsInt();
+    sync.openClose = save = sync.change != 0;
+    return;
+  }
+  if (!value.IsObject()) return;
+  sync.openClose = ReadProvider(value, "openClose");
+  sync.change = value.Object("change").IsInt() ? value.Object("change").AsInt() : 0;
+  sync.willSave = ReadProvider(value, "willSave");
+  sync.willSaveWaitUntil = ReadProvider(value, "willSaveWaitUntil");
+  save = ReadProvider(value, "save");
+  sync.save.includeText = ReadOption(value, "save", "includeText");
+}
+
 }  // namespace
 
 void SaveOptions::Read(const xObject& value) { includeText = value.Bool("includeText"); }
@@ -113,6 +130,7 @@ void ServerCapabilities::Read(const xObject& value) {
   callHierarchyProvider = ReadProvider(value, "callHierarchyProvider");
   inlayHintProvider = ReadProvider(value, "inlayHintProvider");
   prepareRenameProvider = ReadOption(value, "renameProvider", "prepareProvider");
+  ReadDocumentSync(value, documentSync, documentSyncSave);
 }
 
 }  // namespace LSP

@@ -22,7 +22,7 @@ void InputWriter::Start() {
 
 InputWriter::Outcome InputWriter::Send(std::string bytes, int limitMs) {
   auto frame = std::make_shared<Frame>(Frame{std::move(bytes), Clock::now() + std::chrono::milliseconds(limitMs),
-                                             limitMs, std::string()});
+                                             limitMs, false, std::string()});
   std::unique_lock<std::mutex> lock(mutex_);
   if (!started_ || closed_) return Outcome::Failed;
   if (frames_.empty() && !writing_) {
@@ -48,7 +48,7 @@ void InputWriter::Answer(std::string bytes, int limitMs, const std::string& meth
       refusal = "1024 earlier answers are still unwritten";
     } else {
       frames_.push_back(std::make_shared<Frame>(
-          Frame{std::move(bytes), Clock::now() + std::chrono::milliseconds(limitMs), limitMs, method}));
+          Frame{std::move(bytes), Clock::now() + std::chrono::milliseconds(limitMs), limitMs, true, method}));
       ++answers_;
       queued_.notify_one();
     }
@@ -86,7 +86,7 @@ void InputWriter::Run() {
       if (stopping_) return;
       frame = frames_.front();
       frames_.pop_front();
-      if (!frame->method.empty()) --answers_;
+      if (frame->answer) --answers_;
       writing_ = true;
     }
     WriteClaimed(*frame);
@@ -125,7 +125,7 @@ void InputWriter::Report(const Frame& frame, Outcome outcome) {
   if (outcome == Outcome::TimedOut) {
     trace_.Error("Write Timeout: the server read nothing for %d ms; its input is closed.\n", frame.limitMs);
   }
-  if (frame.method.empty() || stopping_) return;
+  if (!frame.answer || stopping_) return;
   if (outcome == Outcome::TimedOut) {
     trace_.Error("Answer Failed: %s: the server read nothing for %d ms\n", frame.method.c_str(), frame.limitMs);
   } else {
@@ -141,7 +141,7 @@ void InputWriter::Finish(Frame& frame, Outcome outcome) {
 
 void InputWriter::FailQueued(bool report) {
   for (const std::shared_ptr<Frame>& frame : frames_) {
-    if (report && !frame->method.empty()) {
+    if (report && frame->answer) {
       trace_.Error("Answer Failed: %s: %s\n", frame->method.c_str(), kInputClosed);
     }
     Finish(*frame, Outcome::Failed);

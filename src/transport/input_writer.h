@@ -55,7 +55,8 @@ class InputWriter {
     std::string bytes;
     Clock::time_point deadline;
     int limitMs;
-    std::string method;  // of the request an answer is for; empty for the host's messages
+    bool answer;         // to a request of the server's, rather than the host's own message
+    std::string method;  // of the request an answer is for
     bool done = false;
     Outcome outcome = Outcome::Failed;
   };

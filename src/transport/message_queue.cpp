@@ -21,6 +21,12 @@ void MessageQueue::Finish() {
   ready_.notify_all();
 }
 
+void MessageQueue::Interrupt() {
+  std::lock_guard<std::mutex> lock(mutex_);
+  interrupted_ = true;
+  ready_.notify_all();
+}
+
 std::size_t MessageQueue::Size() const {
   std::lock_guard<std::mutex> lock(mutex_);
   return items_.size();
@@ -38,7 +44,11 @@ std::size_t MessageQueue::Bytes() const {
 
 MessageQueue::Wait MessageQueue::WaitPop(std::string& item, std::chrono::milliseconds limit) {
   std::unique_lock<std::mutex> lock(mutex_);
-  ready_.wait_for(lock, limit, [this] { return !items_.empty() || finished_; });
+  ready_.wait_for(lock, limit, [this] { return !items_.empty() || finished_ || interrupted_; });
+  if (interrupted_) {
+    interrupted_ = false;
+    return Wait::Interrupted;
+  }
   if (TakeFront(item)) return Wait::Taken;
   return finished_ ? Wait::Finished : Wait::TimedOut;
 }

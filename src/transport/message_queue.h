@@ -13,7 +13,7 @@ namespace vexil {
 
 class MessageQueue {
  public:
-  enum class Wait { Taken, TimedOut, Finished };
+  enum class Wait { Taken, TimedOut, Finished, Interrupted };
 
   // Holds at most `byteLimit` bytes, counted by Footprint: nothing may drain the queue
   // for a long time (the host sends no request), so the oldest items give way.
@@ -34,6 +34,8 @@ class MessageQueue {
   // Takes the front item, waiting up to `limit` for one. Finished means the queue is
   // empty and its producer has ended, so waiting longer cannot help.
   Wait WaitPop(std::string& item, std::chrono::milliseconds limit);
+  // Ends the wait in progress, or else the next one, with Interrupted. Any thread.
+  void Interrupt();
 
  private:
   bool TakeFront(std::string& item);
@@ -44,6 +46,7 @@ class MessageQueue {
   std::deque<std::string> items_;
   std::size_t bytes_ = 0;
   bool finished_ = false;
+  bool interrupted_ = false;
 };
 
 }  // namespace vexil

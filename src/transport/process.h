@@ -8,6 +8,8 @@
 
 #include <Poco/Pipe.h>
 
+#include "transport/environment.h"
+
 namespace vexil {
 
 class xProcess {
@@ -22,15 +24,21 @@ class xProcess {
   // empty; the host's current directory is never changed). Null pipes leave the stream
   // as the host has it; a pipe given must be open, or the launch fails. `out` and `err`
   // may be the same pipe. The child's ends are closed here once the child holds them.
-  // Replaces any earlier child, which is abandoned (see Abandon).
+  // Replaces any earlier child, which is abandoned (see Abandon). The child gets the
+  // host's environment with `environment` applied; a bare executable name is looked up
+  // on the child's PATH (POSIX; Windows looks on the host's).
   // Throws Poco::Exception when the launch fails, with the OS error code left for
   // LastSystemErrorText().
   void Launch(const std::string& executable, const std::vector<std::string>& arguments,
-              const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err);
+              const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err,
+              const EnvironmentChanges& environment = {});
 
   // False before a launch and once the child has ended; an error of the query counts as
-  // ended. An ended child is reaped here.
+  // ended. An ended child is reaped here. Safe from any thread, as is Ended.
   bool IsRunning();
+  // Whether a launched child has ended, with its exit status: its exit code, 128 plus the
+  // signal that ended it (POSIX), or -1 when the system could not tell.
+  bool Ended(int& status);
   // The operating system's process id, or -1 before a launch.
   int Id() const;
   // Forgets the child as the destructor does; one that still runs is collected once it

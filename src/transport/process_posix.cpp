@@ -12,6 +12,8 @@
 #include <cerrno>
 #include <cstdlib>
 #include <cstring>
+#include <mutex>
+#include <optional>
 #include <sstream>
 
 #include <Poco/Exception.h>
@@ -24,18 +26,22 @@ namespace vexil {
 
 struct xProcess::Child {
   pid_t pid = -1;
+  std::mutex mutex;  // the host's thread and the dispatch thread both look
   bool ended = false;
+  int status = -1;
 
   // One look without waiting; an ended child is reaped so it leaves no zombie.
   bool Running() {
+    std::lock_guard<std::mutex> lock(mutex);
     if (ended) return false;
-    int status = 0;
+    int raw = 0;
     pid_t answer;
     do {
-      answer = waitpid(pid, &status, WNOHANG);
+      answer = waitpid(pid, &raw, WNOHANG);
     } while (answer < 0 && errno == EINTR);
     // An error (the child was reaped elsewhere, or children are not kept) counts as ended.
     ended = answer != 0;
+    if (answer > 0) status = WIFSIGNALED(raw) ? 128 + WTERMSIG(raw) : WEXITSTATUS(raw);
     return !ended;
   }
 };
@@ -61,19 +67,21 @@ bool IsExecutableFile(const std::string& path) {
   return access(path.c_str(), X_OK) == 0;
 }
 
-bool FoundOnPath(const std::string& name) {
-  const char* path = std::getenv("PATH");
+// The file `name` names on the search list `path`; empty when there is none.
+std::string FoundOnPath(const std::string& name, const char* path) {
   std::istringstream entries(path ? path : "/bin:/usr/bin");
   std::string entry;
   while (std::getline(entries, entry, ':')) {
-    if (IsExecutableFile((entry.empty() ? "." : entry) + "/" + name)) return true;
+    std::string file = (entry.empty() ? "." : entry) + "/" + name;
+    if (IsExecutableFile(file)) return file;
   }
-  return false;
+  return "";
 }
 
 // The launch itself reports these too, but only as a bare error code: checking first
-// gives the host a text that names what is missing.
-void CheckLaunchable(const std::string& executable, const std::string& directory) {
+// gives the host a text that names what is missing. Returns the file a bare name was
+// found as on `path`.
+std::string CheckLaunchable(const std::string& executable, const std::string& directory, const char* path) {
   struct stat status {};
   if (!directory.empty() && stat(directory.c_str(), &status) != 0) {
     Fail<Poco::FileNotFoundException>("Cannot change to directory: " + directory, errno);
@@ -81,16 +89,45 @@ void CheckLaunchable(const std::string& executable, const std::string& directory
   if (!directory.empty() && !S_ISDIR(status.st_mode)) {
     Fail<Poco::FileNotFoundException>("Cannot change to directory: " + directory, ENOTDIR);
   }
+  std::string file = executable;
   bool found = false;
   if (executable.find('/') == std::string::npos) {
-    found = !executable.empty() && FoundOnPath(executable);
+    file = executable.empty() ? "" : FoundOnPath(executable, path);
+    found = !file.empty();
     if (!found) errno = ENOENT;
   } else {
     bool relative = executable[0] != '/' && !directory.empty();
     found = IsExecutableFile(relative ? directory + "/" + executable : executable);
   }
   if (!found) Fail<Poco::FileNotFoundException>("Cannot find executable: " + executable, errno);
+  return file;
 }
+
+// The child's environment: the host's own `environ` unless the host changed it.
+class SpawnEnvironment {
+ public:
+  explicit SpawnEnvironment(const EnvironmentChanges& changes) {
+    if (changes.empty()) return;
+    for (const auto& [name, value] : ChildEnvironment(changes)) {
+      if (name == "PATH") path_ = value;
+      entries_.push_back(name + "=" + value);
+    }
+    for (std::string& entry : entries_) pointers_.push_back(entry.data());
+    pointers_.push_back(nullptr);
+  }
+  bool Changed() const { return !pointers_.empty(); }
+  char* const* Entries() const { return Changed() ? pointers_.data() : environ; }
+  // The search list for a bare executable name, null for the default one.
+  const char* Path() const {
+    if (!Changed()) return std::getenv("PATH");
+    return path_ ? path_->c_str() : nullptr;
+  }
+
+ private:
+  std::vector<std::string> entries_;
+  std::vector<char*> pointers_;
+  std::optional<std::string> path_;
+};
 
 // The spawn's file actions and attributes, released on every path.
 class SpawnSetup {
@@ -147,8 +184,10 @@ xProcess::~xProcess() {
 }
 
 void xProcess::Launch(const std::string& executable, const std::vector<std::string>& arguments,
-                      const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err) {
-  CheckLaunchable(executable, directory);
+                      const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err,
+                      const EnvironmentChanges& environment) {
+  SpawnEnvironment childEnvironment(environment);
+  std::string file = CheckLaunchable(executable, directory, childEnvironment.Path());
   SpawnSetup setup;
   if (in) setup.Redirect(in->readHandle(), STDIN_FILENO, executable);
   if (out) setup.Redirect(out->writeHandle(), STDOUT_FILENO, executable);
@@ -161,7 +200,10 @@ void xProcess::Launch(const std::string& executable, const std::vector<std::stri
   argv.push_back(nullptr);
 
   pid_t pid = -1;
-  int failure = posix_spawnp(&pid, executable.c_str(), setup.Actions(), setup.Attributes(), argv.data(), environ);
+  // The spawn would search the host's PATH: a PATH of the host's choosing was searched above.
+  const std::string& program = childEnvironment.Changed() ? file : executable;
+  int failure = posix_spawnp(&pid, program.c_str(), setup.Actions(), setup.Attributes(), argv.data(),
+                             childEnvironment.Entries());
   if (failure != 0) Fail<Poco::SystemException>("Cannot launch process: " + executable, failure);
 
   if (in) KeepFromChildren(in->writeHandle());
@@ -177,6 +219,13 @@ void xProcess::Launch(const std::string& executable, const std::vector<std::stri
 }
 
 bool xProcess::IsRunning() { return child_ && child_->Running(); }
+
+bool xProcess::Ended(int& status) {
+  if (!child_ || child_->Running()) return false;
+  std::lock_guard<std::mutex> lock(child_->mutex);
+  status = child_->status;
+  return true;
+}
 
 int xProcess::Id() const { return child_ ? static_cast<int>(child_->pid) : -1; }
 

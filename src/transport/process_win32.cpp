@@ -40,6 +40,16 @@ DWORD RepeatedLaunchError(const std::string& executable, const std::string& dire
   return ERROR_SUCCESS;
 }
 
+// What the child's environment block is made of: nothing (the host's own block is
+// inherited) unless the host changed something, and then every variable, since a block
+// given to the system replaces the host's whole environment.
+Poco::Process::Env ChildBlock(const EnvironmentChanges& changes) {
+  Poco::Process::Env block;
+  if (changes.empty()) return block;
+  for (auto& [name, value] : ChildEnvironment(changes)) block[name] = value;
+  return block;
+}
+
 }  // namespace
 
 struct xProcess::Child {
@@ -51,7 +61,8 @@ xProcess::xProcess() = default;
 xProcess::~xProcess() = default;
 
 void xProcess::Launch(const std::string& executable, const std::vector<std::string>& arguments,
-                      const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err) {
+                      const std::string& directory, Poco::Pipe* in, Poco::Pipe* out, Poco::Pipe* err,
+                      const EnvironmentChanges& environment) {
   // A closed pipe would leave the child the host's own stream.
   if ((in && in->readHandle() == INVALID_HANDLE_VALUE) || (out && out->writeHandle() == INVALID_HANDLE_VALUE) ||
       (err && err->writeHandle() == INVALID_HANDLE_VALUE)) {
@@ -59,7 +70,8 @@ void xProcess::Launch(const std::string& executable, const std::vector<std::stri
     throw Poco::IOException("Cannot redirect the standard streams of: " + executable);
   }
   try {
-    child_ = std::make_unique<Child>(Poco::Process::launch(executable, arguments, directory, in, out, err));
+    child_ = std::make_unique<Child>(
+        Poco::Process::launch(executable, arguments, directory, in, out, err, ChildBlock(environment)));
   } catch (const Poco::SystemException&) {
     // LastSystemErrorText() in the caller's handler then names the real cause.
     SetLastError(RepeatedLaunchError(executable, directory));
@@ -74,6 +86,16 @@ bool xProcess::IsRunning() {
   } catch (const std::exception&) {
     return false;
   }
+}
+
+bool xProcess::Ended(int& status) {
+  if (!child_ || IsRunning()) return false;
+  try {
+    status = child_->handle.tryWait();
+  } catch (const std::exception&) {
+    status = -1;
+  }
+  return true;
 }
 
 int xProcess::Id() const { return child_ ? static_cast<int>(child_->handle.id()) : -1; }

@@ -4,6 +4,7 @@
 
 #include <chrono>
 #include <condition_variable>
+#include <functional>
 #include <mutex>
 #include <thread>
 
@@ -18,14 +19,16 @@ class ReaderThread {
   ReaderThread& operator=(const ReaderThread&) = delete;
   ~ReaderThread() { Join(); }
 
-  void Start(Poco::Runnable& body) {
+  // `ended`, when given, is called on the thread once the body has returned.
+  void Start(Poco::Runnable& body, std::function<void()> ended = {}) {
     Join();
     {
       std::lock_guard<std::mutex> lock(mutex_);
       ended_ = false;
     }
-    thread_ = std::thread([this, &body] {
+    thread_ = std::thread([this, &body, ended = std::move(ended)] {
       body.run();
+      if (ended) ended();
       MarkEnded();
     });
   }

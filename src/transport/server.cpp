@@ -60,12 +60,15 @@ void xServer::WorkspaceFolders(const std::vector<LSP::WorkspaceFolder>& folders)
 }
 
 xServer::~xServer() {
+  answers_.Attach(nullptr);
   tracer_.Verbose("Closing language server.....\n");
   Cancel();
   tracer_.Verbose("Closing pipes.....\n");
   if (streams_) streams_->CloseInput();
   tracer_.Verbose("Waiting for threads to end....\n");
   if (streams_) streams_->JoinReaders();
+  // While the process is still known: the handler hears the rest and the server's exit.
+  if (streams_) streams_->dispatcher.Stop();
   deferred_.Deliver();
   // A server that outlives its connection (one that stopped reading) is collected once it
   // ends, never ended here.
@@ -118,11 +121,16 @@ const char* xServer::Join(const std::vector<std::string>& list, const char* sepa
 bool xServer::Launch() {
   // The earlier launch's threads end before anything new starts; a server that
   // outlived its closed input is left to end by itself.
+  answers_.Attach(nullptr);
   streams_.reset();
-  streams_ = std::make_unique<ServerStreams>(deferred_);
+  streams_ = std::make_unique<ServerStreams>(
+      deferred_, handler_, [this](int& status) { return process_.Ended(status); },
+      [this](const std::string& id) { answers_.Decline(id); });
   ServerStreams& streams = *streams_;
   streams.outReader.SetDispatch([this, &streams](LSP::xReader& message) { Dispatch(streams, message); });
-  process_.Launch(executable_, arguments_, directory_, &streams.inPipe, &streams.outPipe, &streams.errPipe);
+  answers_.Attach([this, &streams](std::string body, const std::string& method) { QueueAnswer(streams, body, method); });
+  process_.Launch(executable_, arguments_, directory_, &streams.inPipe, &streams.outPipe, &streams.errPipe,
+                  environment_);
   streams.Start();
   if (tracer_.Messages()) TraceStrayOutput();
   Poco::Thread::sleep(kStartupGraceMs);

@@ -13,6 +13,9 @@
 #include "host/trace_line.h"
 #include "transport/deferred_trace.h"
 #include "transport/diagnostics_store.h"
+#include "transport/environment.h"
+#include "transport/host_answers.h"
+#include "transport/message_dispatcher.h"
 #include "transport/process.h"
 #include "vexil/host/records.h"
 #include "vexil/protocol/message.h"
@@ -21,6 +24,7 @@
 namespace vexil {
 
 struct ServerStreams;
+class MessageQueue;
 
 class xServer {
  public:
@@ -49,14 +53,41 @@ class xServer {
   void Exception(const std::exception& e);
 
   // Send one message; dropped silently while the server is not running. Never throw.
-  void Write(LSP::RequestMessage& message);
-  void Write(LSP::NotificationMessage& message);
+  // True once the message was written.
+  bool Write(LSP::RequestMessage& message);
+  bool Write(LSP::NotificationMessage& message);
   // Waits for the reply to `id` (-1: the next message that is not a numbered reply) and
   // reads it into `response`. Never throws; failures end up in HaveErrors().
   void Read(int id, LSP::ResponseMessage& response);
 
   // Waits of 100 ms in which nothing arrived, used by the last reply wait.
   int LastWaitTicks() const { return lastWaitTicks_; }
+  // Ends the request in progress (from its write to the end of the wait for its reply)
+  // within a tick, as a time-out would but with the line "Request Cancelled: <id>" instead
+  // of the time-out's; nothing when no request is in progress. Any thread.
+  void CancelWait();
+  // Sets the error state and traces `text` as an "Error" line, for a message refused
+  // before anything was sent.
+  void Refuse(const std::string& text);
+
+  // The server's notifications, the requests routed to the host and its exit go to
+  // `handler` on the dispatch thread; null hands nothing over and routes nothing.
+  void SetMessageHandler(xMessageHandler handler, void* userData);
+  // Server requests of `methods`, and with `unknown` every one the library has no answer
+  // of its own for, are handed to the handler (when one is set) for the host to answer.
+  void RouteToHost(const std::vector<std::string>& methods, bool unknown);
+  // Answers the routed request `idJson` with the JSON `resultJson`, or with an error;
+  // false for text that is not JSON and for an id that does not wait. Any thread.
+  bool Reply(const char* idJson, const char* resultJson);
+  bool ReplyError(const char* idJson, int code, const char* message);
+  // Answers every routed request still waiting with the time-out's error (at Exit).
+  void DeclineHostRequests() { answers_.DeclineAll(); }
+  // Gives the output reader a moment to finish, then hands the handler what is left and
+  // the server's exit; called once the server has ended, before the connection goes.
+  void FinishMessages();
+  // Sets (or with a null value removes) a variable of the environment of later launches;
+  // false, changing nothing, for a name that cannot be one and while the server runs.
+  bool Environment(const char* name, const char* value);
 
   // The reply wait limit in milliseconds; a value below 1 becomes the default. Writes
   // get as long, and never less than kMinimumWriteMs.
@@ -77,8 +108,8 @@ class xServer {
     std::string method;
     std::string body;
   };
-  // Clears the error state and sends `text`, a message's JSON body, framed.
-  void Write(const char* text, int length, bool isRequest);
+  // Clears the error state and sends `text`, a message's JSON body, framed; true once written.
+  bool Write(const char* text, int length, bool isRequest);
   // The text of the reply to `id`; empty when none came in time.
   std::string Reply(int id);
   // Whether `text` is to be taken as the reply to `id`.
@@ -94,8 +125,8 @@ class xServer {
   // Reply and HaveId that leave the reply's parsed document in `parsed` / `reader`.
   std::string Reply(int id, std::unique_ptr<LSP::xReader>& parsed);
   bool HaveId(int id, const std::string& text, LSP::xReader& reader);
-  void WriteMessage(LSP::MessageBase& message);
-  void Transmit(const std::string& body, bool reportReaderErrors);
+  bool WriteMessage(LSP::MessageBase& message);
+  bool Transmit(const std::string& body, bool reportReaderErrors);
   void ReportReaderErrors() const;
   bool Launch();
   void ReportFailedStart(const std::string& reason, bool hint);
@@ -110,6 +141,18 @@ class xServer {
   // the trace shows why it ended.
   void AwaitLastWords();
   void Dispatch(ServerStreams& streams, LSP::xReader& message);
+  // Hands `message` to the host's handler; true when the host is to answer it.
+  bool HandToHost(ServerStreams& streams, const LSP::xObject& message);
+  bool RoutedToHost(const std::string& method);
+  void QueueAnswer(ServerStreams& streams, const std::string& body, const std::string& method);
+  // The canonical text of the id `idJson` of a routed request; empty when it is none.
+  std::string RequestId(const char* idJson);
+  // The bookkeeping of the request in progress, for CancelWait: it starts with its write,
+  // waits on `replies`, and ends with its wait.
+  void BeginRequest();
+  void WaitOn(MessageQueue& replies);
+  bool WaitCancelled();
+  void EndRequest();
   void StoreDiagnostics(const LSP::xObject& notification);
   std::vector<LSP::WorkspaceFolder> Folders();
 
@@ -133,6 +176,19 @@ class xServer {
   // The last request written; a time-out cancels it unless it is "initialize".
   int lastRequestId_ = 0;
   std::string lastRequestMethod_;
+  // The host's side of the server's own messages: its handler, the requests it answers
+  // and which ones it is handed.
+  HandlerSlot handler_;
+  HostAnswers answers_;
+  std::mutex routesMutex_;
+  std::vector<std::string> hostMethods_;
+  bool hostAnswersUnknown_ = false;
+  // Whether a request is in progress, the queue its wait polls, and whether it was cancelled.
+  std::mutex waitMutex_;
+  bool requestActive_ = false;
+  MessageQueue* waitingOn_ = nullptr;
+  bool cancelled_ = false;
+  EnvironmentChanges environment_;
   // The pipes, readers and writer of the current launch; null before the first.
   std::unique_ptr<ServerStreams> streams_;
 };

@@ -43,39 +43,42 @@ bool IsDiagnosticsPublication(const LSP::xObject& message) {
 
 }  // namespace
 
-void xServer::Write(LSP::RequestMessage& message) {
+bool xServer::Write(LSP::RequestMessage& message) {
+  BeginRequest();
   lastRequestId_ = message.id;
   lastRequestMethod_ = message.method;
-  WriteMessage(message);
+  return WriteMessage(message);
 }
 
-void xServer::Write(LSP::NotificationMessage& message) { WriteMessage(message); }
+bool xServer::Write(LSP::NotificationMessage& message) { return WriteMessage(message); }
 
-void xServer::WriteMessage(LSP::MessageBase& message) {
+bool xServer::WriteMessage(LSP::MessageBase& message) {
   // Nothing of a failed write reaches the host: a dead server shows on the next read.
   try {
     if (!IsRunning()) throw std::runtime_error("A write to the server was requested but the server is not running.");
     std::string body = message.ToJSON();
-    Write(body.c_str(), static_cast<int>(body.size()), message.IsRequest());
+    return Write(body.c_str(), static_cast<int>(body.size()), message.IsRequest());
   } catch (const std::exception&) {
+    return false;
   }
 }
 
-void xServer::Write(const char* text, int length, bool isRequest) {
+bool xServer::Write(const char* text, int length, bool isRequest) {
   haveErrors_ = false;
   errorMessage_.clear();
-  Transmit(std::string(text, static_cast<std::size_t>(length)), true);
+  return Transmit(std::string(text, static_cast<std::size_t>(length)), true);
 }
 
-void xServer::Transmit(const std::string& body, bool reportReaderErrors) {
+bool xServer::Transmit(const std::string& body, bool reportReaderErrors) {
   deferred_.Deliver();
   std::string framed = Framed(body);
   tracer_.Message("\nSent: %s\n", framed.c_str());
   if (reportReaderErrors) ReportReaderErrors();
-  if (!streams_) return;
+  if (!streams_) return false;
   // A failed write is silent; one that missed its deadline was reported by the writer.
-  streams_->input.Send(std::move(framed), writeLimitMs_);
+  bool written = streams_->input.Send(std::move(framed), writeLimitMs_) == InputWriter::Outcome::Written;
   deferred_.Deliver();
+  return written;
 }
 
 void xServer::ReportReaderErrors() const {
@@ -95,10 +98,14 @@ std::string xServer::Reply(int id) {
 
 std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
   lastWaitTicks_ = 0;
-  if (!IsRunning()) return "";
+  if (!IsRunning()) {
+    EndRequest();
+    return "";
+  }
   int countdown = timeout_ / 100 + 1;
   const Clock::time_point cap = Clock::now() + kWaitCapFactor * countdown * kTick;
   MessageQueue& replies = streams_->outReader.Messages();
+  WaitOn(replies);
   std::string text;
   while (countdown >= 1) {
     DrainErrorLines();
@@ -108,21 +115,30 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
     for (auto left = cap - Clock::now(); left > Clock::duration::zero(); left = cap - Clock::now()) {
       auto step = std::min(std::chrono::duration_cast<std::chrono::milliseconds>(left), kTick);
       if ((wait = replies.WaitPop(text, step)) != MessageQueue::Wait::TimedOut) break;
+      deferred_.Deliver();
       ++lastWaitTicks_;
       if (--countdown == 0) break;
     }
+    // An interruption meant for an earlier wait only wakes this one.
+    if (wait == MessageQueue::Wait::Interrupted && !WaitCancelled()) continue;
     if (wait != MessageQueue::Wait::Taken) {
-      if (wait == MessageQueue::Wait::Finished) {
-        AwaitLastWords();
-        DrainErrorLines();
+      EndRequest();
+      if (wait == MessageQueue::Wait::Interrupted) {
+        tracer_.Message("Request Cancelled: %d\n", id);
+      } else {
+        if (wait == MessageQueue::Wait::Finished) {
+          AwaitLastWords();
+          DrainErrorLines();
+        }
+        ReportTimeOut();
       }
-      ReportTimeOut();
       CancelRequest(id);
       return "";
     }
     // A fresh reader for each text: a document keeps the memory of every earlier parse.
     auto reader = std::make_unique<LSP::xReader>();
     if (HaveId(id, text, *reader)) {
+      EndRequest();
       tracer_.Message("Reply: %s%s", text.c_str(), LineEnd(text));
       parsed = std::move(reader);
       return text;
@@ -130,6 +146,7 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
     countdown = Extend(countdown);
     tracer_.Message("Ignoring Reply: %s%s", text.c_str(), LineEnd(text));
   }
+  EndRequest();
   return "";
 }
 
@@ -228,13 +245,17 @@ xServer::Answer xServer::Respond(LSP::xReader& message) {
 }
 
 void xServer::Dispatch(ServerStreams& streams, LSP::xReader& message) {
+  if (HandToHost(streams, message.Root())) return;
   Answer answer = Respond(message);
-  if (answer.body.empty()) return;
-  // Queued, never written here: this thread must go on draining the server's output
-  // whatever the server does with its input.
-  std::string framed = Framed(answer.body);
+  if (!answer.body.empty()) QueueAnswer(streams, answer.body, answer.method);
+}
+
+void xServer::QueueAnswer(ServerStreams& streams, const std::string& body, const std::string& method) {
+  // Queued, never written here: the output reader must go on draining the server's
+  // output whatever the server does with its input.
+  std::string framed = Framed(body);
   deferred_.Message("\nSent: %s\n", framed.c_str());
-  streams.input.Answer(std::move(framed), writeLimitMs_, answer.method);
+  streams.input.Answer(std::move(framed), writeLimitMs_, method);
 }
 
 std::vector<LSP::WorkspaceFolder> xServer::Folders() {

@@ -2,7 +2,6 @@
 // one null setting per configuration item, and -32601 for anything it does not know.
 #include "transport/server_requests.h"
 
-
 #include "json/rapidjson.h"
 #include "protocol/json_arrays.h"
 #include "vexil/protocol/message.h"
@@ -34,6 +33,10 @@ void WriteNullSettings(LSP::xWriter& writer, const LSP::xObject& request) {
 }
 
 }  // namespace
+
+bool HasOwnAnswer(const std::string& method) {
+  return AnsweredWithNull(method) || method == "workspace/workspaceFolders" || method == "workspace/configuration";
+}
 
 bool IsServerRequest(const LSP::xObject& message) {
   return message.HasObject("id") && !message.Object("id").IsNull();

@@ -3,7 +3,6 @@
 #pragma once
 
 #include <string>
-
 #include <vector>
 
 #include "vexil/json/json.h"
@@ -13,6 +12,10 @@ namespace vexil {
 
 // Whether `message` (a parsed object with a "method") waits for an answer.
 bool IsServerRequest(const LSP::xObject& message);
+
+// Whether the library has an answer of its own for requests of `method` (anything else
+// gets "Method not found").
+bool HasOwnAnswer(const std::string& method);
 
 // The JSON text of our response to `request`, carrying its id back unchanged;
 // "workspace/workspaceFolders" is answered with `folders` (null when there are none). An

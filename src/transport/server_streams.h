@@ -6,23 +6,30 @@
 
 #include "transport/deferred_trace.h"
 #include "transport/input_writer.h"
+#include "transport/message_dispatcher.h"
 #include "transport/pipe_reader.h"
 #include "transport/reader_thread.h"
 
 namespace vexil {
 
 struct ServerStreams {
-  explicit ServerStreams(DeferredTrace& trace) : outReader("stdout", outPipe), errReader(errPipe), input(inPipe, trace) {}
+  ServerStreams(DeferredTrace& trace, const HandlerSlot& handler, MessageDispatcher::ExitCheck ended,
+                MessageDispatcher::Unhandled unhandled)
+      : outReader("stdout", outPipe),
+        errReader(errPipe),
+        input(inPipe, trace),
+        dispatcher(handler, std::move(ended), std::move(unhandled)) {}
   ServerStreams(const ServerStreams&) = delete;
   ServerStreams& operator=(const ServerStreams&) = delete;
   ~ServerStreams() { Close(); }
 
-  // Once the child holds its ends: the input writer first, since the output reader may
-  // hand it an answer at once, then the error reader and the output reader.
+  // Once the child holds its ends: the input writer and the dispatcher first, since the
+  // output reader may hand them messages at once, then the error reader and the output reader.
   void Start() {
     input.Start();
+    dispatcher.Start();
     errThread.Start(errReader);
-    outThread.Start(outReader);
+    outThread.Start(outReader, [this] { dispatcher.OutputEnded(); });
   }
   // The readers end within one poll interval, even while the server keeps its pipes open.
   void StopReaders() {
@@ -39,10 +46,12 @@ struct ServerStreams {
     outPipe.close(Poco::Pipe::CLOSE_READ);
     errPipe.close(Poco::Pipe::CLOSE_READ);
   }
+  // The dispatcher goes last: everything the readers queued reaches the host's handler.
   void Close() {
     StopReaders();
     CloseInput();
     JoinReaders();
+    dispatcher.Stop();
   }
 
   Poco::Pipe inPipe;
@@ -51,6 +60,7 @@ struct ServerStreams {
   xPipeReader outReader;
   xPipeErrReader errReader;
   InputWriter input;
+  MessageDispatcher dispatcher;
   ReaderThread outThread;
   ReaderThread errThread;
 };

@@ -20,13 +20,14 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   cli::LspOptions options = ParseLspOptions(
       {"--trace", "verbose", "--timeout=900", "--json", "--root=src", "--", "clangd", "--log=error", "--pretty",
        "--hover", "c:/odd:name.cpp:15:18", "--range-format=a.cpp:1:2:3:4", "--rename", "a.cpp:5:6:Limit",
-       "--workspace-symbols", "Rect", "--close", "a.cc"});
+       "--workspace-symbols", "Rect", "--close", "a.cc", "--capabilities", "--request", "a/b", R"({"x": [1]})",
+       "--notify=c/d", "null"});
   EXPECT_EQ(options.session.trace, LSP::TraceLevel::Verbose);
   EXPECT_EQ(options.session.timeout, 900);
   EXPECT_TRUE(options.json);
   EXPECT_EQ(options.session.program, "clangd");
   EXPECT_EQ(options.session.arguments, (Args{"--log=error", "--pretty"}));
-  ASSERT_EQ(options.actions.size(), 5u);
+  ASSERT_EQ(options.actions.size(), 8u);
   const cli::Action& hover = options.actions[0];
   EXPECT_EQ(hover.kind, ActionKind::Hover);
   EXPECT_EQ(hover.file, "c:/odd:name.cpp");
@@ -42,6 +43,12 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   EXPECT_EQ(options.session.root, root.string());
   EXPECT_EQ(options.actions[4].path, (root / "a.cc").string());
   EXPECT_EQ(cli::Describe(options.actions[2]), "rename a.cpp:5:6 -> Limit");
+  EXPECT_EQ(cli::Describe(options.actions[5]), "capabilities");
+  EXPECT_EQ(options.actions[6].text + " " + options.actions[6].params, R"(a/b {"x": [1]})");
+  EXPECT_EQ(cli::Describe(options.actions[7]) + " " + options.actions[7].params, "notify c/d null");
+  cli::LspOptions environment = ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--", "s", "--capabilities"});
+  EXPECT_EQ(environment.session.environment, (std::vector<std::pair<std::string, std::string>>{{"A", "b=c"}, {"EMPTY", ""}}));
+  EXPECT_TRUE(environment.session.progress);
 }
 
 TEST(LspOptions, BadUsageIsRefusedWithAReason) {
@@ -58,6 +65,13 @@ TEST(LspOptions, BadUsageIsRefusedWithAReason) {
       {"--json=yes", "--", "clangd", "--open", "a.cpp"},    // a flag takes no value
       {"--root", "--", "clangd"},                           // the value is taken, then "--" is missing
       {"--", "s", "1", "2", "3", "4", "5", "6", "7", "8", "--open", "a.cpp"},
+      {"--", "s", "--request", "a/b"},                      // no params
+      {"--", "s", "--request", "a/b", "{oops"},             // not JSON
+      {"--", "s", "--notify", "a/b", "[1]"},                // not an object
+      {"--", "s", "--capabilities=yes"},                    // takes no operand
+      {"--env", "NOVALUE", "--", "s", "--capabilities"},
+      {"--env", "=x", "--", "s", "--capabilities"},
+      {"--capabilities", "--", "s"},                        // an action before the server
   };
   for (const Args& arguments : bad) {
     EXPECT_THROW(ParseLspOptions(arguments), UsageError) << ::testing::PrintToString(arguments);

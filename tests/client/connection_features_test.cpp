@@ -2,6 +2,10 @@
 // null, error and dead-server replies, the references context, and symbols without a URI.
 #include <gtest/gtest.h>
 
+#include <chrono>
+#include <cstdlib>
+#include <cstring>
+#include <thread>
 #include <string>
 
 #include "connection_test_support.h"
@@ -152,6 +156,100 @@ TEST_F(ConnectionFeatures, ErrorRepliesAndDeadServersGiveEmptyResultsAndTheError
   EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
   EXPECT_TRUE(server->HaveErrors());
   EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
+}
+
+// Requests and notifications of any method, with params as JSON text, and every way one fails.
+TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailure) {
+  struct Row {
+    const char* method;
+    const char* params;
+    const char* returned;  // Request's result; Notify's is whether it was sent
+    const char* sent;      // the params as sent; null when nothing is sent
+    const char* error;     // ErrorMessage() afterwards
+    bool notify = false;
+  };
+  const std::string refused = "Invalid JSON for fake/echo: ";
+  const Row rows[] = {
+      {"fake/echo", R"( {"a": [1, "x"], "b":{}} )",
+       R"({"method":"fake/echo","answers":[],"received":["{\"jsonrpc\":\"2.0\",\"method\":\"initialized\",\"params\":{}}"]})",
+       R"(,"params":{"a":[1,"x"],"b":{}}})", ""},
+      {"fake/null", nullptr, "null", "}", ""},
+      {"fake/null", "null", "null", "}", ""},
+      {"fake/refused", "", "", "}", "refused fake/refused"},
+      {"fake/echo", "{oops", "", nullptr, "Invalid JSON for fake/echo: Missing a name for object member."},
+      {"fake/echo", "[1]", "", nullptr, "Invalid JSON for fake/echo: not an object"},
+      {"fake/note", R"({"c":true})", "true", R"(,"params":{"c":true}})", "", true},
+      {"fake/note", "", "true", "}", "", true},
+      {"fake/note", "{", "", nullptr, "Invalid JSON for fake/note: Missing a name for object member.", true},
+      {"fake/silent", "{}", "", R"(,"params":{}})", ""},
+  };
+  xLanguageServer* server = Started({"result=fake/null:null;error=fake/refused"});
+  for (const Row& row : rows) {
+    SCOPED_TRACE(row.method + std::string(" ") + (row.params ? row.params : "(null)"));
+    TraceLog::Clear();
+    std::string returned = row.notify ? (server->Notify(row.method, row.params) ? "true" : "")
+                                      : server->Request(row.method, row.params);
+    EXPECT_EQ(returned, row.returned);
+    EXPECT_STREQ(server->ErrorMessage(), row.error);
+    EXPECT_EQ(server->HaveErrors(), *row.error != '\0');
+    std::string sent = SentBody(row.method);
+    EXPECT_EQ(sent.empty() ? "(none)" : sent.substr(sent.find(row.method) + strlen(row.method) + 1),
+              row.sent ? row.sent : "(none)");
+    if (!row.sent) {
+      EXPECT_EQ(TraceLog::Texts("Error"), std::vector<std::string>{std::string(row.error) + "\n"});
+    }
+  }
+  EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), 1);
+  EXPECT_NE(SentBody("$/cancelRequest"), "");
+
+  vexil_test::KillProcess(server->Id());
+  ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
+  EXPECT_EQ(server->Request("fake/echo", "{}"), "");
+  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
+  EXPECT_FALSE(server->Notify("fake/note", "{}"));
+}
+
+// A host that runs calls on a worker thread cancels a stale one from its UI thread.
+TEST_F(ConnectionFeatures, CancelEndsAWaitingCallAndNothingElse) {
+  xLanguageServer* server = Started();
+  server->Cancel();  // nothing waits: the next call is not affected
+  EXPECT_NE(server->Request("fake/echo", "{}"), "");
+
+  std::thread canceller([&] {
+    transport_test::WaitFor([] { return SentBody("fake/silent") != ""; });
+    server->Cancel();
+  });
+  auto asked = std::chrono::steady_clock::now();
+  std::string returned = server->Request("fake/silent", R"({"delay":100000})");
+  canceller.join();
+  EXPECT_LT(std::chrono::steady_clock::now() - asked, std::chrono::seconds(1));
+  EXPECT_EQ(returned, "");
+  EXPECT_FALSE(server->HaveErrors());
+  int id = std::stoi(SentBody("fake/silent").substr(std::strlen(R"({"jsonrpc":"2.0","id":)")));
+  EXPECT_EQ(TraceLog::Texts("Error"), std::vector<std::string>{});
+  EXPECT_EQ(TraceLog::Count("Request Cancelled: " + std::to_string(id) + "\n"), 1);
+  EXPECT_EQ(SentBody("$/cancelRequest"),
+            R"({"jsonrpc":"2.0","method":"$/cancelRequest","params":{"id":)" + std::to_string(id) + "}}");
+}
+
+// The server runs in the host's environment plus what the host set, minus what it removed.
+TEST_F(ConnectionFeatures, ServersGetTheEnvironmentTheHostSet) {
+  xServerStart start = transport_test::FakeStart({}, 2000, LSP::TraceLevel::Messages);
+  start.name = kName;
+  xLanguageServer* server = Vexil_Start(start);
+  const char* removed = std::getenv("HOME") ? "HOME" : "TEMP";
+  EXPECT_TRUE(server->SetEnvironment("VEXIL_FIRST", "one"));
+  EXPECT_TRUE(server->SetEnvironment("VEXIL_SECOND", "two words=2"));
+  EXPECT_TRUE(server->SetEnvironment("VEXIL_FIRST", "1"));
+  EXPECT_TRUE(server->SetEnvironment(removed, nullptr));
+  for (const char* invalid : {"", "A=B"}) EXPECT_FALSE(server->SetEnvironment(invalid, "x"));
+  EXPECT_FALSE(server->SetEnvironment(nullptr, "x"));
+  ASSERT_TRUE(server->Start(xServerInitialise()));
+  EXPECT_FALSE(server->SetEnvironment("VEXIL_LATE", "x")) << "the server runs already";
+  std::string names = std::string(R"({"names":["VEXIL_FIRST","VEXIL_SECOND",")") + removed + R"("]})";
+  EXPECT_NE(server->Request("fake/env", names.c_str())
+                .find(std::string(R"("env":{"VEXIL_FIRST":"1","VEXIL_SECOND":"two words=2",")") + removed + R"(":null})"),
+            std::string::npos);
 }
 
 }  // namespace

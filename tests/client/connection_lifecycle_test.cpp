@@ -2,10 +2,18 @@
 // verbose start-up lines, the long initialize wait, shutdown by its own id, and exit.
 #include <gtest/gtest.h>
 
+#include <atomic>
 #include <chrono>
+#include <functional>
+#include <mutex>
+#include <set>
+#include <thread>
+#include <regex>
 #include <string>
 
+#include "../protocol/reply_helpers.h"
 #include "connection_test_support.h"
+#include "vexil/client/uri.h"
 
 namespace {
 
@@ -64,6 +72,166 @@ TEST_F(ConnectionLifecycle, StartInitializesOnceAndAnnouncesIt) {
   EXPECT_TRUE(server->Start(Init()));
   EXPECT_TRUE(server->Initialize(Init()));
   EXPECT_TRUE(TraceLog::Lines().empty());
+}
+
+// What each opt-in changes of the initialize request: nothing, unless it enables client
+// capabilities. The request is otherwise the model's, byte for byte.
+TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
+  struct Row {
+    std::vector<const char*> features;
+    std::vector<std::pair<std::string, std::string>> changes;  // on the expected text
+  };
+  const std::string treeEnd = R"("diagnostic":{"dynamicRegistration":false}})";
+  const Row rows[] = {
+      {{}, {}},
+      {{"messages", "unknown"}, {}},
+      {{"progress"}, {{treeEnd + "}", treeEnd + R"(,"window":{"workDoneProgress":true}})"}}},
+      {{"configuration", "configuration"}, {{R"("configuration":false)", R"("configuration":true)"}}},
+  };
+  for (const Row& row : rows) {
+    xLanguageServer* server = Connection();
+    for (const char* feature : row.features) EXPECT_EQ(server->Enable(feature), std::string(feature) != "unknown");
+    xServerInitialise init;
+    init.processId = 4242;
+    init.rootPath = "/home/dev/project";
+    init.options = R"({"initializationOptions":{"fallbackFlags":["-std=c++17"],"clangdFileStatus":true}})";
+    init.workspaceFolders.emplace_back("file:///home/dev/project", "project");
+    ASSERT_TRUE(server->Start(init));
+    std::string expected = vexil_test::ReadDataFile("initialize_request.json");
+    // Request ids count up through the process.
+    std::string sent = std::regex_replace(SentBody("initialize"), std::regex(R"(^(\{"jsonrpc":"2.0","id":)\d+)"), "$011");
+    expected.replace(expected.find("file:///home/dev/project"), 24, FileToUri(init.rootPath.c_str()));
+    for (const auto& [from, to] : row.changes) expected.replace(expected.find(from), from.size(), to);
+    EXPECT_EQ(sent, expected) << row.features.size();
+    Dispose(kName);
+    TraceLog::Clear();
+  }
+}
+
+// The capabilities as the server gave them, in both forms of the synchronisation member.
+TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
+  struct Row {
+    std::string capabilities;
+    int change;
+    bool openClose, save, includeText;
+  };
+  const Row rows[] = {
+      {R"({"textDocumentSync": 2,"hoverProvider":true})", 2, true, true, false},
+      {R"({"textDocumentSync": {"openClose":true,"change":1,"save":{"includeText":true}},"hoverProvider":true})", 1,
+       true, true, true},
+      {R"({"textDocumentSync": {"change":2,"save":false},"hoverProvider":true})", 2, false, false, false},
+      {R"({"textDocumentSync": "full","hoverProvider":true})", 0, false, false, false},
+  };
+  for (const Row& row : rows) {
+    xLanguageServer* server = Connection({"result=initialize:{\"capabilities\":" + row.capabilities + "}"});
+    EXPECT_STREQ(server->ServerCapabilitiesJson(), "");
+    ASSERT_TRUE(server->Start(Init()));
+    LSP::ServerCapabilities read = server->ServerCapabilities();
+    EXPECT_TRUE(read.hoverProvider) << row.capabilities;
+    EXPECT_EQ(read.documentSync.change, row.change) << row.capabilities;
+    EXPECT_EQ(read.documentSync.openClose, row.openClose) << row.capabilities;
+    EXPECT_EQ(read.documentSyncSave, row.save) << row.capabilities;
+    EXPECT_EQ(read.documentSync.save.includeText, row.includeText) << row.capabilities;
+    EXPECT_EQ(read.textDocumentSync.change, 0) << "the old member stays unread";
+    std::string compact = row.capabilities;
+    compact.erase(compact.find(' '), 1);
+    EXPECT_EQ(server->ServerCapabilitiesJson(), compact);
+    Dispose(kName);
+  }
+}
+
+// A host's message handler: what it was handed, on which threads. It answers requests
+// with `reply` (a result, or "error" for an error) unless that is empty.
+class Handed {
+ public:
+  static void Handler(void* user, const char* method, const char* id, const char* params) {
+    Handed& self = *static_cast<Handed*>(user);
+    std::lock_guard<std::mutex> lock(self.mutex_);
+    self.lines_.push_back(std::string(method) + " " + (id ? id : "-") + " " + params);
+    self.threads_.insert(std::this_thread::get_id());
+    if (!id || self.reply.empty()) return;
+    if (self.reply == "error") {
+      self.answered = self.server->ReplyError(id, -32001, "declined");
+    } else {
+      self.answered = self.server->Reply(id, self.reply.c_str());
+    }
+  }
+  std::vector<std::string> Lines() {
+    std::lock_guard<std::mutex> lock(mutex_);
+    return lines_;
+  }
+  std::set<std::thread::id> Threads() {
+    std::lock_guard<std::mutex> lock(mutex_);
+    return threads_;
+  }
+
+  xLanguageServer* server = nullptr;
+  std::string reply;
+  std::atomic<bool> answered{false};
+
+ private:
+  std::mutex mutex_;
+  std::vector<std::string> lines_;
+  std::set<std::thread::id> threads_;
+};
+
+TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAnswered) {
+  const std::string items = R"({"items":[{"section":"a"},{"section":"b"}]})";
+  struct Row {
+    const char* name;
+    std::vector<const char*> features;
+    std::vector<std::string> directives;
+    const char* reply;
+    std::function<std::string(xLanguageServer*)> action;  // returns what the server got back
+    std::vector<std::string> handed;
+    std::string answer;  // part of the returned text
+  };
+  auto ask = [](const char* params, const char* method = "fake/echo") {
+    return [params, method](xLanguageServer* server) { return server->Request(method, params); };
+  };
+  const Row rows[] = {
+      {"notifications in arrival order", {}, {}, "", ask(R"({"notifications":3})"),
+       {R"(fake/progress - {"left":3})", R"(fake/progress - {"left":2})", R"(fake/progress - {"left":1})"}, ""},
+      {"a request routed by its feature, answered from the handler", {"configuration"}, {}, R"([{"tabSize": 4}])",
+       ask(R"({"ask":["workspace/configuration"]})"), {"workspace/configuration 0 " + items},
+       R"({"jsonrpc":"2.0","id":0,"result":[{"tabSize":4}]})"},
+      {"not opted in: the library answers", {}, {}, "[1]", ask(R"({"ask":["workspace/configuration"]})"), {},
+       R"({"jsonrpc":"2.0","id":0,"result":[null,null]})"},
+      {"any other request, declined by the host", {"messages"}, {}, "error", ask(R"({"ask":["workspace/applyEdit"]})"),
+       {"workspace/applyEdit 0 " + items},
+       R"({"jsonrpc":"2.0","id":0,"error":{"code":-32001,"message":"declined"}})"},
+      {"unanswered until Exit", {"messages"}, {"send=workspace/applyEdit:1"}, "",
+       [](xLanguageServer* server) {
+         EXPECT_TRUE(server->Exit());
+         return TraceLog::Contains(R"({"jsonrpc":"2.0","id":0,"error":{"code":-32803,"message":"Request not answered"}})")
+                    ? "declined"
+                    : "";
+       },
+       {"workspace/applyEdit 0 " + items, R"(exit - {"status":0})"}, "declined"},
+      {"the server's exit status", {}, {}, "", ask(R"({"code":3})", "fake/exit"), {R"(exit - {"status":3})"}, ""},
+  };
+  for (const Row& row : rows) {
+    SCOPED_TRACE(row.name);
+    Handed handed;
+    handed.reply = row.reply;
+    handed.server = Connection(row.directives);
+    handed.server->SetMessageHandler(&Handed::Handler, &handed);
+    for (const char* feature : row.features) EXPECT_TRUE(handed.server->Enable(feature));
+    ASSERT_TRUE(handed.server->Start(Init()));
+    std::string returned = row.action(handed.server);
+    EXPECT_NE(returned.find(row.answer), std::string::npos) << returned;
+    EXPECT_TRUE(transport_test::WaitFor([&] { return handed.Lines().size() >= row.handed.size(); }));
+    EXPECT_EQ(handed.Lines(), row.handed);
+    EXPECT_EQ(handed.answered, !row.handed.empty() && std::string(row.reply).size() > 0);
+    if (!row.handed.empty()) {
+      EXPECT_EQ(handed.Threads().size(), 1u);
+      EXPECT_EQ(handed.Threads().count(std::this_thread::get_id()), 0u);
+    }
+    // An answered request waits no more.
+    EXPECT_FALSE(Vexil_Have(kName) && handed.server->Reply("0", "null"));
+    Dispose(kName);
+    TraceLog::Clear();
+  }
 }
 
 TEST_F(ConnectionLifecycle, StartUpDetailsAreVerboseOnlyAndNothingIsSentToAStoppedServer) {

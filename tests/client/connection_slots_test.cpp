@@ -50,6 +50,16 @@ TEST(ConnectionSlots, OperationsSitInTheHostsSlotOrder) {
   EXPECT_EQ(Slot(&S::TextDocument_Diagnostics), 25);
   EXPECT_EQ(Slot(&S::DiagnosticsVersion), 26);
   EXPECT_EQ(Slot(&S::TextDocument_PullDiagnostics), 27);
+  EXPECT_EQ(Slot(&S::Enable), 28);
+  EXPECT_EQ(Slot(&S::ServerCapabilities), 29);
+  EXPECT_EQ(Slot(&S::ServerCapabilitiesJson), 30);
+  EXPECT_EQ(Slot(&S::Request), 31);
+  EXPECT_EQ(Slot(&S::Notify), 32);
+  EXPECT_EQ(Slot(&S::SetMessageHandler), 33);
+  EXPECT_EQ(Slot(&S::Reply), 34);
+  EXPECT_EQ(Slot(&S::ReplyError), 35);
+  EXPECT_EQ(Slot(&S::Cancel), 36);
+  EXPECT_EQ(Slot(&S::SetEnvironment), 37);
 }
 
 }  // namespace

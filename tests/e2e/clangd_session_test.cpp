@@ -6,6 +6,7 @@
 #include <set>
 
 #include "e2e_support.h"
+#include "vexil_test/support.h"
 
 namespace {
 
@@ -88,6 +89,15 @@ TEST_F(ClangdSession, NavigationFindsTheDeclarationsDefinitionsAndUsesOfTheExamp
   std::vector<LSP::Location> implementations = server->TextDocument_Implementation(&pureArea);
   ASSERT_EQ(implementations.size(), 1u);
   EXPECT_EQ(implementations[0].range.start.line, LineOf(project, "shapes.h", "int Area() const override"));
+
+  // Beyond the typed calls: what clangd announced, and a request the interface has no call for.
+  LSP::ServerCapabilities capabilities = server->ServerCapabilities();
+  EXPECT_TRUE(capabilities.documentHighlightProvider);
+  EXPECT_EQ(capabilities.documentSync.change, 2);
+  EXPECT_TRUE(capabilities.documentSync.openClose);
+  EXPECT_NE(std::string(server->ServerCapabilitiesJson()).find(R"("documentHighlightProvider":true)"), std::string::npos);
+  std::string highlights = server->Request("textDocument/documentHighlight", LSP::ToJsonText(at).c_str());
+  EXPECT_EQ(StartLines(highlights), std::vector<int>{clampCall.line}) << highlights;
 }
 
 TEST_F(ClangdSession, AssistanceCompletesMembersAndShowsSignaturesAndSymbols) {
@@ -171,6 +181,44 @@ TEST_F(ClangdSession, ChangedTextIsWhatTheServerAnswersAboutUntilShutdownAndExit
   EXPECT_TRUE(server->Shutdown());
   EXPECT_TRUE(Exits(*server));
   EXPECT_EQ(Vexil_Have("clangd-session"), nullptr);
+}
+
+// clangd indexes a project with a compilation database in the background and reports
+// its progress, but only to a client that announced work-done progress.
+TEST(ClangdProgress, BackgroundIndexingReachesTheMessageHandler) {
+  vexil_test::TempDirectory directory;
+  Project project{directory.Path().string(), "clangd", "--log=error"};
+  std::ofstream(directory / "a.cpp") << "int Twice(int value) { return 2 * value; }\n";
+  std::ofstream(directory / "b.cpp") << "int Twice(int value);\nint Four() { return Twice(2); }\n";
+  std::string database = "[";
+  for (const char* file : {"a.cpp", "b.cpp"}) {
+    database += std::string(database.size() > 1 ? "," : "") + R"({"directory":")" + project.directory +
+                R"(","file":")" + file + R"(","command":"c++ -c )" + file + R"("})";
+  }
+  std::ofstream(directory / "compile_commands.json") << database << "]";
+
+  struct Progress {
+    static void Handler(void* user, const char* method, const char* id, const char* params) {
+      Progress& self = *static_cast<Progress*>(user);
+      if (id) self.server->Reply(id, "null");  // "window/workDoneProgress/create"
+      if (std::string(method) == "$/progress" && std::string(params).find(R"("kind":"end")") != std::string::npos) {
+        self.ended = true;
+      }
+    }
+    xLanguageServer* server;
+    std::atomic<bool> ended{false};
+  } progress;
+  progress.server = Vexil_Start(StartRecord(project, "clangd-progress"));
+  EXPECT_TRUE(progress.server->Enable("progress"));
+  progress.server->SetMessageHandler(&Progress::Handler, &progress);
+  ASSERT_TRUE(progress.server->Start(InitRecord(project)));
+  Open(*progress.server, project, "b.cpp");
+  auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
+  while (!progress.ended && std::chrono::steady_clock::now() < deadline) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+  }
+  EXPECT_TRUE(progress.ended);
+  EXPECT_TRUE(Kill(*progress.server) && progress.server->Exit());
 }
 
 }  // namespace

@@ -54,6 +54,16 @@ TEST(CommandLine, LspPrintsLocationsWithTheirSourceAndCompletionsOnePerLine) {
             std::string::npos)
       << run.out;
   EXPECT_NE(run.out.find("\n  Scale(int factor)  : void\n"), std::string::npos) << run.out;
+  // Beyond the typed calls: what the server supports, and a request of any method.
+  Result beyond = Shell(R"("$VEXIL" lsp -- clangd --log=error --capabilities --open main.cpp --request )"
+                        R"(textDocument/documentHighlight "{\"textDocument\":{\"uri\":\"file://$PWD/main.cpp\"},)"
+                        R"(\"position\":{\"line\":14,\"character\":17}}")");
+  EXPECT_EQ(beyond.status, 0) << beyond.err;
+  EXPECT_EQ(beyond.out.rfind("capabilities\n", 0), 0u) << beyond.out;
+  EXPECT_NE(beyond.out.find("\n  documentHighlightProvider\n"), std::string::npos) << beyond.out;
+  EXPECT_NE(beyond.out.find("\n  textDocumentSync: incremental changes, open and close, save\n"), std::string::npos);
+  EXPECT_NE(beyond.out.find("request textDocument/documentHighlight\n  [{"), std::string::npos) << beyond.out;
+  EXPECT_NE(beyond.out.find(R"("start":{"character":17,"line":14}})"), std::string::npos) << beyond.out;
   // Files are found below --root, whatever the current directory.
   Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22");
   EXPECT_EQ(python.status, 0) << python.err;

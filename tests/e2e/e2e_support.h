@@ -9,6 +9,7 @@
 #include <atomic>
 #include <chrono>
 #include <fstream>
+#include <regex>
 #include <sstream>
 #include <string>
 #include <thread>
@@ -108,6 +109,16 @@ P At(const Project& project, const std::string& file, const LSP::Position& posit
   params.textDocument.uri = Uri(project, file);
   params.position = position;
   return params;
+}
+
+// The start lines of the ranges in `json` (a result as JSON text), in order.
+inline std::vector<int> StartLines(const std::string& json) {
+  static const std::regex start(R"("start":\{[^}]*"line":(\d+))");
+  std::vector<int> lines;
+  for (auto match = std::sregex_iterator(json.begin(), json.end(), start); match != std::sregex_iterator(); ++match) {
+    lines.push_back(std::stoi((*match)[1]));
+  }
+  return lines;
 }
 
 inline bool EndsWith(const std::string& text, const std::string& end) {

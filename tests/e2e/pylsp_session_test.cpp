@@ -33,6 +33,13 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   for (const LSP::Location& location : server->TextDocument_References(&call)) ++perFile[UriToFile(location.uri.c_str())];
   EXPECT_EQ(perFile, (std::map<std::string, int>{{Path(project, "geometry.py"), 3}, {Path(project, "main.py"), 2}}));
 
+  // Beyond the typed calls: what pylsp announced, and a request the interface has no call for.
+  EXPECT_TRUE(server->ServerCapabilities().documentHighlightProvider);
+  EXPECT_EQ(server->ServerCapabilities().documentSync.change, 2);
+  std::string highlights = server->Request("textDocument/documentHighlight", LSP::ToJsonText(call).c_str());
+  EXPECT_EQ(StartLines(highlights), (std::vector<int>{LineOf(project, "main.py", "import"), call.position.line}))
+      << highlights;
+
   auto member = At<LSP::CompletionParams>(project, "main.py", Find(project, "main.py", "rectangle.scale", 10));
   std::set<std::string> labels;
   for (const LSP::CompletionItem& item : server->TextDocument_Completion(&member).items) labels.insert(item.label);

@@ -398,4 +398,26 @@ TEST_F(ServerTraffic, ACallbackThatWaitsForAnotherThreadHoldsUpNothingElse) {
   EXPECT_TRUE(std::filesystem::exists(answered));
 }
 
+// Each server request handed to the host is answered once: by the host, or by the timer.
+TEST_F(ServerTraffic, HostAnswersGoOutOnceFromTheHostOrWhenTheirTimeIsUp) {
+  std::mutex mutex;
+  Texts sent;
+  vexil::HostAnswers answers(200ms);
+  answers.Attach([&](std::string body, const std::string& method) {
+    std::lock_guard<std::mutex> lock(mutex);
+    sent.push_back(method + " " + body);
+  });
+  answers.Expect("1", "a");
+  answers.Expect(R"("x")", "b");
+  EXPECT_TRUE(answers.Answer("1", "one"));
+  EXPECT_FALSE(answers.Answer("1", "again"));
+  EXPECT_TRUE(WaitFor([&] {
+    std::lock_guard<std::mutex> lock(mutex);
+    return sent.size() == 2;
+  }));
+  EXPECT_FALSE(answers.Answer(R"("x")", "late"));
+  std::lock_guard<std::mutex> lock(mutex);
+  EXPECT_EQ(sent, (Texts{"a one", R"(b {"jsonrpc":"2.0","id":"x","error":{"code":-32803,"message":"Request not answered"}})"}));
+}
+
 }  // namespace

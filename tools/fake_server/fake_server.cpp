@@ -24,7 +24,8 @@
 //   fail-once=PATH            exit with code 1 unless PATH exists, creating it
 //   diagnose                  publish diagnostics of opened and changed documents (below)
 // Methods: "fake/silent" (the prelude, no answer), "fake/exit" (params.code), "fake/stall" (a
-// notification and half a frame, then nothing until killed), "fake/cwd", "fake/received" (the notifications seen so far),
+// notification and half a frame, then nothing until killed), "fake/cwd", "fake/env" (the variables
+// params.names, null when unset), "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
 // params: delay (ms), stderr, garbage (raw stdout text), notifications (count), stale
 // (ids answered first), ask (methods sent to the client, each answer awaited), chatter
@@ -43,6 +44,7 @@
 // every line of the text that holds "error".
 #include <algorithm>
 #include <chrono>
+#include <cstdlib>
 #include <map>
 #include <fstream>
 #include <sstream>
@@ -246,6 +248,15 @@ std::string Result(const std::string& method, const rapidjson::Value& params, co
   result << "{\"method\":" << Quote(method);
   if (method == "fake/cwd") {
     result << ",\"cwd\":" << Quote(fake::CurrentDirectory());
+  }
+  if (method == "fake/env" && params.HasMember("names") && params["names"].IsArray()) {
+    result << ",\"env\":{";
+    for (const rapidjson::Value& name : params["names"].GetArray()) {
+      const char* value = std::getenv(name.GetString());
+      result << (&name == params["names"].Begin() ? "" : ",") << Quote(name.GetString()) << ":"
+             << (value ? Quote(value) : "null");
+    }
+    result << "}";
   }
   result << ",\"answers\":[";
   for (std::size_t i = 0; i < answers.size(); ++i) result << (i ? "," : "") << answers[i];

@@ -38,6 +38,11 @@ const std::vector<ActionInfo> kActions = {
     {ActionKind::Close, "--close", Operand::File, "textDocument/didClose", false, "close it"},
     {ActionKind::Diagnostics, "--diagnostics", Operand::File, "textDocument/diagnostic", true,
      "its errors and warnings: path:line:col: severity: message [source code]"},
+    {ActionKind::Capabilities, "--capabilities", Operand::None, "initialize", true,
+     "what the server announced it supports"},
+    {ActionKind::Request, "--request", Operand::MethodParams, "", true,
+     "any request; PARAMS a JSON object, the result printed as JSON"},
+    {ActionKind::Notify, "--notify", Operand::MethodParams, "", false, "any notification"},
 };
 
 template <typename P>
@@ -122,6 +127,12 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
     case ActionKind::Format:
     case ActionKind::RangeFormat: outcome.edits = Formatting(session, action); break;
     case ActionKind::Diagnostics: outcome.diagnostics = session.Diagnostics(action.path); break;
+    case ActionKind::Capabilities:
+      outcome.capabilities = server.ServerCapabilities();
+      outcome.json = server.ServerCapabilitiesJson();
+      break;
+    case ActionKind::Request: outcome.json = server.Request(action.text.c_str(), action.params.c_str()); break;
+    case ActionKind::Notify: server.Notify(action.text.c_str(), action.params.c_str()); break;
     case ActionKind::Rename: {
       auto params = Positioned<LSP::RenameParams>(session, action);
       params.newName = action.text;
@@ -154,13 +165,19 @@ const char* OperandForm(Operand operand) {
     case Operand::Position: return "FILE:LINE:COL";
     case Operand::Range: return "FILE:L1:C1:L2:C2";
     case Operand::Rename: return "FILE:LINE:COL:NEWNAME";
+    case Operand::None: return "";
+    case Operand::MethodParams: return "METHOD PARAMS";
     default: return "QUERY";
   }
 }
 
 std::string Describe(const Action& action) {
   std::string name = std::string(InfoOf(action.kind).option).substr(2);
-  if (action.kind == ActionKind::WorkspaceSymbols) return name + " " + action.text;
+  if (action.kind == ActionKind::WorkspaceSymbols || action.kind == ActionKind::Request ||
+      action.kind == ActionKind::Notify) {
+    return name + " " + action.text;
+  }
+  if (action.kind == ActionKind::Capabilities) return name;
   std::string where = action.file;
   if (action.line > 0) where += ":" + std::to_string(action.line) + ":" + std::to_string(action.column);
   if (action.endLine > 0) where += ":" + std::to_string(action.endLine) + ":" + std::to_string(action.endColumn);
@@ -168,11 +185,16 @@ std::string Describe(const Action& action) {
   return name + " " + where;
 }
 
+std::string MethodOf(const Action& action) {
+  return action.kind == ActionKind::Request || action.kind == ActionKind::Notify ? action.text
+                                                                                : InfoOf(action.kind).method;
+}
+
 Outcome Perform(Session& session, const Action& action) {
   Outcome outcome;
   session.Mark();
   Ask(session, action, outcome);
-  outcome.failed = session.Failed(InfoOf(action.kind).method, outcome.why);
+  outcome.failed = session.Failed(MethodOf(action), outcome.why);
   return outcome;
 }
 

@@ -21,11 +21,13 @@ namespace cli {
 
 enum class ActionKind {
   Open, Hover, Definition, Declaration, TypeDefinition, Implementation, References, Completion,
-  Signature, Symbols, WorkspaceSymbols, Format, RangeFormat, Rename, Change, Save, Close, Diagnostics
+  Signature, Symbols, WorkspaceSymbols, Format, RangeFormat, Rename, Change, Save, Close, Diagnostics,
+  Capabilities, Request, Notify
 };
 
-// How an action's operand is written on the command line.
-enum class Operand { File, Position, Range, Rename, Query };
+// How an action's operand is written on the command line. A request takes two operands:
+// the method and its params as JSON text.
+enum class Operand { File, Position, Range, Rename, Query, None, MethodParams };
 
 struct ActionInfo {
   ActionKind kind;
@@ -44,7 +46,8 @@ struct Action {
   int column = 0;
   int endLine = 0;
   int endColumn = 0;
-  std::string text;  // the workspace-symbol query or the new name
+  std::string text;  // the workspace-symbol query, the new name, or a request's method
+  std::string params;  // a request's params as JSON text
 };
 
 // The edits the server proposes for one file.
@@ -61,6 +64,8 @@ struct Outcome {
   std::vector<LSP::SymbolInformation> symbols;
   std::vector<FileEdits> edits;
   std::vector<LSP::Diagnostic> diagnostics;
+  LSP::ServerCapabilities capabilities;
+  std::string json;  // the capabilities, or a request's result, as JSON text
   bool failed = false;
   std::string why;  // when failed
 };
@@ -69,6 +74,8 @@ const std::vector<ActionInfo>& Actions();
 const ActionInfo& InfoOf(ActionKind kind);
 // The action `option` asks for (without any "=OPERAND"), or null.
 const ActionInfo* ActionOfOption(const std::string& option);
+// The method an action sends: its own, or the one a request names.
+std::string MethodOf(const Action& action);
 // The operand as the help text writes it: "FILE:LINE:COL".
 const char* OperandForm(Operand operand);
 // The action as a person would name it: "hover main.cpp:15:18".

@@ -7,6 +7,7 @@
 #include "host_process.h"
 #include "lsp_options.h"
 #include "render.h"
+#include "server_messages.h"
 #include "trace_sink.h"
 #include "vexil/client/uri.h"
 
@@ -46,6 +47,8 @@ std::string LspHelp() {
       "  --language=ID     language id of every file, instead of the one its extension gives\n"
       "  --json            one JSON object per answer and per failure (JSON Lines)\n"
       "  --trace=LEVEL     show the library's trace on stderr: off, messages or verbose\n"
+      "  --env=NAME=VALUE  set a variable of the server's environment (repeatable)\n"
+      "  --progress        announce work-done progress, and show the server's on stderr\n"
       "  --help            show this help\n"
       "\n"
       "Actions (lines and columns count from 1, columns in bytes):\n";
@@ -54,8 +57,9 @@ std::string LspHelp() {
     text += left + std::string(left.size() < 42 ? 42 - left.size() : 1, ' ') + info.help + "\n";
   }
   return text +
-         "A file is opened before its first action. Exit status: 0 success, 1 a file, the server\n"
-         "or an action failed, 2 bad usage, 130 or 143 when interrupted.\n";
+         "A file is opened before its first action. The server's messages and log lines are shown\n"
+         "on stderr. Exit status: 0 success, 1 a file, the server or an action failed, 2 bad usage,\n"
+         "130 or 143 when interrupted.\n";
 }
 
 int RunLsp(const Arguments& arguments) {
@@ -84,6 +88,7 @@ int RunLsp(const Arguments& arguments) {
     if (Interrupted()) break;
     Outcome outcome = Perform(session, action);
     if (Interrupted()) break;
+    EndProgressLine();  // an answer on the same terminal starts at the margin
     if (options.json) PrintJson(std::cout, action, outcome);
     else if (!outcome.failed) PrintReadable(std::cout, action, outcome);
     std::cout.flush();

@@ -2,6 +2,8 @@
 // the first action option, so servers keep options of their own (--log=error).
 #include "lsp_options.h"
 
+#include "vexil/json/json.h"
+
 namespace cli {
 namespace {
 
@@ -52,7 +54,37 @@ void ReadOperand(const std::string& text, Operand operand, Action& action) {
       action.endColumn = PositiveNumber(pieces[4], "C2");
       break;
     }
+    case Operand::None:
+    case Operand::MethodParams: break;  // read by ReadOperands
   }
+}
+
+// A request's params: checked here, so that a typing error costs no server launch.
+std::string JsonParams(const std::string& option, const std::string& text) {
+  LSP::xReader reader;
+  if (text.empty() || text == "null") return text;
+  if (!reader.Parse(text)) {
+    std::string why = reader.Error();
+    throw UsageError(option + ": PARAMS is not JSON: " + why.substr(0, why.find('\n')));
+  }
+  if (!reader.Root().IsObject()) throw UsageError(option + ": PARAMS must be a JSON object, not '" + text + "'");
+  return text;
+}
+
+// Reads the operands of the action at hand.
+void ReadOperands(OptionReader& reader, const ActionInfo& info, Action& action) {
+  if (info.operand == Operand::None) return reader.Flag();
+  if (info.operand != Operand::MethodParams) return ReadOperand(reader.Value(), info.operand, action);
+  action.text = reader.Value();
+  if (reader.Done()) throw UsageError(std::string(info.option) + " takes METHOD and PARAMS (e.g. {} or null)");
+  action.params = JsonParams(info.option, reader.Take());
+}
+
+// "NAME=VALUE" of --env.
+std::pair<std::string, std::string> Variable(const std::string& text) {
+  std::size_t equals = text.find('=');
+  if (equals == std::string::npos || equals == 0) throw UsageError("--env takes NAME=VALUE, not '" + text + "'");
+  return {text.substr(0, equals), text.substr(equals + 1)};
 }
 
 LSP::TraceLevel TraceLevelOf(const std::string& text) {
@@ -74,6 +106,8 @@ void ReadOptions(OptionReader& reader, LspOptions& options) {
     else if (reader.Is("--root")) options.session.root = reader.Value();
     else if (reader.Is("--language")) options.session.language = reader.Value();
     else if (reader.Is("--json")) reader.Flag(), options.json = true;
+    else if (reader.Is("--env")) options.session.environment.push_back(Variable(reader.Value()));
+    else if (reader.Is("--progress")) reader.Flag(), options.session.progress = true;
     else if (ActionAt(reader)) throw UsageError(reader.Current() + " is an action: it follows '-- SERVER [ARG]...'");
     else reader.Unknown();
   }
@@ -106,7 +140,7 @@ LspOptions ParseLspOptions(const std::vector<std::string>& arguments) {
     if (!info) throw UsageError("unknown action '" + reader.Current() + "'");
     Action action;
     action.kind = info->kind;
-    ReadOperand(reader.Value(), info->operand, action);
+    ReadOperands(reader, *info, action);
     options.actions.push_back(action);
   }
   if (options.actions.empty()) throw UsageError("no action given");

@@ -146,6 +146,8 @@ void PrintReadable(std::ostream& out, const Action& action, const Outcome& outco
     case ActionKind::RangeFormat:
     case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
     case ActionKind::Diagnostics: PrintDiagnostics(out, action.path, outcome.diagnostics); break;
+    case ActionKind::Capabilities: PrintCapabilities(out, outcome); break;
+    case ActionKind::Request: PrintRequestResult(out, outcome); break;
     default: PrintLocations(out, outcome.locations); break;
   }
 }

@@ -5,7 +5,7 @@
 //   {"action":"hover","file":"main.cpp","line":15,"column":18,"failed":false,"result":...}
 //   {"action":"start","failed":true,"error":"clangd exited with status 1: ..."}
 // "file", "line", "column" and "text" (a query or new name) echo the operand; "result" is
-// a text (hover), or an array of objects with "path" (absolute), "line", "column",
+// a text (hover), the server's JSON (capabilities, request), or an array of objects with "path" (absolute), "line", "column",
 // "endLine", "endColumn" (from 1, columns in bytes) and the answer's own members. Every
 // "kind" and "severity" is a name ("function", "error"), as in the readable form.
 #pragma once
@@ -21,6 +21,10 @@ void PrintReadable(std::ostream& out, const Action& action, const Outcome& outco
 void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome);
 // The object of a failure that belongs to no answer: "start", or an action whose file failed.
 void PrintJsonError(std::ostream& out, const std::string& action, const std::string& why);
+
+// A server's capabilities, one per line, and a request's result as JSON text.
+void PrintCapabilities(std::ostream& out, const Outcome& outcome);
+void PrintRequestResult(std::ostream& out, const Outcome& outcome);
 
 // "path:line:col" of a location, the path relative to the current directory when below it
 // and the column in bytes.

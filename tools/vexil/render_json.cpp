@@ -102,6 +102,12 @@ void Diagnostics(LSP::xWriter& writer, const std::string& path, const std::vecto
   writer.EndArray();
 }
 
+// JSON text as it came, under "result"; null when there is none.
+void RawResult(LSP::xWriter& writer, const std::string& json) {
+  LSP::xReader reader;
+  if (reader.Parse(json.empty() ? "null" : json)) writer.Raw("result", reader.Root().Value());
+}
+
 void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) {
   switch (action.kind) {
     case ActionKind::Hover: writer.RequiredString("result", HoverText(outcome.hover)); break;
@@ -113,6 +119,8 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
     case ActionKind::RangeFormat:
     case ActionKind::Rename: Edits(writer, outcome.edits); break;
     case ActionKind::Diagnostics: Diagnostics(writer, action.path, outcome.diagnostics); break;
+    case ActionKind::Capabilities:
+    case ActionKind::Request: RawResult(writer, outcome.json); break;
     default: Locations(writer, outcome.locations); break;
   }
 }

@@ -15,6 +15,7 @@
 #include "columns.h"
 #include "host_process.h"
 #include "options.h"
+#include "server_messages.h"
 #include "trace_sink.h"
 #include "vexil/client/uri.h"
 #include "wait_notice.h"
@@ -107,10 +108,15 @@ void CheckDocument(const std::string& path, const std::string& shownAs) {
 Session::Session(const SessionOptions& options) : options_(options), server_(nullptr) {
   ListenForServer();
   server_ = Vexil_Start(StartRecord(options));
+  for (const auto& [name, value] : options.environment) server_->SetEnvironment(name.c_str(), value.c_str());
+  if (options.progress) server_->Enable("progress");
+  server_->SetMessageHandler(&ShowServerMessage, this);
 }
 
 Session::~Session() {
-  if (Vexil_Have(options_.name.c_str()) == server_) Stop();
+  if (Vexil_Have(options_.name.c_str()) != server_) return;
+  // A server that would not end keeps running: it must not call back into this session.
+  if (stopTried_ || !Stop()) server_->SetMessageHandler(nullptr, nullptr);
 }
 
 std::string Session::Program() const { return std::filesystem::path(options_.program).filename().string(); }
@@ -149,13 +155,14 @@ std::string Session::StartFailure(const std::string& detail) {
 }
 
 bool Session::Stop() {
+  stopTried_ = true;
   server_->Shutdown();
   // Each Exit gives the server about a second to end; an interpreter on a busy machine can
   // take longer, so the server counts as stuck only when several of them went by.
-  for (int attempt = 0; attempt < kExitAttempts; ++attempt) {
-    if (server_->Exit()) return true;
-  }
-  return false;
+  bool ended = false;
+  for (int attempt = 0; attempt < kExitAttempts && !ended; ++attempt) ended = server_->Exit();
+  EndProgressLine();
+  return ended;
 }
 
 std::string Session::Document(const std::string& path) {

@@ -4,6 +4,7 @@
 
 #include <map>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "vexil/host/language_server.h"
@@ -18,6 +19,8 @@ struct SessionOptions {
   int timeout = 5000;
   LSP::TraceLevel trace = LSP::TraceLevel::Off;  // what of the library's trace is shown
   std::string language;  // the language id of every document, instead of the file's own
+  std::vector<std::pair<std::string, std::string>> environment;  // the server's, over ours
+  bool progress = false;  // announce work-done progress, and show it
 };
 
 class Session {
@@ -25,7 +28,7 @@ class Session {
   explicit Session(const SessionOptions& options);
   Session(const Session&) = delete;
   Session& operator=(const Session&) = delete;
-  // Stops the server if that has not been done.
+  // Stops the server if that has not been tried.
   ~Session();
 
   // Launches and initializes the server; false with the reason in one line when that failed.
@@ -73,6 +76,7 @@ class Session {
   std::map<std::string, OpenDocument> documents_;  // open documents by URI
   int sends_ = 0;                              // didOpen and didChange so far
   int errorMark_ = 0;
+  bool stopTried_ = false;  // a server that would not end is not waited for twice
 };
 
 // `path` made absolute and normal, as documents are named.

@@ -2,19 +2,23 @@
 // create connections by server name.
 #pragma once
 
+#include <string>
 #include <vector>
 
 #include "vexil/export.h"
 #include "vexil/host/records.h"
+#include "vexil/host/server_messages.h"
 #include "vexil/protocol/diagnostics.h"
 #include "vexil/protocol/feature_params.h"
 #include "vexil/protocol/feature_results.h"
+#include "vexil/protocol/server_capabilities.h"
 
 // One connection. Hosts call through the virtual slots, so the declaration order below is
 // part of the calling contract and must never change (Exit first, RangeFormatting after
 // Formatting). Connections destroy themselves in a successful Exit; hosts never delete them.
-// Every call runs on the host's thread and never throws for protocol or I/O failures:
-// failures give empty results or false, and HaveErrors()/ErrorMessage() tell what went wrong.
+// Every call runs on the host's thread (Cancel, Reply and ReplyError on any thread) and never
+// throws for protocol or I/O failures: failures give empty results or false, and
+// HaveErrors()/ErrorMessage() tell what went wrong.
 class VEXIL_API xLanguageServer {
  public:
   // Sends "exit" and waits about a second for the server to end; true when it did, and
@@ -57,6 +61,42 @@ class VEXIL_API xLanguageServer {
   // Asks a server that announced a diagnostic provider ("textDocument/diagnostic") and
   // stores the answer; to any other server nothing is sent and the stored ones return.
   virtual std::vector<LSP::Diagnostic> TextDocument_PullDiagnostics(LSP::TextDocumentIdentifier* document) = 0;
+  // Opts in to `feature`, before Initialize; false for a name the library does not know.
+  // "progress" announces work-done progress (window.workDoneProgress) and hands the
+  // server's "window/workDoneProgress/create" to the message handler; "configuration"
+  // announces workspace.configuration and hands "workspace/configuration" to the handler;
+  // "messages" hands the handler both of those and every server request the library
+  // cannot answer itself. With nothing enabled the initialize request is what it always was.
+  virtual bool Enable(const char* feature) = 0;
+  // What the server announced in its reply to initialize.
+  virtual LSP::ServerCapabilities ServerCapabilities() = 0;
+  // The reply's "capabilities" object as JSON text; empty before Initialize.
+  virtual const char* ServerCapabilitiesJson() = 0;
+  // Sends the request `method` with `paramsJson` (a JSON object; null or "" sends no
+  // params) and returns the reply's "result" as JSON text, "null" for a null result. On
+  // any failure it returns "" and the error state and trace lines are those of the typed
+  // calls; params that are not a JSON object are refused before anything is sent, with
+  // the "Error" line "Invalid JSON for <method>: <reason>".
+  virtual std::string Request(const char* method, const char* paramsJson) = 0;
+  // Sends the notification `method`, under the same rules; true once it was written.
+  virtual bool Notify(const char* method, const char* paramsJson) = 0;
+  // The server's own messages and its exit go to `handler` (see xMessageHandler); null
+  // stops handing them over. Without a handler everything stays as before.
+  virtual void SetMessageHandler(xMessageHandler handler, void* userData) = 0;
+  // Answer a server request handed to the handler, from any thread: with a result as JSON
+  // text (null or "" for null), or with an error. False for an id that does not wait for
+  // an answer (unknown, or answered already) and for a result that is not JSON. A request
+  // left unanswered for 30 s, or still waiting at Exit, gets error -32803 "Request not answered".
+  virtual bool Reply(const char* idJson, const char* resultJson) = 0;
+  virtual bool ReplyError(const char* idJson, int code, const char* message) = 0;
+  // From any other thread: ends the request in progress (being written, or waiting for
+  // its reply) within 100 ms, as a time-out would (empty result, error state untouched, "$/cancelRequest" sent) but tracing only
+  // "Request Cancelled: <id>" under "Message". Does nothing when no call waits.
+  virtual void Cancel() = 0;
+  // Sets (a null value: removes) a variable of the server's environment, which is the
+  // host's own plus these; before Start. False for a name that cannot be a variable's and
+  // while the server runs.
+  virtual bool SetEnvironment(const char* name, const char* value) = 0;
 
  protected:
   // Not virtual, so no slot precedes Exit; protected, so hosts end connections with Exit.

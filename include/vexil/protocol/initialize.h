@@ -58,6 +58,9 @@ class VEXIL_API InitializeResult : public Result {
   void Write(xWriter& writer) override {}
 
   ServerCapabilities capabilities;
+  // The reply's "capabilities" object as compact JSON text, for what the model does not
+  // read; empty when there was none (or it nests deeper than the library walks).
+  std::string capabilitiesJson;
 };
 
 }  // namespace LSP

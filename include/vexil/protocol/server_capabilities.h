@@ -92,7 +92,8 @@ class VEXIL_API ExecuteCommandOptions : public Params {
 
 // A boolean provider is true for `true` and for an options object; anything else is false
 // and never fails the reading. An option provider of the wrong type (a boolean where its
-// options object belongs) makes the reading throw. The synchronisation member is not read.
+// options object belongs) makes the reading throw. The synchronisation member
+// `textDocumentSync` is not read; `documentSync` at the end holds what the server said.
 class VEXIL_API ServerCapabilities : public Params {
  public:
   ServerCapabilities() { name = "capabilities"; }
@@ -131,6 +132,12 @@ class VEXIL_API ServerCapabilities : public Params {
   bool inlayHintProvider = false;
   // "renameProvider": {"prepareProvider": true}: the server answers "textDocument/prepareRename".
   bool prepareRenameProvider = false;
+  // "textDocumentSync" in either form the protocol allows, never failing the reading. A
+  // number is the change kind (0 none, 1 full text, 2 incremental), with open, close and
+  // save notifications wanted unless it is 0; an options object gives each setting.
+  TextDocumentSyncOptions documentSync;
+  // Whether the server wants "textDocument/didSave" ("save": true or an options object).
+  bool documentSyncSave = false;
 };
 
 }  // namespace LSP
