@@ -85,20 +85,34 @@ void RoundTrip_hover_floor(benchmark::State& state) {
   Bare<LSP::TextDocumentPositionParams>(state, "textDocument/hover", HoverFile());
 }
 
-// The host's view: a registered connection, initialized, asked for hovers through its
-// interface, as an IDE asks while the user moves the mouse.
-void RoundTrip_hover_connection(benchmark::State& state) {
+// The host's view: a registered connection at trace level 0, initialized, asked through its
+// interface as an IDE asks (hovers while the user moves the mouse, completions as they type).
+template <typename Ask>
+void ThroughConnection(benchmark::State& state, const char* name, const std::string& resultFile, Ask ask) {
   xServerStart start;
   start.executable = VEXIL_FAKE_SERVER;
-  start.argument1 = "result-file=" + HoverFile();
+  start.argument1 = "result-file=" + resultFile;
   start.timeout = 5000;
-  start.name = "bench-hover";
+  start.name = name;
   xLanguageServer* server = Vexil_Start(start);
   if (!server->Start(xServerInitialise())) return state.SkipWithError("the connection did not start");
-  auto params = AtPosition<LSP::TextDocumentPositionParams>();
-  for (auto _ : state) benchmark::DoNotOptimize(server->TextDocument_Hover(&params).contents.value.data());
+  for (auto _ : state) ask(*server);
   server->Shutdown();
   if (!server->Exit()) state.SkipWithError("the connection did not exit");
+}
+
+void RoundTrip_hover_connection(benchmark::State& state) {
+  auto params = AtPosition<LSP::TextDocumentPositionParams>();
+  ThroughConnection(state, "bench-hover", HoverFile(), [&](xLanguageServer& server) {
+    benchmark::DoNotOptimize(server.TextDocument_Hover(&params).contents.value.data());
+  });
+}
+
+void RoundTrip_completion_connection(benchmark::State& state) {
+  auto params = AtPosition<LSP::CompletionParams>();
+  ThroughConnection(state, "bench-completion", CompletionFile(), [&](xLanguageServer& server) {
+    if (server.TextDocument_Completion(&params).items.empty()) state.SkipWithError("no completion");
+  });
 }
 
 void RoundTrip_completion_vexil(benchmark::State& state) {
@@ -117,6 +131,7 @@ BENCHMARK(RoundTrip_hover_vexil)->Apply(Figure);
 BENCHMARK(RoundTrip_hover_floor)->Apply(Figure);
 BENCHMARK(RoundTrip_hover_connection)->Apply(Figure);
 BENCHMARK(RoundTrip_completion_vexil)->Apply(Figure);
+BENCHMARK(RoundTrip_completion_connection)->Apply(Figure);
 BENCHMARK(RoundTrip_completion_floor)->Apply(Figure);
 
 }  // namespace

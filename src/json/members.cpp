@@ -59,8 +59,9 @@ Members::Members(const xObject& value, const MemberNames& names) : value_(value)
          slot = names.next_[slot]) {
       if (names.lengths_[slot] != length || !SameBytes(names.names_[slot], text, length)) continue;
       // A later duplicate finds its slot taken: the first one wins, as a search finds it.
-      if (!found_[slot]) {
-        found_[slot] = &member->value;
+      if (!Found(slot)) {
+        members_[slot] = &member->value;
+        found_ |= 1u << slot;
         --left;
       }
       break;

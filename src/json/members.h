@@ -43,7 +43,7 @@ class Members {
 
   bool HasObject(const char* name) const {
     const int slot = Slot(name);
-    return slot < 0 ? value_.HasObject(name) : found_[slot] != nullptr;
+    return slot < 0 ? value_.HasObject(name) : Found(slot);
   }
   xObject Object(const char* name) const {
     const int slot = Slot(name);
@@ -73,17 +73,22 @@ class Members {
     return SearchSlot(name);
   }
   int SearchSlot(const char* name) const;
-  // The member in `slot` unless it is null.
+  bool Found(int slot) const { return (found_ >> slot & 1u) != 0; }
+  // The member in `slot` unless it is missing or null.
   const JsonValue* Present(int slot) const {
-    const JsonValue* member = found_[slot];
-    return member && !member->IsNull() ? member : nullptr;
+    if (!Found(slot)) return nullptr;
+    const JsonValue* member = members_[slot];
+    return member->IsNull() ? nullptr : member;
   }
 
   const xObject& value_;
   const MemberNames& names_;
   bool indexed_ = false;
   mutable std::size_t next_ = 0;
-  const JsonValue* found_[MemberNames::kMost] = {};
+  // A bit per slot that holds a member: the slots themselves are left unset, since clearing
+  // them cost more than the whole pass over a small object.
+  std::uint32_t found_ = 0;
+  const JsonValue* members_[MemberNames::kMost];
 };
 
 }  // namespace LSP

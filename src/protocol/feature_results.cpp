@@ -79,7 +79,8 @@ void CompletionList::Read(const xObject& value) {
   }
   if (!keepItemJson || !array.IsArray()) return;
   std::size_t item = items.size() - array.Value().Size();  // items read before this reply stay
-  for (const JsonValue& element : array.Value().GetArray()) items[item++].rawJson = RawJsonText(xObject(element));
+  RawJsonTexts texts;
+  for (const JsonValue& element : array.Value().GetArray()) items[item++].rawJson = texts.Text(xObject(element));
 }
 
 void LocationsList::Read(const xObject& value) {

@@ -28,12 +28,14 @@ bool ParseJsonText(const std::string& json, JsonDocument& document, std::string&
   return false;
 }
 
-std::string RawJsonText(const xObject& value) {
+std::string RawJsonText(const xObject& value) { return RawJsonTexts().Text(value); }
+
+std::string RawJsonTexts::Text(const xObject& value) {
   if (value.IsNull()) return "";
-  rapidjson::StringBuffer buffer;
-  rapidjson::Writer<rapidjson::StringBuffer> writer(buffer);
-  value.Value().Accept(writer);
-  return std::string(buffer.GetString(), buffer.GetSize());
+  buffer_.Clear();
+  writer_.Reset(buffer_);
+  value.Value().Accept(writer_);
+  return std::string(buffer_.GetString(), buffer_.GetSize());
 }
 
 void WriteRawJson(xWriter& writer, const char* name, const std::string& json) {

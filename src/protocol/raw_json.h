@@ -15,6 +15,18 @@ bool ParseJsonText(const std::string& json, JsonDocument& document, std::string&
 // The value as compact JSON text; "" for a null or missing value.
 std::string RawJsonText(const xObject& value);
 
+// RawJsonText for values taken by the thousand (the items of a completion list): one
+// buffer and one writer serve them all.
+class RawJsonTexts {
+ public:
+  RawJsonTexts() : writer_(buffer_) {}
+  std::string Text(const xObject& value);
+
+ private:
+  rapidjson::StringBuffer buffer_;
+  rapidjson::Writer<rapidjson::StringBuffer> writer_;
+};
+
 // Writes `json` as the member `name`; nothing when `json` is empty. Text that is not JSON
 // throws "Invalid JSON for <name>: <parser's text>".
 void WriteRawJson(xWriter& writer, const char* name, const std::string& json);

@@ -25,6 +25,12 @@ InputWriter::Outcome InputWriter::Send(std::string bytes, int limitMs) {
                                              limitMs, false, std::string()});
   std::unique_lock<std::mutex> lock(mutex_);
   if (!started_ || closed_) return Outcome::Failed;
+  if (frames_.empty() && !writing_) {
+    writing_ = true;
+    lock.unlock();
+    WriteClaimed(*frame);
+    return frame->outcome;
+  }
   frames_.push_back(frame);
   queued_.notify_one();
   // Bounded: every frame ahead of this one ends by its own deadline.
@@ -57,7 +63,9 @@ void InputWriter::Close() {
     queued_.notify_one();
   }
   if (thread_.joinable()) thread_.join();
-  std::lock_guard<std::mutex> lock(mutex_);
+  std::unique_lock<std::mutex> lock(mutex_);
+  // A sender writing on its own thread sees the stop flag within one write step.
+  finished_.wait(lock, [this] { return !writing_; });
   closed_ = true;
   // The connection is going away: its unwritten answers need no report.
   FailQueued(false);
@@ -74,21 +82,29 @@ void InputWriter::Run() {
     std::shared_ptr<Frame> frame;
     {
       std::unique_lock<std::mutex> lock(mutex_);
-      queued_.wait(lock, [this] { return stopping_ || !frames_.empty(); });
+      queued_.wait(lock, [this] { return stopping_ || (!frames_.empty() && !writing_); });
       if (stopping_) return;
       frame = frames_.front();
       frames_.pop_front();
       if (frame->answer) --answers_;
+      writing_ = true;
     }
-    Outcome outcome = Write(*frame);
-    if (outcome != Outcome::Written) Report(*frame, outcome);
-    std::lock_guard<std::mutex> lock(mutex_);
-    Finish(*frame, outcome);
-    if (outcome == Outcome::Written) continue;
-    closed_ = true;
-    timedOut_ = timedOut_ || outcome == Outcome::TimedOut;
-    FailQueued(true);
+    WriteClaimed(*frame);
   }
+}
+
+void InputWriter::WriteClaimed(Frame& frame) {
+  Outcome outcome = Write(frame);
+  if (outcome != Outcome::Written) Report(frame, outcome);
+  std::lock_guard<std::mutex> lock(mutex_);
+  writing_ = false;
+  Finish(frame, outcome);
+  // What was queued meanwhile is the writer thread's to write.
+  if (!frames_.empty()) queued_.notify_one();
+  if (outcome == Outcome::Written) return;
+  closed_ = true;
+  timedOut_ = timedOut_ || outcome == Outcome::TimedOut;
+  FailQueued(true);
 }
 
 InputWriter::Outcome InputWriter::Write(Frame& frame) {

@@ -21,7 +21,9 @@ namespace vexil {
 // The host's messages wait for their own write; answers to the server's requests are
 // queued and not waited for, so the output reader that hands them in never stops
 // draining the server's output. A frame that misses its deadline closes the input, so a
-// half-written frame is never followed by another.
+// half-written frame is never followed by another. A message sent while nothing is queued
+// or being written is written by the sending thread itself, within the same deadline: the
+// hand-over to the writer thread and back costs a short request more than its write.
 class InputWriter {
  public:
   enum class Outcome { Written, Failed, TimedOut };
@@ -60,6 +62,9 @@ class InputWriter {
   };
 
   void Run();
+  // Writes `frame`, which the caller has claimed the pipe for (`writing_`), and settles
+  // the outcome: a frame that was not written closes the input.
+  void WriteClaimed(Frame& frame);
   Outcome Write(Frame& frame);
   void Report(const Frame& frame, Outcome outcome);
   // Under the lock: marks `frame` done and wakes its sender.
@@ -77,6 +82,7 @@ class InputWriter {
   bool started_ = false;
   bool closed_ = false;    // nothing more is written: a write failed, or Close
   bool timedOut_ = false;
+  bool writing_ = false;   // a thread writes to the pipe: it is not the other one's turn
   std::atomic<bool> stopping_{false};
   std::thread thread_;
 };

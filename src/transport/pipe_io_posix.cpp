@@ -18,23 +18,31 @@ namespace vexil {
 namespace {
 
 // Blocks SIGPIPE on this thread for its lifetime. A SIGPIPE raised meanwhile by our own
-// write stays pending; it is consumed before the old mask returns, unless one was
-// already pending for someone else.
+// write (one that failed with EPIPE) stays pending; it is consumed before the old mask
+// returns, unless one was already pending for someone else. Only a thread that blocked
+// SIGPIPE already can have one pending (it would have been delivered otherwise), so only
+// such a thread pays for looking: the host's thread writes its requests itself, and every
+// system call counts there.
 class SigpipeBlock {
  public:
   SigpipeBlock() {
     sigemptyset(&pipeOnly_);
     sigaddset(&pipeOnly_, SIGPIPE);
-    sigset_t pending;
-    sigpending(&pending);
-    wasPending_ = sigismember(&pending, SIGPIPE) == 1;
     pthread_sigmask(SIG_BLOCK, &pipeOnly_, &previous_);
+    if (sigismember(&previous_, SIGPIPE) == 1) {
+      sigset_t pending;
+      sigpending(&pending);
+      wasPending_ = sigismember(&pending, SIGPIPE) == 1;
+    }
   }
 
   ~SigpipeBlock() {
-    if (!wasPending_) ConsumePending();
+    if (raised_ && !wasPending_) ConsumePending();
     pthread_sigmask(SIG_SETMASK, &previous_, nullptr);
   }
+
+  // A write failed with EPIPE: the kernel raised SIGPIPE for it.
+  void Raised() { raised_ = true; }
 
   SigpipeBlock(const SigpipeBlock&) = delete;
   SigpipeBlock& operator=(const SigpipeBlock&) = delete;
@@ -54,6 +62,7 @@ class SigpipeBlock {
   sigset_t pipeOnly_;
   sigset_t previous_;
   bool wasPending_ = false;
+  bool raised_ = false;
 };
 
 }  // namespace
@@ -91,6 +100,7 @@ PipeWrite WriteAll(const Poco::Pipe& pipe, const char* data, std::size_t size,
       size -= static_cast<std::size_t>(count);
       continue;
     }
+    if (count < 0 && errno == EPIPE) block.Raised();
     if (count < 0 && errno != EINTR && errno != EAGAIN && errno != EWOULDBLOCK) return PipeWrite::Failed;
     if (stop && *stop) return PipeWrite::Stopped;
     auto left = std::chrono::duration_cast<std::chrono::milliseconds>(deadline - std::chrono::steady_clock::now());

@@ -88,13 +88,22 @@ class InotifyTree {
   // With a watch that asked for them: the file at `relative` has new content.
   void ReportModified(ReadOutcome& outcome, std::int64_t id, const std::string& relative) const;
   bool Recursive(std::int64_t id) const;
+  // Where a directory is opened from: its parent, held open, and its name there; or, with
+  // no parent, its path.
+  struct Opening {
+    int parent;
+    const char* name;
+    int heldLevels;  // ancestors held open, the parent included
+  };
+  static constexpr Opening kByPath{-1, nullptr, 0};
   // Watches `path` and its subdirectories for `owners`; with `reportEntries`, every entry
   // found is reported as added, since it may have appeared before the watch existed.
-  void AddSubtree(const std::string& path, const Owners& owners, ReadOutcome& outcome, bool reportEntries);
-  // Opens `path` as a directory and watches it through that descriptor, so that the watch,
-  // its identity and the listing are all of one directory whatever was renamed meanwhile.
-  int WatchDirectory(const std::string& path, bool followLink, bool modifications, Identity& identity,
-                     UniqueFd& directory) const;
+  void AddSubtree(const std::string& path, const Owners& owners, ReadOutcome& outcome, bool reportEntries,
+                  const Opening& from = kByPath);
+  // Opens the directory as a directory and watches it through that descriptor, so that the
+  // watch, its identity and the listing are all of one directory whatever was renamed meanwhile.
+  int WatchDirectory(const std::string& path, const Opening& from, bool followLink, bool modifications,
+                     Identity& identity, UniqueFd& directory) const;
   void Adopt(int descriptor, const Identity& identity, const Owners& owners);
   void Disown(int descriptor, std::int64_t id);
   void DetachSubtree(std::int64_t id, const std::string& prefix);

@@ -8,8 +8,8 @@
 #include <sys/stat.h>
 
 #include <cerrno>
+#include <charconv>
 #include <cstring>
-#include <memory>
 #include <system_error>
 
 namespace vexil {
@@ -21,6 +21,8 @@ constexpr std::uint32_t kEntryEvents = IN_CREATE | IN_DELETE | IN_MOVED_FROM | I
 // report one ordinary save several times, the first of them before the content is all there.
 constexpr std::uint32_t kContentEvents = IN_CLOSE_WRITE;
 constexpr std::uint32_t kSelfEvents = IN_DELETE_SELF | IN_MOVE_SELF | IN_IGNORED | IN_UNMOUNT;
+// Ancestors held open while a new subtree is walked, each one descriptor.
+constexpr int kHeldLevels = 32;
 
 using Event = InotifyTree::Event;
 
@@ -49,25 +51,27 @@ struct Entry {
   bool isDirectory;
 };
 
-// Read whole, so that the directory is closed again before its subdirectories are opened.
+// Read whole before any subdirectory is walked, which may close the directory first.
+// The entries come straight from getdents64 on the descriptor we hold: a directory stream
+// would cost a dup(), an fstat() and an fcntl() more per directory, which a tree of tens of
+// thousands of directories feels at start-up.
 std::vector<Entry> ListDirectory(int directory) {
   std::vector<Entry> entries;
-  const int own = dup(directory);  // the stream takes this one over
-  if (own < 0) return entries;
-  std::unique_ptr<DIR, int (*)(DIR*)> stream(fdopendir(own), &closedir);
-  if (!stream) {
-    close(own);
-    return entries;
+  alignas(dirent64) char buffer[32768];
+  for (;;) {
+    const ssize_t got = getdents64(directory, buffer, sizeof buffer);
+    if (got <= 0) return entries;
+    for (ssize_t offset = 0; offset < got;) {
+      const auto* entry = reinterpret_cast<const dirent64*>(buffer + offset);
+      offset += entry->d_reclen;
+      if (std::strcmp(entry->d_name, ".") == 0 || std::strcmp(entry->d_name, "..") == 0) continue;
+      bool isDirectory = entry->d_type == DT_DIR;
+      struct stat status;
+      if (entry->d_type == DT_UNKNOWN)
+        isDirectory = fstatat(directory, entry->d_name, &status, AT_SYMLINK_NOFOLLOW) == 0 && S_ISDIR(status.st_mode);
+      entries.push_back({entry->d_name, isDirectory});
+    }
   }
-  while (const dirent* entry = readdir(stream.get())) {
-    if (std::strcmp(entry->d_name, ".") == 0 || std::strcmp(entry->d_name, "..") == 0) continue;
-    bool isDirectory = entry->d_type == DT_DIR;
-    struct stat status;
-    if (entry->d_type == DT_UNKNOWN)
-      isDirectory = fstatat(directory, entry->d_name, &status, AT_SYMLINK_NOFOLLOW) == 0 && S_ISDIR(status.st_mode);
-    entries.push_back({entry->d_name, isDirectory});
-  }
-  return entries;
 }
 
 void ParseEvents(const char* buffer, std::size_t length, std::vector<Event>& events) {
@@ -112,15 +116,18 @@ int InotifyTree::AddRoot(const std::string& root, std::int64_t id, const WatchOp
                          ReadOutcome& outcome) {
   Identity identity;
   UniqueFd directory;
-  const int descriptor = WatchDirectory(root, true, options.modifications, identity, directory);
+  const int descriptor = WatchDirectory(root, kByPath, true, options.modifications, identity, directory);
   if (descriptor < 0) return errno;
   projects_[id] = {root, options, {}};
   const Owners owners{{id, ""}};
   Adopt(descriptor, identity, owners);
   if (!options.recursive) return 0;
   // What exists already is not a change; only its directories need watching.
-  for (const Entry& entry : ListDirectory(directory.Get()))
-    if (entry.isDirectory) AddSubtree(JoinPath(root, entry.name), {{id, entry.name + "/"}}, outcome, false);
+  for (const Entry& entry : ListDirectory(directory.Get())) {
+    if (!entry.isDirectory) continue;
+    AddSubtree(JoinPath(root, entry.name), {{id, entry.name + "/"}}, outcome, false,
+               {directory.Get(), entry.name.c_str(), 1});
+  }
   return 0;
 }
 
@@ -272,12 +279,12 @@ void InotifyTree::RootGone(std::int64_t id, ReadOutcome& outcome) {
 }
 
 void InotifyTree::AddSubtree(const std::string& path, const Owners& owners, ReadOutcome& outcome,
-                             bool reportEntries) {
+                             bool reportEntries, const Opening& from) {
   bool modifications = false;
   for (const auto& owner : owners) modifications = modifications || projects_.at(owner.first).options.modifications;
   Identity identity;
   UniqueFd directory;
-  const int descriptor = WatchDirectory(path, false, modifications, identity, directory);
+  const int descriptor = WatchDirectory(path, from, false, modifications, identity, directory);
   if (descriptor < 0) {
     // Gone, replaced or renamed before we got to it: its parent's events tell the rest.
     if (errno == ENOENT || errno == ENOTDIR || errno == ELOOP) return;
@@ -289,29 +296,40 @@ void InotifyTree::AddSubtree(const std::string& path, const Owners& owners, Read
   }
   Adopt(descriptor, identity, owners);
   const std::vector<Entry> entries = ListDirectory(directory.Get());
-  directory.Reset();  // a deep tree must not hold one open directory per level
+  // Subdirectories are opened relative to this one while it is held open, a lookup of one
+  // name instead of a whole path; a deep tree must not hold one open directory per level,
+  // so below kHeldLevels they are opened by path.
+  const int heldLevels = from.heldLevels + 1;
+  if (heldLevels > kHeldLevels) directory.Reset();
   for (const Entry& entry : entries) {
-    Owners below;
     for (const auto& [id, prefix] : owners) {
       if (reportEntries) Report(outcome, id, prefix + entry.name, entry.isDirectory, kActionAdded);
-      below.emplace(id, prefix + entry.name + "/");
     }
-    if (entry.isDirectory) AddSubtree(JoinPath(path, entry.name), below, outcome, reportEntries);
+    if (!entry.isDirectory) continue;
+    Owners below;
+    for (const auto& [id, prefix] : owners) below.emplace(id, prefix + entry.name + "/");
+    const Opening opening = directory.Valid() ? Opening{directory.Get(), entry.name.c_str(), heldLevels} : kByPath;
+    AddSubtree(JoinPath(path, entry.name), below, outcome, reportEntries, opening);
   }
 }
 
-int InotifyTree::WatchDirectory(const std::string& path, bool followLink, bool modifications, Identity& identity,
-                                UniqueFd& directory) const {
+int InotifyTree::WatchDirectory(const std::string& path, const Opening& from, bool followLink, bool modifications,
+                                Identity& identity, UniqueFd& directory) const {
   // Below the root a symbolic link is an entry of its own, never a directory to descend into.
-  directory = UniqueFd(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC | (followLink ? 0 : O_NOFOLLOW)));
+  const int flags = O_RDONLY | O_DIRECTORY | O_CLOEXEC | (followLink ? 0 : O_NOFOLLOW);
+  directory = UniqueFd(from.parent >= 0 ? openat(from.parent, from.name, flags) : open(path.c_str(), flags));
   if (!directory.Valid()) return -1;
   struct stat status;
   if (fstat(directory.Get(), &status) != 0) return -1;
   identity = {status.st_dev, status.st_ino};
   // Another watch may share the directory and want other events: masks only ever grow.
   const std::uint32_t mask = kEntryEvents | IN_MASK_ADD | (modifications ? kContentEvents : 0);
-  const std::string opened = "/proc/self/fd/" + std::to_string(directory.Get());
-  const int descriptor = inotify_add_watch(fd_, opened.c_str(), mask);
+  // Formatted by hand: this runs once for every directory of the tree.
+  static constexpr char kOpenedPrefix[] = "/proc/self/fd/";
+  char opened[sizeof kOpenedPrefix + 12];
+  std::memcpy(opened, kOpenedPrefix, sizeof kOpenedPrefix - 1);
+  *std::to_chars(opened + sizeof kOpenedPrefix - 1, opened + sizeof opened - 1, directory.Get()).ptr = '\0';
+  const int descriptor = inotify_add_watch(fd_, opened, mask);
   if (descriptor >= 0 || errno != ENOENT) return descriptor;
   // Without /proc, by name, which may belong to another directory by now.
   return inotify_add_watch(fd_, path.c_str(), mask | (followLink ? 0 : IN_DONT_FOLLOW));

@@ -55,8 +55,9 @@ struct Published {
 };
 
 TEST(ChangeMonitor, DirectoriesPublishedInABurstAreAllWatched) {
-  // Built in place, or built under a temporary name and renamed into place (git, package
-  // managers and editors publish so), the temporary name unique or the same every time.
+  // Built in place (also deeper than the walk holds directories open), or built under a
+  // temporary name and renamed into place (git, package managers and editors publish so),
+  // the temporary name unique or the same every time.
   const std::vector<std::pair<const char*, std::function<Published(const TempDir&, const std::string&)>>>
       patterns = {
           {"nested",
@@ -74,6 +75,16 @@ TEST(ChangeMonitor, DirectoriesPublishedInABurstAreAllWatched) {
              fs::rename(root / (".tmp" + n), root / ("p" + n));
              return Published{{{".tmp" + n + "/", kOld}, {"p" + n + "/", kNew}}, "p" + n + "/"};
            }},
+          {"deeper than the walk holds directories open",
+           [](const TempDir& root, const std::string& n) {
+             Published published{{{"t" + n + "/", kAdded}}, "t" + n + "/"};
+             for (int level = 0; level < 40; ++level) {
+               published.directory += "d/";
+               published.expected.push_back({published.directory, kAdded});
+             }
+             fs::create_directories(root / published.directory);
+             return published;
+           }},
           {"renamed from one reused name",
            [](const TempDir& root, const std::string& n) {
              fs::create_directory(root / ".tmp");
@@ -82,14 +93,20 @@ TEST(ChangeMonitor, DirectoriesPublishedInABurstAreAllWatched) {
              return Published{{{".tmp/", kOld}, {"p" + n + "/", kNew}}, "p" + n + "/"};
            }},
       };
+  // And a tree as deep that exists before the watch starts.
+  std::string existing = "existing/";
+  for (int level = 0; level < 40; ++level) existing += "d/";
   for (const auto& [pattern, publish] : patterns) {
     TempDir root;
+    fs::create_directories(root / existing);
     Probe probe;
     ChangeMonitor monitor(probe.Handlers());
     ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 1));
     std::vector<Published> published;
     for (int i = 0; i < 30; ++i) published.push_back(publish(root, std::to_string(i)));
     // Whenever the monitor got to them, each is watched under its final name.
+    Touch(root / (existing + "later"));
+    EXPECT_TRUE(probe.WaitFor(1, {existing + "later", kAdded})) << pattern;
     for (const Published& one : published) Touch(root / (one.directory + "later"));
     for (const Published& one : published) {
       EXPECT_TRUE(probe.WaitForAll(1, one.expected)) << pattern << ": " << one.directory;
