@@ -46,9 +46,11 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   EXPECT_EQ(cli::Describe(options.actions[5]), "capabilities");
   EXPECT_EQ(options.actions[6].text + " " + options.actions[6].params, R"(a/b {"x": [1]})");
   EXPECT_EQ(cli::Describe(options.actions[7]) + " " + options.actions[7].params, "notify c/d null");
-  cli::LspOptions environment = ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--", "s", "--capabilities"});
+  cli::LspOptions environment =
+      ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--apply", "--", "s", "--capabilities"});
   EXPECT_EQ(environment.session.environment, (std::vector<std::pair<std::string, std::string>>{{"A", "b=c"}, {"EMPTY", ""}}));
   EXPECT_TRUE(environment.session.progress);
+  EXPECT_TRUE(environment.session.apply);
 }
 
 TEST(LspOptions, BadUsageIsRefusedWithAReason) {

@@ -47,6 +47,12 @@ Result Shell(const std::string& script) {
 
 Result Vexil(const std::string& arguments) { return Shell("\"$VEXIL\" " + arguments); }
 
+// A protocol range as JSON text.
+std::string Range(int line, int character, int endLine, int endCharacter) {
+  return R"({"start":{"line":)" + std::to_string(line) + R"(,"character":)" + std::to_string(character) +
+         R"(},"end":{"line":)" + std::to_string(endLine) + R"(,"character":)" + std::to_string(endCharacter) + "}}";
+}
+
 TEST(CommandLine, LspPrintsLocationsWithTheirSourceAndCompletionsOnePerLine) {
   Result run = Vexil("lsp -- clangd --log=error --definition main.cpp:15:18 --completion main.cpp:13:13");
   EXPECT_EQ(run.status, 0) << run.err;
@@ -87,6 +93,15 @@ TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
             std::string::npos)
       << rename.out;
   EXPECT_NE(rename.err.find("vexil: note: clangd proposed edits only in files it has opened"), std::string::npos);
+  // --apply writes exactly the edits shown, and the server is told of the new text.
+  Result applied = Shell("cp main.cpp shapes.h compile_flags.txt \"$SCRATCH\"; cd \"$SCRATCH\"; \"$VEXIL\" lsp --apply "
+                         "-- clangd --log=error --rename main.cpp:15:18:Limit --diagnostics main.cpp && "
+                         "sed s/Limit/Clamp/ main.cpp | cmp - \"$OLDPWD/main.cpp\" && cmp shapes.h \"$OLDPWD/shapes.h\"");
+  EXPECT_EQ(applied.status, 0) << applied.out << applied.err;
+  EXPECT_NE(applied.out.find("+  return shapes::Limit(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n }\n  written: main.cpp\n"
+                             "diagnostics main.cpp\nmain.cpp:15:18: error: No member named 'Limit' in namespace 'shapes'"),
+            std::string::npos)
+      << applied.out;
 }
 
 // Neither server offers pulled diagnostics, so the command waits for the publication; once
@@ -113,6 +128,8 @@ TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormatWithByteColumns) {
 TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
   const vexil_test::TempDirectory directory;
   { std::ofstream(directory / "latin.cpp") << "int caf\xE9 = 1;\n"; }
+  const std::string fine = directory / "fine.cpp";
+  { std::ofstream(fine) << "int x = 1;\n"; }
   struct Case {
     std::string arguments;
     int status;
@@ -131,6 +148,10 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
       {"lsp -- clangd --open " + (directory / "latin.cpp"), 1, "vexil: " + (directory / "latin.cpp") +
        ": not UTF-8 text (line 1, column 8)"},
       {"lsp -- clangd --hover main.cpp:0:1", 2, "vexil: LINE must be a positive number, not '0'. Try 'vexil lsp --help'\n"},
+      // Overlapping edits: nothing is written.
+      {"lsp --apply -- \"$FAKE\" 'result=textDocument/formatting:[{\"range\":" + Range(0, 0, 0, 3) +
+           ",\"newText\":\"a\"},{\"range\":" + Range(0, 2, 0, 4) + ",\"newText\":\"b\"}]' --format " + fine, 1,
+       "vexil: format " + fine + ": nothing written: Cannot edit " + fine + ": Overlapping edits at 0:0-0:3 and 0:2-0:4\n"},
       {"lsp --json=yes -- clangd --open main.cpp", 2, "vexil: option '--json' takes no value. Try 'vexil lsp --help'\n"},
       {"task --run x /tmp", 2, "vexil: task needs --ext. Try 'vexil task --help'\n"},
       {"frobnicate", 2, "vexil: unknown command 'frobnicate'. Try 'vexil --help'\n"},
@@ -142,6 +163,7 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
     EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << test.arguments << "\n" << run.err;
     EXPECT_LT(run.seconds, 30) << test.arguments;
   }
+  EXPECT_EQ(Slurp(fine), "int x = 1;\n");
   Result json = Vexil("lsp --json -- vexil-no-such-server --hover main.cpp:1:1");
   EXPECT_EQ(json.out.rfind(R"({"action":"start","failed":true,"error":"vexil-no-such-server did not start: )", 0), 0u)
       << json.out;

@@ -49,7 +49,7 @@ template <typename P>
 P Positioned(Session& session, const Action& action) {
   P params;
   params.textDocument.uri = session.Document(action.path);
-  params.position = ProtocolPosition(action.path, action.line, action.column);
+  params.position = ProtocolPosition(TextOf(action.path), action.line, action.column);
   return params;
 }
 
@@ -65,14 +65,6 @@ std::vector<LSP::Location> Locations(Session& session, const Action& action) {
   }
 }
 
-std::vector<FileEdits> Edits(const LSP::WorkspaceEdit& edit) {
-  std::vector<FileEdits> files;
-  for (const LSP::TextDocumentEdit& document : edit.documentChanges) {
-    files.push_back({UriToFile(document.textDocument.uri.c_str()), document.edits});
-  }
-  return files;
-}
-
 std::vector<FileEdits> Formatting(Session& session, const Action& action) {
   std::string uri = session.Document(action.path);
   std::vector<LSP::TextEdit> edits;
@@ -83,8 +75,8 @@ std::vector<FileEdits> Formatting(Session& session, const Action& action) {
   } else {
     LSP::DocumentRangeFormattingParams params;
     params.textDocument.uri = uri;
-    params.range = LSP::Range(ProtocolPosition(action.path, action.line, action.column),
-                              ProtocolPosition(action.path, action.endLine, action.endColumn));
+    params.range = LSP::Range(ProtocolPosition(TextOf(action.path), action.line, action.column),
+                              ProtocolPosition(TextOf(action.path), action.endLine, action.endColumn));
     edits = session.Server().TextDocument_RangeFormatting(&params);
   }
   return {{action.path, edits}};
@@ -136,7 +128,7 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
     case ActionKind::Rename: {
       auto params = Positioned<LSP::RenameParams>(session, action);
       params.newName = action.text;
-      outcome.edits = Edits(server.TextDocument_Rename(&params));
+      outcome.edits = FilesOf(server.TextDocument_Rename(&params));
       break;
     }
     default: outcome.locations = Locations(session, action); break;
@@ -190,11 +182,23 @@ std::string MethodOf(const Action& action) {
                                                                                 : InfoOf(action.kind).method;
 }
 
+bool Writes(ActionKind kind) {
+  return kind == ActionKind::Format || kind == ActionKind::RangeFormat || kind == ActionKind::Rename;
+}
+
 Outcome Perform(Session& session, const Action& action) {
   Outcome outcome;
   session.Mark();
   Ask(session, action, outcome);
   outcome.failed = session.Failed(MethodOf(action), outcome.why);
+  if (!outcome.failed && session.Applies() && Writes(action.kind)) {
+    outcome.failed = !WriteEdits(outcome.edits, outcome.why);
+    if (outcome.failed) outcome.why = "nothing written: " + outcome.why;
+    outcome.applied = !outcome.failed;
+  }
+  bool written = false;
+  outcome.requested = TakeRequestedEdits(written);
+  outcome.applied = outcome.applied || written;
   return outcome;
 }
 

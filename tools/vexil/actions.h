@@ -9,12 +9,14 @@
 // - readable output starts with the action as Describe() names it, then its answer indented,
 //   "(none)" for an empty one; --json writes one object per line (see render.h);
 // - a failure is one reason in Outcome::why: printed, and the exit status becomes 1; a
-//   method the server does not offer reads "SERVER does not support METHOD".
+//   method the server does not offer reads "SERVER does not support METHOD";
+// - edits are shown as a diff and written only with --apply, all files or none.
 #pragma once
 
 #include <string>
 #include <vector>
 
+#include "apply.h"
 #include "session.h"
 
 namespace cli {
@@ -50,12 +52,6 @@ struct Action {
   std::string params;  // a request's params as JSON text
 };
 
-// The edits the server proposes for one file.
-struct FileEdits {
-  std::string path;
-  std::vector<LSP::TextEdit> edits;
-};
-
 struct Outcome {
   std::vector<LSP::Location> locations;
   LSP::Hover hover;
@@ -66,6 +62,8 @@ struct Outcome {
   std::vector<LSP::Diagnostic> diagnostics;
   LSP::ServerCapabilities capabilities;
   std::string json;  // the capabilities, or a request's result, as JSON text
+  std::vector<FileEdits> requested;  // edits the server asked for meanwhile ("workspace/applyEdit")
+  bool applied = false;  // whether the edits, or those asked for, were written to the files
   bool failed = false;
   std::string why;  // when failed
 };
@@ -80,7 +78,11 @@ std::string MethodOf(const Action& action);
 const char* OperandForm(Operand operand);
 // The action as a person would name it: "hover main.cpp:15:18".
 std::string Describe(const Action& action);
+// Whether --apply writes the edits the action proposes.
+bool Writes(ActionKind kind);
 
+// Performs the action. When the session applies edits, those it proposes are written to
+// the files (see apply.h); once its answer has been shown, AfterWriting tells the server.
 Outcome Perform(Session& session, const Action& action);
 
 }  // namespace cli

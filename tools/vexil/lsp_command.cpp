@@ -49,6 +49,8 @@ std::string LspHelp() {
       "  --trace=LEVEL     show the library's trace on stderr: off, messages or verbose\n"
       "  --env=NAME=VALUE  set a variable of the server's environment (repeatable)\n"
       "  --progress        announce work-done progress, and show the server's on stderr\n"
+      "  --apply           write the edits of renames and formatting to the files, and those\n"
+      "                    the server asks for (without it they are shown as a diff only)\n"
       "  --help            show this help\n"
       "\n"
       "Actions (lines and columns count from 1, columns in bytes):\n";
@@ -97,6 +99,10 @@ int RunLsp(const Arguments& arguments) {
       std::cerr << "vexil: " << Describe(action) << ": " << outcome.why << "\n";
     } else if (action.kind == ActionKind::Rename && !outcome.edits.empty()) {
       NoteOpenOnly(session, outcome);
+    }
+    if (outcome.applied) {
+      AfterWriting(session, outcome.edits);
+      AfterWriting(session, outcome.requested);
     }
   }
   if (Interrupted()) return 128 + Interrupted();

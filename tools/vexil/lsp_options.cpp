@@ -108,6 +108,7 @@ void ReadOptions(OptionReader& reader, LspOptions& options) {
     else if (reader.Is("--json")) reader.Flag(), options.json = true;
     else if (reader.Is("--env")) options.session.environment.push_back(Variable(reader.Value()));
     else if (reader.Is("--progress")) reader.Flag(), options.session.progress = true;
+    else if (reader.Is("--apply")) reader.Flag(), options.session.apply = true;
     else if (ActionAt(reader)) throw UsageError(reader.Current() + " is an action: it follows '-- SERVER [ARG]...'");
     else reader.Unknown();
   }

@@ -78,12 +78,26 @@ void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files) {
   out << (diff.empty() ? "  (no changes)\n" : diff);
 }
 
+// The files the edits went to, each named once.
+void PrintWritten(std::ostream& out, const Outcome& outcome) {
+  std::vector<std::string> paths;
+  for (const std::vector<FileEdits>* files : {&outcome.edits, &outcome.requested}) {
+    for (const FileEdits& file : *files) {
+      std::string path = Relative(file.path);
+      if (std::find(paths.begin(), paths.end(), path) == paths.end()) paths.push_back(path);
+    }
+  }
+  out << "  written:";
+  for (const std::string& path : paths) out << " " << path;
+  out << "\n";
+}
+
 }  // namespace
 
 std::string Where(const LSP::Location& location) {
   std::string path = UriToFile(location.uri.c_str());
   return Relative(path) + ":" + std::to_string(location.range.start.line + 1) + ":" +
-         std::to_string(ByteColumn(path, location.range.start));
+         std::to_string(ByteColumn(TextOf(path), location.range.start));
 }
 
 const char* SymbolKindName(int kind) {
@@ -115,7 +129,7 @@ std::string HoverText(const LSP::Hover& hover) {
 }
 
 std::string EditsAsDiff(const FileEdits& file) {
-  const std::string before = ReadText(file.path);
+  const std::string& before = TextOf(file.path);
   std::string after = before;
   std::string error;
   if (!LSP::ApplyTextEdits(after, file.edits, error)) return "  " + Relative(file.path) + ": " + error + "\n";
@@ -150,6 +164,11 @@ void PrintReadable(std::ostream& out, const Action& action, const Outcome& outco
     case ActionKind::Request: PrintRequestResult(out, outcome); break;
     default: PrintLocations(out, outcome.locations); break;
   }
+  if (!outcome.requested.empty()) {
+    out << "  the server asked for edits:\n";
+    PrintEdits(out, outcome.requested);
+  }
+  if (outcome.applied) PrintWritten(out, outcome);
 }
 
 }  // namespace cli

@@ -12,7 +12,7 @@ namespace {
 void Point(LSP::xWriter& writer, const char* line, const char* column, const std::string& path,
            const LSP::Position& position) {
   writer.Int(line, position.line + 1);
-  writer.Int(column, ByteColumn(path, position));
+  writer.Int(column, ByteColumn(TextOf(path), position));
 }
 
 // The path and the range in it.
@@ -46,8 +46,8 @@ void Symbols(LSP::xWriter& writer, const char* name, const std::vector<LSP::Symb
   writer.EndArray();
 }
 
-void Edits(LSP::xWriter& writer, const std::vector<FileEdits>& files) {
-  writer.StartArray("result");
+void Edits(LSP::xWriter& writer, const char* name, const std::vector<FileEdits>& files) {
+  writer.StartArray(name);
   for (const FileEdits& file : files) {
     for (const LSP::TextEdit& edit : file.edits) {
       writer.StartObject();
@@ -117,7 +117,7 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
     case ActionKind::WorkspaceSymbols: Symbols(writer, "result", outcome.symbols); break;
     case ActionKind::Format:
     case ActionKind::RangeFormat:
-    case ActionKind::Rename: Edits(writer, outcome.edits); break;
+    case ActionKind::Rename: Edits(writer, "result", outcome.edits); break;
     case ActionKind::Diagnostics: Diagnostics(writer, action.path, outcome.diagnostics); break;
     case ActionKind::Capabilities:
     case ActionKind::Request: RawResult(writer, outcome.json); break;
@@ -141,6 +141,8 @@ void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome) 
   writer.Bool("failed", outcome.failed);
   if (outcome.failed) writer.RequiredString("error", outcome.why);
   else Result(writer, action, outcome);
+  if (!outcome.requested.empty()) Edits(writer, "requested", outcome.requested);
+  if (outcome.applied) writer.Bool("applied", true);
   writer.EndObject();
   out << writer.GetString() << "\n";
 }

@@ -21,6 +21,7 @@ struct SessionOptions {
   std::string language;  // the language id of every document, instead of the file's own
   std::vector<std::pair<std::string, std::string>> environment;  // the server's, over ours
   bool progress = false;  // announce work-done progress, and show it
+  bool apply = false;     // write proposed edits, and those the server asks for, to the files
 };
 
 class Session {
@@ -38,6 +39,8 @@ class Session {
   xLanguageServer& Server() { return *server_; }
   // The server's program as people name it: "clangd".
   std::string Program() const;
+  // Whether edits are written to the files (--apply), or only shown.
+  bool Applies() const { return options_.apply; }
 
   // The URI of the absolute `path`, opened first (didOpen with its text) unless it is open.
   std::string Document(const std::string& path);
