@@ -4,11 +4,14 @@
 
 #include <algorithm>
 
+#include "vexil/protocol/feature_capabilities.h"
+
 namespace LSP {
 namespace {
 
 constexpr char kProgressCreate[] = "window/workDoneProgress/create";
 constexpr char kConfiguration[] = "workspace/configuration";
+constexpr char kApplyEdit[] = "workspace/applyEdit";
 
 struct Feature {
   const char* name;
@@ -27,6 +30,14 @@ const Feature kFeatures[] = {
      [](EnabledFeatures& enabled) {
        enabled.capabilities.push_back(R"({"workspace":{"configuration":true}})");
        enabled.hostRequests.push_back(kConfiguration);
+     }},
+    // The requests IDEs use beyond the classic ones (code action literals, prepared
+    // renames, semantic tokens, will-save) and edits the server asks the host to apply.
+    {"features",
+     [](EnabledFeatures& enabled) {
+       FeatureClientCapabilities capabilities;
+       enabled.capabilities.push_back(ToJsonText(capabilities));
+       enabled.hostRequests.push_back(kApplyEdit);
      }},
     // The host answers what the server asks (applyEdit, showMessageRequest...).
     {"messages",

@@ -63,6 +63,21 @@ class LanguageServer final : public xLanguageServer {
   }
   void Cancel() override { server.CancelWait(); }
   bool SetEnvironment(const char* name, const char* value) override { return server.Environment(name, value); }
+  std::vector<CodeAction> TextDocument_CodeAction(CodeActionParams* params) override;
+  std::string Workspace_ExecuteCommand(ExecuteCommandParams* params) override;
+  std::vector<DocumentHighlight> TextDocument_DocumentHighlight(TextDocumentPositionParams* params) override;
+  std::vector<FoldingRange> TextDocument_FoldingRange(FoldingRangeParams* params) override;
+  std::vector<SelectionRange> TextDocument_SelectionRange(SelectionRangeParams* params) override;
+  SemanticTokens TextDocument_SemanticTokensFull(SemanticTokensParams* params) override;
+  std::vector<InlayHint> TextDocument_InlayHint(InlayHintParams* params) override;
+  CompletionItem CompletionItem_Resolve(CompletionItem* item) override;
+  PrepareRenameResult TextDocument_PrepareRename(TextDocumentPositionParams* params) override;
+  std::vector<CallHierarchyItem> TextDocument_PrepareCallHierarchy(TextDocumentPositionParams* params) override;
+  std::vector<CallHierarchyIncomingCall> CallHierarchy_IncomingCalls(CallHierarchyItem* item) override;
+  std::vector<CallHierarchyOutgoingCall> CallHierarchy_OutgoingCalls(CallHierarchyItem* item) override;
+  void Workspace_DidChangeConfiguration(DidChangeConfigurationParams* params) override;
+  void Workspace_DidChangeWorkspaceFolders(DidChangeWorkspaceFoldersParams* params) override;
+  void TextDocument_WillSave(WillSaveTextDocumentParams* params) override;
 
  protected:
   // Sends "initialized" once the handshake succeeded and the server still runs.
@@ -80,6 +95,9 @@ class LanguageServer final : public xLanguageServer {
   template <typename Holder>
   Holder Ask(const char* method, Params* params, Holder holder = Holder());
   bool Send(const char* method, Params* params);
+  // Whether `params` can be written; false, with the error state set and traced, when
+  // JSON text the host gave in them is not JSON.
+  bool Writable(Params& params);
   // Checks a method and its params given as JSON text; false, with the error state set
   // and traced, when they cannot be sent.
   bool Prepared(const char* method, const char* paramsJson, JsonParams& params);

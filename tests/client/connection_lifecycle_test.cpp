@@ -82,11 +82,20 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
     std::vector<std::pair<std::string, std::string>> changes;  // on the expected text
   };
   const std::string treeEnd = R"("diagnostic":{"dynamicRegistration":false}})";
+  const std::string features = vexil_test::ReadDataFile("feature_capabilities.json");
   const Row rows[] = {
       {{}, {}},
       {{"messages", "unknown"}, {}},
       {{"progress"}, {{treeEnd + "}", treeEnd + R"(,"window":{"workDoneProgress":true}})"}}},
       {{"configuration", "configuration"}, {{R"("configuration":false)", R"("configuration":true)"}}},
+      {{"features"},
+       {{R"("applyEdit":false,"workspaceEdit":{"documentChanges":false)", R"("applyEdit":true,"workspaceEdit":{"documentChanges":true)"},
+        {R"("willSave":false)", R"("willSave":true)"},
+        {R"("codeAction":{"dynamicRegistration":false})",
+         R"("codeAction":{"dynamicRegistration":false,)" + features.substr(features.find(R"("codeActionLiteralSupport")"),
+                                                                           features.find(R"(,"rename")") - features.find(R"("codeActionLiteralSupport")"))},
+        {R"("rename":{"dynamicRegistration":false})", R"("rename":{"dynamicRegistration":false,"prepareSupport":true})"},
+        {treeEnd + "}", treeEnd.substr(0, treeEnd.size() - 1) + features.substr(features.find(R"(,"semanticTokens")"))}}},
   };
   for (const Row& row : rows) {
     xLanguageServer* server = Connection();
@@ -197,6 +206,9 @@ TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAns
        R"({"jsonrpc":"2.0","id":0,"result":[{"tabSize":4}]})"},
       {"not opted in: the library answers", {}, {}, "[1]", ask(R"({"ask":["workspace/configuration"]})"), {},
        R"({"jsonrpc":"2.0","id":0,"result":[null,null]})"},
+      {"an edit to apply, routed by its feature", {"features"}, {}, R"({"applied": true})",
+       ask(R"({"ask":["workspace/applyEdit"]})"), {"workspace/applyEdit 0 " + items},
+       R"({"jsonrpc":"2.0","id":0,"result":{"applied":true}})"},
       {"any other request, declined by the host", {"messages"}, {}, "error", ask(R"({"ask":["workspace/applyEdit"]})"),
        {"workspace/applyEdit 0 " + items},
        R"({"jsonrpc":"2.0","id":0,"error":{"code":-32001,"message":"declined"}})"},
