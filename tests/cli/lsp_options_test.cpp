@@ -21,13 +21,14 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
       {"--trace", "verbose", "--timeout=900", "--json", "--root=src", "--", "clangd", "--log=error", "--pretty",
        "--hover", "c:/odd:name.cpp:15:18", "--range-format=a.cpp:1:2:3:4", "--rename", "a.cpp:5:6:Limit",
        "--workspace-symbols", "Rect", "--close", "a.cc", "--capabilities", "--request", "a/b", R"({"x": [1]})",
-       "--notify=c/d", "null"});
+       "--notify=c/d", "null", "--code-actions", "odd:name.cpp:3:4", "--code-actions=c:/x.c:3:4:5:6", "--execute", "cmd",
+       "[1]"});
   EXPECT_EQ(options.session.trace, LSP::TraceLevel::Verbose);
   EXPECT_EQ(options.session.timeout, 900);
   EXPECT_TRUE(options.json);
   EXPECT_EQ(options.session.program, "clangd");
   EXPECT_EQ(options.session.arguments, (Args{"--log=error", "--pretty"}));
-  ASSERT_EQ(options.actions.size(), 8u);
+  ASSERT_EQ(options.actions.size(), 11u);
   const cli::Action& hover = options.actions[0];
   EXPECT_EQ(hover.kind, ActionKind::Hover);
   EXPECT_EQ(hover.file, "c:/odd:name.cpp");
@@ -46,11 +47,16 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   EXPECT_EQ(cli::Describe(options.actions[5]), "capabilities");
   EXPECT_EQ(options.actions[6].text + " " + options.actions[6].params, R"(a/b {"x": [1]})");
   EXPECT_EQ(cli::Describe(options.actions[7]) + " " + options.actions[7].params, "notify c/d null");
+  // A position, or a range when four numbers end the operand.
+  EXPECT_EQ(cli::Describe(options.actions[8]), "code-actions odd:name.cpp:3:4");
+  EXPECT_EQ(cli::Describe(options.actions[9]), "code-actions c:/x.c:3:4:5:6");
+  EXPECT_EQ(cli::Describe(options.actions[10]) + " " + options.actions[10].params, "execute cmd [1]");
   cli::LspOptions environment =
-      ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--apply", "--", "s", "--capabilities"});
+      ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--apply=2", "--", "s", "--capabilities"});
   EXPECT_EQ(environment.session.environment, (std::vector<std::pair<std::string, std::string>>{{"A", "b=c"}, {"EMPTY", ""}}));
   EXPECT_TRUE(environment.session.progress);
   EXPECT_TRUE(environment.session.apply);
+  EXPECT_EQ(environment.session.choice, "2");
 }
 
 TEST(LspOptions, BadUsageIsRefusedWithAReason) {
@@ -70,6 +76,8 @@ TEST(LspOptions, BadUsageIsRefusedWithAReason) {
       {"--", "s", "--request", "a/b"},                      // no params
       {"--", "s", "--request", "a/b", "{oops"},             // not JSON
       {"--", "s", "--notify", "a/b", "[1]"},                // not an object
+      {"--", "s", "--execute", "cmd", "{}"},                // not an array
+      {"--", "s", "--execute", "cmd"},                      // no arguments
       {"--", "s", "--capabilities=yes"},                    // takes no operand
       {"--env", "NOVALUE", "--", "s", "--capabilities"},
       {"--env", "=x", "--", "s", "--capabilities"},

@@ -70,10 +70,26 @@ TEST(CommandLine, LspPrintsLocationsWithTheirSourceAndCompletionsOnePerLine) {
   EXPECT_NE(beyond.out.find("\n  textDocumentSync: incremental changes, open and close, save\n"), std::string::npos);
   EXPECT_NE(beyond.out.find("request textDocument/documentHighlight\n  [{"), std::string::npos) << beyond.out;
   EXPECT_NE(beyond.out.find(R"("start":{"character":17,"line":14}})"), std::string::npos) << beyond.out;
+  // The newer requests, each answer in its place with byte columns.
+  Result features = Vexil("lsp -- clangd --log=error --highlight main.cpp:11:22 --prepare-rename main.cpp:15:18 "
+                          "--selection-range main.cpp:15:18 --semantic-tokens shapes.h --call-hierarchy shapes.cpp:17:5");
+  EXPECT_EQ(features.status, 0) << features.err;
+  for (const char* answer :
+       {"highlight main.cpp:11:22\n  main.cpp:11:21: text: shapes::Rectangle rectangle(3, 4);\n  main.cpp:12:10: text: ",
+        "prepare-rename main.cpp:15:18\n  15:18-15:23: Clamp\n", "selection-range main.cpp:15:18\n  15:10-15:23: shapes::Clamp\n",
+        "\n  28:5 function [declaration, globalScope]: Clamp\n",
+        "call-hierarchy shapes.cpp:17:5\n  function Clamp  shapes.cpp:17:5\n    called from:\n"
+        "      method Scale  shapes.cpp:13:12  (2 calls)\n"}) {
+    EXPECT_NE(features.out.find(answer), std::string::npos) << answer << "\n" << features.out;
+  }
   // Files are found below --root, whatever the current directory.
-  Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22");
+  Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22 --folding geometry.py --highlight main.py:12:7");
   EXPECT_EQ(python.status, 0) << python.err;
   EXPECT_EQ(python.out.rfind("hover main.py:2:22\n", 0), 0u) << python.out;
+  EXPECT_NE(python.out.find("folding geometry.py\n  4-6: def clamp(value, low, high):\n  9-23: class Rectangle:\n"),
+            std::string::npos) << python.out;
+  EXPECT_NE(python.out.find("/python/main.py:2:33: write: from geometry import Rectangle, clamp\n"), std::string::npos);
+  EXPECT_NE(python.out.find("/python/main.py:12:7: read: print(clamp("), std::string::npos) << python.out;
 }
 
 TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
@@ -101,7 +117,35 @@ TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
   EXPECT_NE(applied.out.find("+  return shapes::Limit(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n }\n  written: main.cpp\n"
                              "diagnostics main.cpp\nmain.cpp:15:18: error: No member named 'Limit' in namespace 'shapes'"),
             std::string::npos)
-      << applied.out;
+      << applied.out;  // The preferred quick fix of a diagnostic, written; the server then finds nothing wrong.
+  Result fixed = Shell("sed s/Clamp/Clam/ main.cpp > \"$SCRATCH/main.cpp\"; cp shapes.h compile_flags.txt \"$SCRATCH\"; "
+                       "cd \"$SCRATCH\"; \"$VEXIL\" lsp --apply --json -- clangd --log=error --code-actions main.cpp:15:18 "
+                       "--diagnostics main.cpp && cmp main.cpp \"$OLDPWD/main.cpp\"");
+  EXPECT_EQ(fixed.status, 0) << fixed.out << fixed.err;
+  EXPECT_NE(fixed.out.find(R"({"title":"change 'Clam' to 'Clamp'","kind":"quickfix","preferred":true,"edits":[{"path":")"),
+            std::string::npos) << fixed.out;
+  EXPECT_NE(fixed.out.find(R"(main.cpp","line":15,"column":18,"endLine":15,"endColumn":22,"newText":"Clamp"}],"applied":true})"),
+            std::string::npos) << fixed.out;
+  EXPECT_NE(fixed.out.find(R"({"action":"diagnostics","file":"main.cpp","failed":false,"result":[]})"), std::string::npos);
+
+  // What a server asks to apply is shown, and written only with --apply; an edit that
+  // cannot be made writes nothing and fails the action.
+  const std::string edit = R"({"range":)" + Range(0, 4, 0, 5) + R"(,"newText":"y"})";
+  const std::string ask = R"('{"ask":[{"method":"workspace/applyEdit","params":{"edit":{"changes":{"'"file://$SCRATCH/a.cpp"'":[)";
+  Result asked = Shell("echo 'int x = 1;' > \"$SCRATCH/a.cpp\"; for apply in '' --apply; do \"$VEXIL\" lsp $apply -- "
+                       "\"$FAKE\" --request fake/x " + ask + edit + "]}}}}]}'; cat \"$SCRATCH/a.cpp\"; done; "
+                       "\"$VEXIL\" lsp --apply -- \"$FAKE\" --request fake/x " + ask + edit + "," + edit + "]}}}}]}'; "
+                       "status=$?; cat \"$SCRATCH/a.cpp\"; exit $status");
+  EXPECT_EQ(asked.status, 1);
+  EXPECT_NE(asked.out.find(R"("result":{"applied":false,"failureReason":"vexil lsp writes edits only with --apply"}}])"),
+            std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find("  the server asked for edits:\n--- "), std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find("-int x = 1;\n+int y = 1;\nint x = 1;\n"), std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find(R"("result":{"applied":true}}])"), std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find("  written: "), std::string::npos) << asked.out;
+  EXPECT_EQ(asked.out.substr(asked.out.size() - 22), "int y = 1;\nint y = 1;\n") << asked.out;
+  EXPECT_NE(asked.err.find("vexil: request fake/x: the server asked for edits: nothing written: Cannot edit "),
+            std::string::npos) << asked.err;
 }
 
 // Neither server offers pulled diagnostics, so the command waits for the publication; once
@@ -148,6 +192,10 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
       {"lsp -- clangd --open " + (directory / "latin.cpp"), 1, "vexil: " + (directory / "latin.cpp") +
        ": not UTF-8 text (line 1, column 8)"},
       {"lsp -- clangd --hover main.cpp:0:1", 2, "vexil: LINE must be a positive number, not '0'. Try 'vexil lsp --help'\n"},
+      {"lsp --root=../python -- pylsp --semantic-tokens main.py", 1,
+       "vexil: semantic-tokens main.py: pylsp does not support textDocument/semanticTokens/full\n"},
+      {"lsp -- clangd --execute clangd.applyFix '{}'", 2,
+       "vexil: --execute: ARGUMENTS must be a JSON array, not '{}'. Try 'vexil lsp --help'\n"},
       // Overlapping edits: nothing is written.
       {"lsp --apply -- \"$FAKE\" 'result=textDocument/formatting:[{\"range\":" + Range(0, 0, 0, 3) +
            ",\"newText\":\"a\"},{\"range\":" + Range(0, 2, 0, 4) + ",\"newText\":\"b\"}]' --format " + fine, 1,

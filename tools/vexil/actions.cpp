@@ -2,6 +2,7 @@
 // call of the connection, and the reply kept with the failure state the library reports.
 #include "actions.h"
 
+#include "actions_features.h"
 #include "columns.h"
 #include "vexil/client/uri.h"
 
@@ -32,7 +33,7 @@ const std::vector<ActionInfo> kActions = {
     {ActionKind::RangeFormat, "--range-format", Operand::Range, "textDocument/rangeFormatting", true,
      "formatting of the range, as a diff"},
     {ActionKind::Rename, "--rename", Operand::Rename, "textDocument/rename", true,
-     "the edits of a rename, as a diff (not applied)"},
+     "the edits of a rename, as a diff"},
     {ActionKind::Change, "--change", Operand::File, "textDocument/didChange", false, "send the file's current text"},
     {ActionKind::Save, "--save", Operand::File, "textDocument/didSave", false, "tell the server it was saved"},
     {ActionKind::Close, "--close", Operand::File, "textDocument/didClose", false, "close it"},
@@ -43,15 +44,24 @@ const std::vector<ActionInfo> kActions = {
     {ActionKind::Request, "--request", Operand::MethodParams, "", true,
      "any request; PARAMS a JSON object, the result printed as JSON"},
     {ActionKind::Notify, "--notify", Operand::MethodParams, "", false, "any notification"},
+    {ActionKind::CodeActions, "--code-actions", Operand::PositionOrRange, "textDocument/codeAction", true,
+     "quick fixes and refactorings there, each with its diff"},
+    {ActionKind::Highlight, "--highlight", Operand::Position, "textDocument/documentHighlight", true,
+     "the symbol's uses in the file, read or written"},
+    {ActionKind::Folding, "--folding", Operand::File, "textDocument/foldingRange", true, "the lines that fold"},
+    {ActionKind::SelectionRange, "--selection-range", Operand::Position, "textDocument/selectionRange", true,
+     "the ranges a selection grows through, innermost first"},
+    {ActionKind::SemanticTokens, "--semantic-tokens", Operand::File, "textDocument/semanticTokens/full", true,
+     "every token with its type and modifiers"},
+    {ActionKind::InlayHints, "--inlay-hints", Operand::File, "textDocument/inlayHint", true,
+     "the hints shown inside the text (types, parameter names)"},
+    {ActionKind::PrepareRename, "--prepare-rename", Operand::Position, "textDocument/prepareRename", true,
+     "whether a rename is possible there, and of what"},
+    {ActionKind::CallHierarchy, "--call-hierarchy", Operand::Position, "textDocument/prepareCallHierarchy", true,
+     "the function there, its callers and what it calls"},
+    {ActionKind::Execute, "--execute", Operand::CommandArguments, "workspace/executeCommand", true,
+     "run a server command; ARGUMENTS a JSON array or null"},
 };
-
-template <typename P>
-P Positioned(Session& session, const Action& action) {
-  P params;
-  params.textDocument.uri = session.Document(action.path);
-  params.position = ProtocolPosition(TextOf(action.path), action.line, action.column);
-  return params;
-}
 
 std::vector<LSP::Location> Locations(Session& session, const Action& action) {
   auto params = Positioned<LSP::TextDocumentPositionParams>(session, action);
@@ -131,7 +141,12 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
       outcome.edits = FilesOf(server.TextDocument_Rename(&params));
       break;
     }
-    default: outcome.locations = Locations(session, action); break;
+    case ActionKind::Definition:
+    case ActionKind::Declaration:
+    case ActionKind::TypeDefinition:
+    case ActionKind::Implementation:
+    case ActionKind::References: outcome.locations = Locations(session, action); break;
+    default: AskFeature(session, action, outcome); break;
   }
 }
 
@@ -159,6 +174,8 @@ const char* OperandForm(Operand operand) {
     case Operand::Rename: return "FILE:LINE:COL:NEWNAME";
     case Operand::None: return "";
     case Operand::MethodParams: return "METHOD PARAMS";
+    case Operand::PositionOrRange: return "FILE:LINE:COL[:L2:C2]";
+    case Operand::CommandArguments: return "COMMAND ARGUMENTS";
     default: return "QUERY";
   }
 }
@@ -166,7 +183,7 @@ const char* OperandForm(Operand operand) {
 std::string Describe(const Action& action) {
   std::string name = std::string(InfoOf(action.kind).option).substr(2);
   if (action.kind == ActionKind::WorkspaceSymbols || action.kind == ActionKind::Request ||
-      action.kind == ActionKind::Notify) {
+      action.kind == ActionKind::Notify || action.kind == ActionKind::Execute) {
     return name + " " + action.text;
   }
   if (action.kind == ActionKind::Capabilities) return name;
@@ -183,22 +200,30 @@ std::string MethodOf(const Action& action) {
 }
 
 bool Writes(ActionKind kind) {
-  return kind == ActionKind::Format || kind == ActionKind::RangeFormat || kind == ActionKind::Rename;
+  return kind == ActionKind::Format || kind == ActionKind::RangeFormat || kind == ActionKind::Rename ||
+         kind == ActionKind::CodeActions;
 }
 
 Outcome Perform(Session& session, const Action& action) {
   Outcome outcome;
   session.Mark();
   Ask(session, action, outcome);
-  outcome.failed = session.Failed(MethodOf(action), outcome.why);
-  if (!outcome.failed && session.Applies() && Writes(action.kind)) {
+  // An action of several requests judges each of them itself.
+  if (action.kind != ActionKind::CallHierarchy) outcome.failed = session.Failed(MethodOf(action), outcome.why);
+  if (!outcome.failed && session.Applies() && action.kind == ActionKind::CodeActions) {
+    ApplyCodeAction(session, outcome);
+  } else if (!outcome.failed && session.Applies() && Writes(action.kind)) {
     outcome.failed = !WriteEdits(outcome.edits, outcome.why);
-    if (outcome.failed) outcome.why = "nothing written: " + outcome.why;
-    outcome.applied = !outcome.failed;
+    outcome.applied = !outcome.failed && HasEdits(outcome.edits);
   }
   bool written = false;
-  outcome.requested = TakeRequestedEdits(written);
+  std::string failure;
+  outcome.requested = TakeRequestedEdits(written, failure);
   outcome.applied = outcome.applied || written;
+  if (!failure.empty() && !outcome.failed) {
+    outcome.failed = true;
+    outcome.why = "the server asked for edits: " + failure;
+  }
   return outcome;
 }
 

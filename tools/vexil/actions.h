@@ -18,18 +18,22 @@
 
 #include "apply.h"
 #include "session.h"
+#include "vexil/protocol/call_hierarchy.h"
+#include "vexil/protocol/document_features.h"
+#include "vexil/protocol/semantic_tokens.h"
 
 namespace cli {
 
 enum class ActionKind {
   Open, Hover, Definition, Declaration, TypeDefinition, Implementation, References, Completion,
   Signature, Symbols, WorkspaceSymbols, Format, RangeFormat, Rename, Change, Save, Close, Diagnostics,
-  Capabilities, Request, Notify
+  Capabilities, Request, Notify, CodeActions, Highlight, Folding, SelectionRange, SemanticTokens, InlayHints,
+  PrepareRename, CallHierarchy, Execute
 };
 
 // How an action's operand is written on the command line. A request takes two operands:
-// the method and its params as JSON text.
-enum class Operand { File, Position, Range, Rename, Query, None, MethodParams };
+// the method and its params as JSON text; a command to execute, its name and arguments.
+enum class Operand { File, Position, Range, Rename, Query, None, MethodParams, PositionOrRange, CommandArguments };
 
 struct ActionInfo {
   ActionKind kind;
@@ -52,6 +56,16 @@ struct Action {
   std::string params;  // a request's params as JSON text
 };
 
+// A function of a call hierarchy, its callers and what it calls; a server may offer only
+// one of the two.
+struct CallTree {
+  LSP::CallHierarchyItem item;
+  std::vector<LSP::CallHierarchyIncomingCall> incoming;
+  std::vector<LSP::CallHierarchyOutgoingCall> outgoing;
+  bool incomingOffered = true;
+  bool outgoingOffered = true;
+};
+
 struct Outcome {
   std::vector<LSP::Location> locations;
   LSP::Hover hover;
@@ -61,7 +75,16 @@ struct Outcome {
   std::vector<FileEdits> edits;
   std::vector<LSP::Diagnostic> diagnostics;
   LSP::ServerCapabilities capabilities;
-  std::string json;  // the capabilities, or a request's result, as JSON text
+  std::vector<LSP::CodeAction> codeActions;
+  int chosen = -1;  // the code action applied, from 0
+  std::vector<LSP::DocumentHighlight> highlights;
+  std::vector<LSP::FoldingRange> folds;
+  std::vector<LSP::SelectionRange> selections;
+  std::vector<LSP::SemanticToken> tokens;
+  std::vector<LSP::InlayHint> hints;
+  LSP::PrepareRenameResult prepared;
+  std::vector<CallTree> calls;
+  std::string json;  // the capabilities, a request's or a command's result, as JSON text
   std::vector<FileEdits> requested;  // edits the server asked for meanwhile ("workspace/applyEdit")
   bool applied = false;  // whether the edits, or those asked for, were written to the files
   bool failed = false;

@@ -19,6 +19,7 @@ namespace {
 std::mutex requestedMutex;
 std::vector<FileEdits> requested;  // by the server since the last TakeRequestedEdits
 bool requestedWritten = false;
+std::string requestedFailure;  // why an edit the server asked for was not written
 
 LSP::WorkspaceEdit EditOf(const std::vector<FileEdits>& files) {
   LSP::WorkspaceEdit edit;
@@ -49,6 +50,12 @@ bool ReadParams(const char* json, LSP::ApplyWorkspaceEditParams& params, std::st
 
 }  // namespace
 
+bool HasEdits(const std::vector<FileEdits>& files) {
+  for (const FileEdits& file : files)
+    if (!file.edits.empty()) return true;
+  return false;
+}
+
 std::vector<FileEdits> FilesOf(const LSP::WorkspaceEdit& edit) {
   std::vector<FileEdits> files;
   for (const LSP::TextDocumentEdit& document : edit.documentChanges) {
@@ -59,7 +66,9 @@ std::vector<FileEdits> FilesOf(const LSP::WorkspaceEdit& edit) {
 
 bool WriteEdits(const std::vector<FileEdits>& files, std::string& why) {
   for (const FileEdits& file : files) TextOf(file.path);
-  return LSP::ApplyWorkspaceEdit(EditOf(files), why);
+  if (LSP::ApplyWorkspaceEdit(EditOf(files), why)) return true;
+  why = "nothing written: " + why;
+  return false;
 }
 
 void AfterWriting(Session& session, const std::vector<FileEdits>& files) {
@@ -72,28 +81,28 @@ void AfterWriting(Session& session, const std::vector<FileEdits>& files) {
 void AnswerApplyEdit(xLanguageServer& server, bool write, const char* idJson, const char* paramsJson) {
   LSP::ApplyWorkspaceEditParams params;
   LSP::ApplyWorkspaceEditResult result;
-  if (!ReadParams(paramsJson, params, result.failureReason)) {
-    result.failureReason = "the edit cannot be read: " + result.failureReason;
-  } else if (!write) {
-    result.failureReason = "vexil lsp writes edits only with --apply";
-  } else {
-    result.applied = WriteEdits(FilesOf(params.edit), result.failureReason);
-  }
+  const bool read = ReadParams(paramsJson, params, result.failureReason);
+  const std::vector<FileEdits> files = FilesOf(params.edit);
+  if (!read) result.failureReason = "the edit cannot be read: " + result.failureReason;
+  else if (!write) result.failureReason = "vexil lsp writes edits only with --apply";
+  else result.applied = WriteEdits(files, result.failureReason);
   {
-    std::vector<FileEdits> files = FilesOf(params.edit);
     std::lock_guard<std::mutex> lock(requestedMutex);
     requested.insert(requested.end(), files.begin(), files.end());
-    requestedWritten = requestedWritten || result.applied;
+    requestedWritten = requestedWritten || (result.applied && HasEdits(files));
+    if (write && !result.applied && requestedFailure.empty()) requestedFailure = result.failureReason;
   }
   server.Reply(idJson, LSP::ToJsonText(result).c_str());
 }
 
-std::vector<FileEdits> TakeRequestedEdits(bool& written) {
+std::vector<FileEdits> TakeRequestedEdits(bool& written, std::string& failure) {
   std::lock_guard<std::mutex> lock(requestedMutex);
   std::vector<FileEdits> taken;
   taken.swap(requested);
   written = requestedWritten;
   requestedWritten = false;
+  failure.swap(requestedFailure);
+  requestedFailure.clear();
   return taken;
 }
 

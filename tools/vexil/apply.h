@@ -19,6 +19,8 @@ struct FileEdits {
   std::vector<LSP::TextEdit> edits;
 };
 
+// Whether any file has an edit.
+bool HasEdits(const std::vector<FileEdits>& files);
 // The document changes of a workspace edit, file by file.
 std::vector<FileEdits> FilesOf(const LSP::WorkspaceEdit& edit);
 
@@ -33,7 +35,8 @@ void AfterWriting(Session& session, const std::vector<FileEdits>& files);
 // dispatch thread): its edits are written when `write`, else declined; either way they are
 // kept for TakeRequestedEdits.
 void AnswerApplyEdit(xLanguageServer& server, bool write, const char* idJson, const char* paramsJson);
-// The edits servers asked for since the last call, in order, and whether they were written.
-std::vector<FileEdits> TakeRequestedEdits(bool& written);
+// The edits servers asked for since the last call, in order, whether they were written,
+// and why one was not when it should have been ("" when none failed).
+std::vector<FileEdits> TakeRequestedEdits(bool& written, std::string& failure);
 
 }  // namespace cli

@@ -49,8 +49,10 @@ std::string LspHelp() {
       "  --trace=LEVEL     show the library's trace on stderr: off, messages or verbose\n"
       "  --env=NAME=VALUE  set a variable of the server's environment (repeatable)\n"
       "  --progress        announce work-done progress, and show the server's on stderr\n"
-      "  --apply           write the edits of renames and formatting to the files, and those\n"
-      "                    the server asks for (without it they are shown as a diff only)\n"
+      "  --apply[=CHOICE]  write the edits of renames, formatting and code actions to the files,\n"
+      "                    and those the server asks for (without it they are only shown); a\n"
+      "                    code action is the preferred or only one, or CHOICE: its number or\n"
+      "                    words of its title\n"
       "  --help            show this help\n"
       "\n"
       "Actions (lines and columns count from 1, columns in bytes):\n";

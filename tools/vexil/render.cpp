@@ -6,6 +6,7 @@
 #include <filesystem>
 
 #include "columns.h"
+#include "render_features.h"
 #include "text_edits.h"
 #include "vexil/client/text_edits.h"
 #include "vexil/client/uri.h"
@@ -18,12 +19,6 @@ std::string Relative(const std::string& path) {
   std::filesystem::path relative = std::filesystem::relative(path, std::filesystem::current_path(error), error);
   if (error || relative.empty() || relative.string().rfind("..", 0) == 0) return path;
   return relative.string();
-}
-
-std::string SourceLine(const std::string& path, int line) {
-  std::string text = LineOf(path, line);
-  text.erase(0, text.find_first_not_of(" \t"));
-  return text;
 }
 
 void PrintLocations(std::ostream& out, const std::vector<LSP::Location>& locations) {
@@ -72,12 +67,6 @@ void PrintDiagnostics(std::ostream& out, const std::string& path, const std::vec
   }
 }
 
-void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files) {
-  std::string diff;
-  for (const FileEdits& file : files) diff += EditsAsDiff(file);
-  out << (diff.empty() ? "  (no changes)\n" : diff);
-}
-
 // The files the edits went to, each named once.
 void PrintWritten(std::ostream& out, const Outcome& outcome) {
   std::vector<std::string> paths;
@@ -93,6 +82,18 @@ void PrintWritten(std::ostream& out, const Outcome& outcome) {
 }
 
 }  // namespace
+
+std::string SourceLine(const std::string& path, int line) {
+  std::string text = LineOf(path, line);
+  text.erase(0, text.find_first_not_of(" \t"));
+  return text;
+}
+
+void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files) {
+  std::string diff;
+  for (const FileEdits& file : files) diff += EditsAsDiff(file);
+  out << (diff.empty() ? "  (no changes)\n" : diff);
+}
 
 std::string Where(const LSP::Location& location) {
   std::string path = UriToFile(location.uri.c_str());
@@ -162,7 +163,12 @@ void PrintReadable(std::ostream& out, const Action& action, const Outcome& outco
     case ActionKind::Diagnostics: PrintDiagnostics(out, action.path, outcome.diagnostics); break;
     case ActionKind::Capabilities: PrintCapabilities(out, outcome); break;
     case ActionKind::Request: PrintRequestResult(out, outcome); break;
-    default: PrintLocations(out, outcome.locations); break;
+    case ActionKind::Definition:
+    case ActionKind::Declaration:
+    case ActionKind::TypeDefinition:
+    case ActionKind::Implementation:
+    case ActionKind::References: PrintLocations(out, outcome.locations); break;
+    default: PrintFeature(out, action, outcome); break;
   }
   if (!outcome.requested.empty()) {
     out << "  the server asked for edits:\n";

@@ -3,6 +3,7 @@
 #include "render.h"
 
 #include "columns.h"
+#include "render_features.h"
 #include "vexil/client/uri.h"
 #include "vexil/json/json.h"
 
@@ -13,13 +14,6 @@ void Point(LSP::xWriter& writer, const char* line, const char* column, const std
            const LSP::Position& position) {
   writer.Int(line, position.line + 1);
   writer.Int(column, ByteColumn(TextOf(path), position));
-}
-
-// The path and the range in it.
-void Span(LSP::xWriter& writer, const std::string& path, const LSP::Range& range) {
-  writer.RequiredString("path", path);
-  Point(writer, "line", "column", path, range.start);
-  Point(writer, "endLine", "endColumn", path, range.end);
 }
 
 void Locations(LSP::xWriter& writer, const std::vector<LSP::Location>& locations) {
@@ -42,19 +36,6 @@ void Symbols(LSP::xWriter& writer, const char* name, const std::vector<LSP::Symb
     Span(writer, UriToFile(symbol.location.uri.c_str()), symbol.location.range);
     if (!symbol.children.empty()) Symbols(writer, "children", symbol.children);
     writer.EndObject();
-  }
-  writer.EndArray();
-}
-
-void Edits(LSP::xWriter& writer, const char* name, const std::vector<FileEdits>& files) {
-  writer.StartArray(name);
-  for (const FileEdits& file : files) {
-    for (const LSP::TextEdit& edit : file.edits) {
-      writer.StartObject();
-      Span(writer, file.path, edit.range);
-      writer.RequiredString("newText", edit.newText);
-      writer.EndObject();
-    }
   }
   writer.EndArray();
 }
@@ -102,12 +83,6 @@ void Diagnostics(LSP::xWriter& writer, const std::string& path, const std::vecto
   writer.EndArray();
 }
 
-// JSON text as it came, under "result"; null when there is none.
-void RawResult(LSP::xWriter& writer, const std::string& json) {
-  LSP::xReader reader;
-  if (reader.Parse(json.empty() ? "null" : json)) writer.Raw("result", reader.Root().Value());
-}
-
 void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) {
   switch (action.kind) {
     case ActionKind::Hover: writer.RequiredString("result", HoverText(outcome.hover)); break;
@@ -121,11 +96,41 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
     case ActionKind::Diagnostics: Diagnostics(writer, action.path, outcome.diagnostics); break;
     case ActionKind::Capabilities:
     case ActionKind::Request: RawResult(writer, outcome.json); break;
-    default: Locations(writer, outcome.locations); break;
+    case ActionKind::Definition:
+    case ActionKind::Declaration:
+    case ActionKind::TypeDefinition:
+    case ActionKind::Implementation:
+    case ActionKind::References: Locations(writer, outcome.locations); break;
+    default: FeatureResult(writer, action, outcome); break;
   }
 }
 
 }  // namespace
+
+// JSON text as it came, under "result"; null when there is none.
+void RawResult(LSP::xWriter& writer, const std::string& json) {
+  LSP::xReader reader;
+  if (reader.Parse(json.empty() ? "null" : json)) writer.Raw("result", reader.Root().Value());
+}
+
+void Span(LSP::xWriter& writer, const std::string& path, const LSP::Range& range) {
+  writer.RequiredString("path", path);
+  Point(writer, "line", "column", path, range.start);
+  Point(writer, "endLine", "endColumn", path, range.end);
+}
+
+void Edits(LSP::xWriter& writer, const char* name, const std::vector<FileEdits>& files) {
+  writer.StartArray(name);
+  for (const FileEdits& file : files) {
+    for (const LSP::TextEdit& edit : file.edits) {
+      writer.StartObject();
+      Span(writer, file.path, edit.range);
+      writer.RequiredString("newText", edit.newText);
+      writer.EndObject();
+    }
+  }
+  writer.EndArray();
+}
 
 void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome) {
   if (!InfoOf(action.kind).query && !outcome.failed) return;
