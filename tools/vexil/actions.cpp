@@ -93,6 +93,7 @@ std::vector<FileEdits> Formatting(Session& session, const Action& action) {
 }
 
 void Ask(Session& session, const Action& action, Outcome& outcome) {
+  if (IsNewer(action.kind)) return AskFeature(session, action, outcome);
   xLanguageServer& server = session.Server();
   switch (action.kind) {
     case ActionKind::Open: session.Document(action.path); break;
@@ -141,12 +142,7 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
       outcome.edits = FilesOf(server.TextDocument_Rename(&params));
       break;
     }
-    case ActionKind::Definition:
-    case ActionKind::Declaration:
-    case ActionKind::TypeDefinition:
-    case ActionKind::Implementation:
-    case ActionKind::References: outcome.locations = Locations(session, action); break;
-    default: AskFeature(session, action, outcome); break;
+    default: outcome.locations = Locations(session, action); break;
   }
 }
 
@@ -203,6 +199,8 @@ bool Writes(ActionKind kind) {
   return kind == ActionKind::Format || kind == ActionKind::RangeFormat || kind == ActionKind::Rename ||
          kind == ActionKind::CodeActions;
 }
+
+bool IsNewer(ActionKind kind) { return kind >= ActionKind::CodeActions; }
 
 Outcome Perform(Session& session, const Action& action) {
   Outcome outcome;

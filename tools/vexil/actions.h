@@ -103,6 +103,9 @@ const char* OperandForm(Operand operand);
 std::string Describe(const Action& action);
 // Whether --apply writes the edits the action proposes.
 bool Writes(ActionKind kind);
+// Whether the action is one of the newer requests (code actions and after), asked and
+// printed apart from the classic ones.
+bool IsNewer(ActionKind kind);
 
 // Performs the action. When the session applies edits, those it proposes are written to
 // the files (see apply.h); once its answer has been shown, AfterWriting tells the server.

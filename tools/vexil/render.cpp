@@ -67,6 +67,35 @@ void PrintDiagnostics(std::ostream& out, const std::string& path, const std::vec
   }
 }
 
+// The answer of one of the classic requests.
+void PrintAnswer(std::ostream& out, const Action& action, const Outcome& outcome) {
+  switch (action.kind) {
+    case ActionKind::Hover: {
+      std::string text = HoverText(outcome.hover);
+      out << (text.empty() ? "  (none)" : text) << "\n";
+      break;
+    }
+    case ActionKind::Completion:
+      if (outcome.completion.items.empty()) out << "  (none)\n";
+      for (const LSP::CompletionItem& item : outcome.completion.items) {
+        // clangd pads labels with a blank where an include marker may go.
+        out << "  " << item.label.substr(std::min(item.label.find_first_not_of(' '), item.label.size()))
+            << (item.detail.empty() ? "" : "  : " + item.detail) << "\n";
+      }
+      break;
+    case ActionKind::Signature: PrintSignature(out, outcome.signature); break;
+    case ActionKind::Symbols:
+    case ActionKind::WorkspaceSymbols: PrintSymbols(out, outcome.symbols, 0); break;
+    case ActionKind::Format:
+    case ActionKind::RangeFormat:
+    case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
+    case ActionKind::Diagnostics: PrintDiagnostics(out, action.path, outcome.diagnostics); break;
+    case ActionKind::Capabilities: PrintCapabilities(out, outcome); break;
+    case ActionKind::Request: PrintRequestResult(out, outcome); break;
+    default: PrintLocations(out, outcome.locations); break;
+  }
+}
+
 // The files the edits went to, each named once.
 void PrintWritten(std::ostream& out, const Outcome& outcome) {
   std::vector<std::string> paths;
@@ -140,36 +169,8 @@ std::string EditsAsDiff(const FileEdits& file) {
 void PrintReadable(std::ostream& out, const Action& action, const Outcome& outcome) {
   if (!InfoOf(action.kind).query) return;
   out << Describe(action) << "\n";
-  switch (action.kind) {
-    case ActionKind::Hover: {
-      std::string text = HoverText(outcome.hover);
-      out << (text.empty() ? "  (none)" : text) << "\n";
-      break;
-    }
-    case ActionKind::Completion:
-      if (outcome.completion.items.empty()) out << "  (none)\n";
-      for (const LSP::CompletionItem& item : outcome.completion.items) {
-        // clangd pads labels with a blank where an include marker may go.
-        out << "  " << item.label.substr(std::min(item.label.find_first_not_of(' '), item.label.size()))
-            << (item.detail.empty() ? "" : "  : " + item.detail) << "\n";
-      }
-      break;
-    case ActionKind::Signature: PrintSignature(out, outcome.signature); break;
-    case ActionKind::Symbols:
-    case ActionKind::WorkspaceSymbols: PrintSymbols(out, outcome.symbols, 0); break;
-    case ActionKind::Format:
-    case ActionKind::RangeFormat:
-    case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
-    case ActionKind::Diagnostics: PrintDiagnostics(out, action.path, outcome.diagnostics); break;
-    case ActionKind::Capabilities: PrintCapabilities(out, outcome); break;
-    case ActionKind::Request: PrintRequestResult(out, outcome); break;
-    case ActionKind::Definition:
-    case ActionKind::Declaration:
-    case ActionKind::TypeDefinition:
-    case ActionKind::Implementation:
-    case ActionKind::References: PrintLocations(out, outcome.locations); break;
-    default: PrintFeature(out, action, outcome); break;
-  }
+  if (IsNewer(action.kind)) PrintFeature(out, action, outcome);
+  else PrintAnswer(out, action, outcome);
   if (!outcome.requested.empty()) {
     out << "  the server asked for edits:\n";
     PrintEdits(out, outcome.requested);

@@ -62,17 +62,15 @@ void PrintFolds(std::ostream& out, const std::string& path, const Outcome& outco
 
 void PrintSelections(std::ostream& out, const std::string& path, const Outcome& outcome) {
   if (outcome.selections.empty()) out << "  (none)\n";
-  for (const LSP::SelectionRange& selection : outcome.selections) {
-    std::vector<LSP::Range> ranges{selection.range};
-    ranges.insert(ranges.end(), selection.parents.begin(), selection.parents.end());
-    for (const LSP::Range& range : ranges) out << "  " << Stretch(path, range) << ": " << Excerpt(path, range) << "\n";
+  for (const LSP::Range& range : SelectedRanges(outcome)) {
+    out << "  " << Stretch(path, range) << ": " << Excerpt(path, range) << "\n";
   }
 }
 
 void PrintTokens(std::ostream& out, const std::string& path, const Outcome& outcome) {
   if (outcome.tokens.empty()) out << "  (none)\n";
   for (const LSP::SemanticToken& token : outcome.tokens) {
-    LSP::Range range(LSP::Position(token.line, token.character), LSP::Position(token.line, token.character + token.length));
+    LSP::Range range = TokenRange(token);
     std::string modifiers;
     for (const std::string& modifier : token.modifiers) modifiers += (modifiers.empty() ? "" : ", ") + modifier;
     out << "  " << Place(path, range.start) << " " << (token.type.empty() ? "token" : token.type)
@@ -131,6 +129,19 @@ std::string FirstLineOf(const std::string& path, const LSP::Range& range, bool& 
   std::size_t lineEnd = LSP::PositionToOffset(text, LSP::Position(range.start.line, INT_MAX));
   more = end > lineEnd;
   return text.substr(start, std::min(end, lineEnd) - start);
+}
+
+std::vector<LSP::Range> SelectedRanges(const Outcome& outcome) {
+  std::vector<LSP::Range> ranges;
+  for (const LSP::SelectionRange& selection : outcome.selections) {
+    ranges.push_back(selection.range);
+    ranges.insert(ranges.end(), selection.parents.begin(), selection.parents.end());
+  }
+  return ranges;
+}
+
+LSP::Range TokenRange(const LSP::SemanticToken& token) {
+  return LSP::Range(LSP::Position(token.line, token.character), LSP::Position(token.line, token.character + token.length));
 }
 
 const char* HighlightKindName(int kind) { return kind == 2 ? "read" : kind == 3 ? "write" : "text"; }

@@ -24,6 +24,10 @@ void Span(LSP::xWriter& writer, const std::string& path, const LSP::Range& range
 void Edits(LSP::xWriter& writer, const char* name, const std::vector<FileEdits>& files);
 // The text of `range` in the file at `path`, up to the end of its first line.
 std::string FirstLineOf(const std::string& path, const LSP::Range& range, bool& more);
+// The ranges of a selection, each followed by those around it, innermost first.
+std::vector<LSP::Range> SelectedRanges(const Outcome& outcome);
+// The place of a semantic token.
+LSP::Range TokenRange(const LSP::SemanticToken& token);
 // "text", "read" or "write" of a document highlight's kind.
 const char* HighlightKindName(int kind);
 // "type", "parameter" or "hint" of an inlay hint's kind.

@@ -24,85 +24,64 @@ class Members : public LSP::JsonObject {
   std::function<void(LSP::xWriter&)> write_;
 };
 
-void CodeActions(LSP::xWriter& writer, const Outcome& outcome) {
+// An array "result" of one object per item, whose members `write` writes.
+template <typename T, typename Write>
+void Objects(LSP::xWriter& writer, const std::vector<T>& items, Write write) {
   writer.StartArray("result");
-  for (std::size_t i = 0; i < outcome.codeActions.size(); ++i) {
-    const LSP::CodeAction& action = outcome.codeActions[i];
+  for (const T& item : items) {
     writer.StartObject();
+    write(item);
+    writer.EndObject();
+  }
+  writer.EndArray();
+}
+
+void CodeActions(LSP::xWriter& writer, const Outcome& outcome) {
+  Objects(writer, outcome.codeActions, [&](const LSP::CodeAction& action) {
     writer.RequiredString("title", action.title);
     writer.String("kind", action.kind);
     if (action.isPreferred) writer.Bool("preferred", true);
     if (action.HasEdit()) Edits(writer, "edits", FilesOf(action.edit));
     writer.String("command", action.command.command);
-    if (static_cast<int>(i) == outcome.chosen) writer.Bool("applied", true);
-    writer.EndObject();
-  }
-  writer.EndArray();
+    if (&action - outcome.codeActions.data() == outcome.chosen) writer.Bool("applied", true);
+  });
 }
 
 void Highlights(LSP::xWriter& writer, const std::string& path, const Outcome& outcome) {
-  writer.StartArray("result");
-  for (const LSP::DocumentHighlight& highlight : outcome.highlights) {
-    writer.StartObject();
+  Objects(writer, outcome.highlights, [&](const LSP::DocumentHighlight& highlight) {
     Span(writer, path, highlight.range);
     writer.RequiredString("kind", HighlightKindName(highlight.kind));
-    writer.EndObject();
-  }
-  writer.EndArray();
+  });
 }
 
 // A fold without characters takes its lines whole.
 void Folds(LSP::xWriter& writer, const std::string& path, const Outcome& outcome) {
-  writer.StartArray("result");
-  for (const LSP::FoldingRange& fold : outcome.folds) {
-    writer.StartObject();
+  Objects(writer, outcome.folds, [&](const LSP::FoldingRange& fold) {
     Span(writer, path, LSP::Range(LSP::Position(fold.startLine, std::max(fold.startCharacter, 0)),
                                   LSP::Position(fold.endLine, fold.endCharacter < 0 ? INT_MAX : fold.endCharacter)));
     writer.String("kind", fold.kind);
     writer.String("collapsedText", fold.collapsedText);
-    writer.EndObject();
-  }
-  writer.EndArray();
+  });
 }
 
-// Innermost first.
 void Selections(LSP::xWriter& writer, const std::string& path, const Outcome& outcome) {
-  writer.StartArray("result");
-  for (const LSP::SelectionRange& selection : outcome.selections) {
-    std::vector<LSP::Range> ranges{selection.range};
-    ranges.insert(ranges.end(), selection.parents.begin(), selection.parents.end());
-    for (const LSP::Range& range : ranges) {
-      writer.StartObject();
-      Span(writer, path, range);
-      writer.EndObject();
-    }
-  }
-  writer.EndArray();
+  Objects(writer, SelectedRanges(outcome), [&](const LSP::Range& range) { Span(writer, path, range); });
 }
 
 void Tokens(LSP::xWriter& writer, const std::string& path, const Outcome& outcome) {
-  writer.StartArray("result");
-  for (const LSP::SemanticToken& token : outcome.tokens) {
-    writer.StartObject();
-    Span(writer, path, LSP::Range(LSP::Position(token.line, token.character),
-                                  LSP::Position(token.line, token.character + token.length)));
+  Objects(writer, outcome.tokens, [&](const LSP::SemanticToken& token) {
+    Span(writer, path, TokenRange(token));
     writer.RequiredString("type", token.type);
     writer.Strings("modifiers", token.modifiers);
-    writer.EndObject();
-  }
-  writer.EndArray();
+  });
 }
 
 void Hints(LSP::xWriter& writer, const std::string& path, const Outcome& outcome) {
-  writer.StartArray("result");
-  for (const LSP::InlayHint& hint : outcome.hints) {
-    writer.StartObject();
+  Objects(writer, outcome.hints, [&](const LSP::InlayHint& hint) {
     Span(writer, path, LSP::Range(hint.position, hint.position));
     writer.RequiredString("kind", HintKindName(hint.kind));
     writer.RequiredString("label", hint.label);
-    writer.EndObject();
-  }
-  writer.EndArray();
+  });
 }
 
 // The range to rename and the name to offer; {"defaultBehavior":true} when the server

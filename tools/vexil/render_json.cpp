@@ -84,6 +84,7 @@ void Diagnostics(LSP::xWriter& writer, const std::string& path, const std::vecto
 }
 
 void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) {
+  if (IsNewer(action.kind)) return FeatureResult(writer, action, outcome);
   switch (action.kind) {
     case ActionKind::Hover: writer.RequiredString("result", HoverText(outcome.hover)); break;
     case ActionKind::Completion: Completion(writer, outcome.completion); break;
@@ -96,12 +97,7 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
     case ActionKind::Diagnostics: Diagnostics(writer, action.path, outcome.diagnostics); break;
     case ActionKind::Capabilities:
     case ActionKind::Request: RawResult(writer, outcome.json); break;
-    case ActionKind::Definition:
-    case ActionKind::Declaration:
-    case ActionKind::TypeDefinition:
-    case ActionKind::Implementation:
-    case ActionKind::References: Locations(writer, outcome.locations); break;
-    default: FeatureResult(writer, action, outcome); break;
+    default: Locations(writer, outcome.locations); break;
   }
 }
 
