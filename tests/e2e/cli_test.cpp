@@ -146,6 +146,23 @@ TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
   EXPECT_EQ(asked.out.substr(asked.out.size() - 22), "int y = 1;\nint y = 1;\n") << asked.out;
   EXPECT_NE(asked.err.find("vexil: request fake/x: the server asked for edits: nothing written: Cannot edit "),
             std::string::npos) << asked.err;
+
+  // --apply=N takes the Nth code action, a number never a title; without a choice, two
+  // actions none of which is preferred write nothing.
+  auto action = [](const std::string& title, const std::string& text) {
+    return R"({"title":")" + title + R"(","edit":{"changes":{"'"file://$SCRATCH/c.cpp"'":[{"range":)" + Range(0, 4, 0, 5) +
+           R"(,"newText":")" + text + R"("}]}}})";
+  };
+  const std::string actions = "'result=textDocument/codeAction:[" + action("Use 2", "b") + "," + action("second", "c") + "]'";
+  Result chosen = Shell("echo 'int a;' > \"$SCRATCH/c.cpp\"; \"$VEXIL\" lsp --apply -- \"$FAKE\" diagnose " + actions +
+                        " --code-actions \"$SCRATCH/c.cpp:1:5\"; cat \"$SCRATCH/c.cpp\"; \"$VEXIL\" lsp --apply=2 -- \"$FAKE\" "
+                        "diagnose " + actions + " --code-actions \"$SCRATCH/c.cpp:1:5\" && cat \"$SCRATCH/c.cpp\"");
+  EXPECT_EQ(chosen.status, 0) << chosen.err;
+  EXPECT_NE(chosen.err.find(": none of the code actions is preferred; choose one with --apply=N: 1. Use 2; 2. second\n"),
+            std::string::npos) << chosen.err;
+  EXPECT_EQ(chosen.out.rfind("int a;\ncode-actions ", 0), 0u) << chosen.out;
+  EXPECT_NE(chosen.out.find("* 2. second\n"), std::string::npos) << chosen.out;
+  EXPECT_EQ(chosen.out.substr(chosen.out.size() - 7), "int c;\n") << chosen.out;
 }
 
 // Neither server offers pulled diagnostics, so the command waits for the publication; once

@@ -56,10 +56,11 @@ void CallHierarchy(Session& session, const Action& action, Outcome& outcome) {
   }
 }
 
-// Whether code action `index` (from 0) is the one `choice` names: its number from 1, or
-// words of its title.
+// Whether code action `index` (from 0) is the one `choice` names: its number from 1 when
+// the choice is a number, else words of its title.
 bool Named(const std::vector<LSP::CodeAction>& actions, std::size_t index, const std::string& choice) {
-  return choice == std::to_string(index + 1) || actions[index].title.find(choice) != std::string::npos;
+  if (choice.find_first_not_of("0123456789") == std::string::npos) return choice == std::to_string(index + 1);
+  return actions[index].title.find(choice) != std::string::npos;
 }
 
 // The code action --apply takes: the one CHOICE names, else the preferred one, else the only
