@@ -20,7 +20,8 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
       {"--trace", "verbose", "--timeout=900", "--json", "--root=src", "--", "clangd", "--log=error", "--pretty",
        "--hover", "c:/odd:name.cpp:15:18", "--range-format=a.cpp:1:2:3:4", "--rename", "a.cpp:5:6:Limit",
        "--workspace-symbols", "Rect", "--close", "a.cc", "--capabilities", "--request", "a/b", R"({"x": [1]})",
-       "--notify=c/d", "null"});
+       "--notify=c/d", "null", "--code-actions", "odd:name.cpp:3:4", "--code-actions=c:/x.c:3:4:5:6", "--execute", "cmd",
+       "[1]"});
   EXPECT_EQ(options.session.trace, LSP::TraceLevel::Verbose);
   EXPECT_EQ(options.session.timeout, 900);
   EXPECT_TRUE(options.json);
@@ -29,14 +30,20 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   Args described;
   for (const cli::Action& action : options.actions) described.push_back(cli::Describe(action));
   ASSERT_EQ(described, (Args{"hover c:/odd:name.cpp:15:18", "range-format a.cpp:1:2:3:4", "rename a.cpp:5:6 -> Limit",
-                             "workspace-symbols Rect", "close a.cc", "capabilities", "request a/b", "notify c/d"}));
+                             "workspace-symbols Rect", "close a.cc", "capabilities", "request a/b", "notify c/d",
+                             // a position, or a range when four numbers end the operand
+                             "code-actions odd:name.cpp:3:4", "code-actions c:/x.c:3:4:5:6", "execute cmd"}));
   const std::filesystem::path root = std::filesystem::absolute("src").lexically_normal();
   EXPECT_EQ(options.session.root, root.string());
   EXPECT_EQ(options.actions[4].path, (root / "a.cc").string());
-  EXPECT_EQ(options.actions[6].params + " " + options.actions[7].params, R"({"x": [1]} null)");
-  cli::LspOptions environment = ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--", "s", "--capabilities"});
+  EXPECT_EQ(options.actions[6].params + " " + options.actions[7].params + " " + options.actions[10].params,
+            R"({"x": [1]} null [1])");
+  cli::LspOptions environment =
+      ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--apply=2", "--", "s", "--capabilities"});
   EXPECT_EQ(environment.session.environment, (std::vector<std::pair<std::string, std::string>>{{"A", "b=c"}, {"EMPTY", ""}}));
   EXPECT_TRUE(environment.session.progress);
+  EXPECT_TRUE(environment.session.apply);
+  EXPECT_EQ(environment.session.choice, "2");
   EXPECT_FALSE(environment.session.watch);
   EXPECT_TRUE(ParseLspOptions({"--watch", "--", "s"}).session.watch) << "watching needs no action";
 }
@@ -58,6 +65,8 @@ TEST(LspOptions, BadUsageIsRefusedWithAReason) {
       {"--", "s", "--request", "a/b"},                      // no params
       {"--", "s", "--request", "a/b", "{oops"},             // not JSON
       {"--", "s", "--notify", "a/b", "[1]"},                // not an object
+      {"--", "s", "--execute", "cmd", "{}"},                // not an array
+      {"--", "s", "--execute", "cmd"},                      // no arguments
       {"--", "s", "--capabilities=yes"},                    // takes no operand
       {"--env", "NOVALUE", "--", "s", "--capabilities"},
       {"--env", "=x", "--", "s", "--capabilities"},

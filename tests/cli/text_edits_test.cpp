@@ -7,15 +7,18 @@
 
 namespace {
 
-// Columns people give count bytes; the protocol's count UTF-16 units; past the end of a
-// line both count one a byte, and invalid bytes one each.
+// Columns people give count bytes; the protocol's count UTF-16 units; a column past the
+// end of its line means the line's end, and an invalid byte counts as one unit.
 TEST(TextEdits, ByteColumnsAndUtf16UnitsConvertBothWays) {
-  const std::string line = "a\xC3\xA9\xF0\x9F\x98\x80\xE9z";  // a é 😀 (Latin-1 é) z
-  const std::vector<std::pair<std::size_t, int>> pairs = {{0, 0}, {1, 1}, {3, 2}, {7, 4}, {8, 5}, {9, 6}, {12, 9}};
-  for (const auto& [bytes, units] : pairs) {
-    EXPECT_EQ(cli::UnitsOf(line, bytes), units) << bytes;
-    EXPECT_EQ(cli::BytesOf(line, units), bytes) << units;
+  const std::string text = "x\r\na\xC3\xA9\xF0\x9F\x98\x80\xE9z\r\n";  // a é 😀 (Latin-1 é) z on line 2
+  const std::vector<std::pair<int, int>> pairs = {{1, 0}, {2, 1}, {4, 2}, {8, 4}, {9, 5}, {10, 6}};
+  for (const auto& [column, units] : pairs) {
+    EXPECT_EQ(cli::ProtocolPosition(text, 2, column).character, units) << column;
+    EXPECT_EQ(cli::ByteColumn(text, LSP::Position(1, units)), column) << units;
   }
+  EXPECT_EQ(cli::ProtocolPosition(text, 2, 40).character, 6);
+  EXPECT_EQ(cli::ProtocolPosition(text, 2, 40).line, 1);
+  EXPECT_EQ(cli::ByteColumn(text, LSP::Position(1, 40)), 10);
   EXPECT_EQ(cli::NotUtf8At("ok\n\xC3\xA9\n"), "");
   EXPECT_EQ(cli::NotUtf8At("ok\nab\xE9z"), "line 2, column 3");
   EXPECT_EQ(cli::NotUtf8At("\xC3"), "line 1, column 1");       // cut short

@@ -47,6 +47,12 @@ Result Shell(const std::string& script) {
 
 Result Vexil(const std::string& arguments) { return Shell("\"$VEXIL\" " + arguments); }
 
+// A protocol range as JSON text.
+std::string Range(int line, int character, int endLine, int endCharacter) {
+  return R"({"start":{"line":)" + std::to_string(line) + R"(,"character":)" + std::to_string(character) +
+         R"(},"end":{"line":)" + std::to_string(endLine) + R"(,"character":)" + std::to_string(endCharacter) + "}}";
+}
+
 TEST(CommandLine, LspPrintsLocationsWithTheirSourceAndCompletionsOnePerLine) {
   Result run = Vexil("lsp -- clangd --log=error --definition main.cpp:15:18 --completion main.cpp:13:13");
   EXPECT_EQ(run.status, 0) << run.err;
@@ -64,10 +70,26 @@ TEST(CommandLine, LspPrintsLocationsWithTheirSourceAndCompletionsOnePerLine) {
   EXPECT_NE(beyond.out.find("\n  textDocumentSync: incremental changes, open and close, save\n"), std::string::npos);
   EXPECT_NE(beyond.out.find("request textDocument/documentHighlight\n  [{"), std::string::npos) << beyond.out;
   EXPECT_NE(beyond.out.find(R"("start":{"character":17,"line":14}})"), std::string::npos) << beyond.out;
+  // The newer requests, each answer in its place with byte columns.
+  Result features = Vexil("lsp -- clangd --log=error --highlight main.cpp:11:22 --prepare-rename main.cpp:15:18 "
+                          "--selection-range main.cpp:15:18 --semantic-tokens shapes.h --call-hierarchy shapes.cpp:17:5");
+  EXPECT_EQ(features.status, 0) << features.err;
+  for (const char* answer :
+       {"highlight main.cpp:11:22\n  main.cpp:11:21: text: shapes::Rectangle rectangle(3, 4);\n  main.cpp:12:10: text: ",
+        "prepare-rename main.cpp:15:18\n  15:18-15:23: Clamp\n", "selection-range main.cpp:15:18\n  15:10-15:23: shapes::Clamp\n",
+        "\n  28:5 function [declaration, globalScope]: Clamp\n",
+        "call-hierarchy shapes.cpp:17:5\n  function Clamp  shapes.cpp:17:5\n    called from:\n"
+        "      method Scale  shapes.cpp:13:12  (2 calls)\n"}) {
+    EXPECT_NE(features.out.find(answer), std::string::npos) << answer << "\n" << features.out;
+  }
   // Files are found below --root, whatever the current directory.
-  Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22");
+  Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22 --folding geometry.py --highlight main.py:12:7");
   EXPECT_EQ(python.status, 0) << python.err;
   EXPECT_EQ(python.out.rfind("hover main.py:2:22\n", 0), 0u) << python.out;
+  EXPECT_NE(python.out.find("folding geometry.py\n  4-6: def clamp(value, low, high):\n  9-23: class Rectangle:\n"),
+            std::string::npos) << python.out;
+  EXPECT_NE(python.out.find("/python/main.py:2:33: write: from geometry import Rectangle, clamp\n"), std::string::npos);
+  EXPECT_NE(python.out.find("/python/main.py:12:7: read: print(clamp("), std::string::npos) << python.out;
 }
 
 TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
@@ -87,6 +109,60 @@ TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
             std::string::npos)
       << rename.out;
   EXPECT_NE(rename.err.find("vexil: note: clangd proposed edits only in files it has opened"), std::string::npos);
+  // --apply writes exactly the edits shown, and the server is told of the new text.
+  Result applied = Shell("cp main.cpp shapes.h compile_flags.txt \"$SCRATCH\"; cd \"$SCRATCH\"; \"$VEXIL\" lsp --apply "
+                         "-- clangd --log=error --rename main.cpp:15:18:Limit --diagnostics main.cpp && "
+                         "sed s/Limit/Clamp/ main.cpp | cmp - \"$OLDPWD/main.cpp\" && cmp shapes.h \"$OLDPWD/shapes.h\"");
+  EXPECT_EQ(applied.status, 0) << applied.out << applied.err;
+  EXPECT_NE(applied.out.find("+  return shapes::Limit(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n }\n  written: main.cpp\n"
+                             "diagnostics main.cpp\nmain.cpp:15:18: error: No member named 'Limit' in namespace 'shapes'"),
+            std::string::npos)
+      << applied.out;  // The preferred quick fix of a diagnostic, written; the server then finds nothing wrong.
+  Result fixed = Shell("sed s/Clamp/Clam/ main.cpp > \"$SCRATCH/main.cpp\"; cp shapes.h compile_flags.txt \"$SCRATCH\"; "
+                       "cd \"$SCRATCH\"; \"$VEXIL\" lsp --apply --json -- clangd --log=error --code-actions main.cpp:15:18 "
+                       "--diagnostics main.cpp && cmp main.cpp \"$OLDPWD/main.cpp\"");
+  EXPECT_EQ(fixed.status, 0) << fixed.out << fixed.err;
+  EXPECT_NE(fixed.out.find(R"({"title":"change 'Clam' to 'Clamp'","kind":"quickfix","preferred":true,"edits":[{"path":")"),
+            std::string::npos) << fixed.out;
+  EXPECT_NE(fixed.out.find(R"(main.cpp","line":15,"column":18,"endLine":15,"endColumn":22,"newText":"Clamp"}],"applied":true})"),
+            std::string::npos) << fixed.out;
+  EXPECT_NE(fixed.out.find(R"({"action":"diagnostics","file":"main.cpp","failed":false,"result":[]})"), std::string::npos);
+
+  // What a server asks to apply is shown, and written only with --apply; an edit that
+  // cannot be made writes nothing and fails the action.
+  const std::string edit = R"({"range":)" + Range(0, 4, 0, 5) + R"(,"newText":"y"})";
+  const std::string ask = R"('{"ask":[{"method":"workspace/applyEdit","params":{"edit":{"changes":{"'"file://$SCRATCH/a.cpp"'":[)";
+  Result asked = Shell("echo 'int x = 1;' > \"$SCRATCH/a.cpp\"; for apply in '' --apply; do \"$VEXIL\" lsp $apply -- "
+                       "\"$FAKE\" --request fake/x " + ask + edit + "]}}}}]}'; cat \"$SCRATCH/a.cpp\"; done; "
+                       "\"$VEXIL\" lsp --apply -- \"$FAKE\" --request fake/x " + ask + edit + "," + edit + "]}}}}]}'; "
+                       "status=$?; cat \"$SCRATCH/a.cpp\"; exit $status");
+  EXPECT_EQ(asked.status, 1);
+  EXPECT_NE(asked.out.find(R"("result":{"applied":false,"failureReason":"vexil lsp writes edits only with --apply"}}])"),
+            std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find("  the server asked for edits:\n--- "), std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find("-int x = 1;\n+int y = 1;\nint x = 1;\n"), std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find(R"("result":{"applied":true}}])"), std::string::npos) << asked.out;
+  EXPECT_NE(asked.out.find("  written: "), std::string::npos) << asked.out;
+  EXPECT_EQ(asked.out.substr(asked.out.size() - 22), "int y = 1;\nint y = 1;\n") << asked.out;
+  EXPECT_NE(asked.err.find("vexil: request fake/x: the server asked for edits: nothing written: Cannot edit "),
+            std::string::npos) << asked.err;
+
+  // --apply=N takes the Nth code action, a number never a title; without a choice, two
+  // actions none of which is preferred write nothing.
+  auto action = [](const std::string& title, const std::string& text) {
+    return R"({"title":")" + title + R"(","edit":{"changes":{"'"file://$SCRATCH/c.cpp"'":[{"range":)" + Range(0, 4, 0, 5) +
+           R"(,"newText":")" + text + R"("}]}}})";
+  };
+  const std::string actions = "'result=textDocument/codeAction:[" + action("Use 2", "b") + "," + action("second", "c") + "]'";
+  Result chosen = Shell("echo 'int a;' > \"$SCRATCH/c.cpp\"; \"$VEXIL\" lsp --apply -- \"$FAKE\" diagnose " + actions +
+                        " --code-actions \"$SCRATCH/c.cpp:1:5\"; cat \"$SCRATCH/c.cpp\"; \"$VEXIL\" lsp --apply=2 -- \"$FAKE\" "
+                        "diagnose " + actions + " --code-actions \"$SCRATCH/c.cpp:1:5\" && cat \"$SCRATCH/c.cpp\"");
+  EXPECT_EQ(chosen.status, 0) << chosen.err;
+  EXPECT_NE(chosen.err.find(": none of the code actions is preferred; choose one with --apply=N: 1. Use 2; 2. second\n"),
+            std::string::npos) << chosen.err;
+  EXPECT_EQ(chosen.out.rfind("int a;\ncode-actions ", 0), 0u) << chosen.out;
+  EXPECT_NE(chosen.out.find("* 2. second\n"), std::string::npos) << chosen.out;
+  EXPECT_EQ(chosen.out.substr(chosen.out.size() - 7), "int c;\n") << chosen.out;
 }
 
 // Neither server offers pulled diagnostics, so the command waits for the publication; once
@@ -131,6 +207,8 @@ TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormatWithByteColumns) {
 TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
   const vexil_test::TempDirectory directory;
   { std::ofstream(directory / "latin.cpp") << "int caf\xE9 = 1;\n"; }
+  const std::string fine = directory / "fine.cpp";
+  { std::ofstream(fine) << "int x = 1;\n"; }
   struct Case {
     std::string arguments;
     int status;
@@ -149,6 +227,14 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
       {"lsp -- clangd --open " + (directory / "latin.cpp"), 1, "vexil: " + (directory / "latin.cpp") +
        ": not UTF-8 text (line 1, column 8)"},
       {"lsp -- clangd --hover main.cpp:0:1", 2, "vexil: LINE must be a positive number, not '0'. Try 'vexil lsp --help'\n"},
+      {"lsp --root=../python -- pylsp --semantic-tokens main.py", 1,
+       "vexil: semantic-tokens main.py: pylsp does not support textDocument/semanticTokens/full\n"},
+      {"lsp -- clangd --execute clangd.applyFix '{}'", 2,
+       "vexil: --execute: ARGUMENTS must be a JSON array, not '{}'. Try 'vexil lsp --help'\n"},
+      // Overlapping edits: nothing is written.
+      {"lsp --apply -- \"$FAKE\" 'result=textDocument/formatting:[{\"range\":" + Range(0, 0, 0, 3) +
+           ",\"newText\":\"a\"},{\"range\":" + Range(0, 2, 0, 4) + ",\"newText\":\"b\"}]' --format " + fine, 1,
+       "vexil: format " + fine + ": nothing written: Cannot edit " + fine + ": Overlapping edits at 0:0-0:3 and 0:2-0:4\n"},
       {"lsp --json=yes -- clangd --open main.cpp", 2, "vexil: option '--json' takes no value. Try 'vexil lsp --help'\n"},
       {"task --run x /tmp", 2, "vexil: task needs --ext. Try 'vexil task --help'\n"},
       {"frobnicate", 2, "vexil: unknown command 'frobnicate'. Try 'vexil --help'\n"},
@@ -160,6 +246,7 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
     EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << test.arguments << "\n" << run.err;
     EXPECT_LT(run.seconds, 30) << test.arguments;
   }
+  EXPECT_EQ(Slurp(fine), "int x = 1;\n");
   Result json = Vexil("lsp --json -- vexil-no-such-server --hover main.cpp:1:1");
   EXPECT_EQ(json.out.rfind(R"({"action":"start","failed":true,"error":"vexil-no-such-server did not start: )", 0), 0u)
       << json.out;

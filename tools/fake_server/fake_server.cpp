@@ -28,8 +28,8 @@
 // params.names, null when unset), "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
 // params: delay (ms), stderr, garbage (raw stdout text), notifications (count), stale
-// (ids answered first), ask (methods sent to the client, each answer awaited; a method
-// given as {"method", "params"} goes with those params), chatter
+// (ids answered first), ask (methods sent to the client, each answer awaited and returned
+// as "answers"; a method, or {"method", "params"} to send those params), chatter
 // (notifications sent after each asked method, before its answer is read), askSameId,
 // error {code, message, id: "same"|"null"|"none"|number}, unparsable, size (bytes of "data"
 // in the result), split (write the answer in pieces of this size), trickle (ms of one
@@ -216,20 +216,21 @@ bool Refused(const std::string& method) {
 // to the client and waits for its answer.
 std::vector<std::string> AskClient(const std::string& method, const rapidjson::Value& params,
                                    const std::string& requestId) {
-  std::vector<std::pair<std::string, std::string>> methods;  // with their params, when given
-  if (method == "initialize")
-    for (const std::string& asked : scripts.askedOnInitialize) methods.emplace_back(asked, "");
+  std::vector<std::pair<std::string, std::string>> asks;  // method, params ("" for the default)
+  if (method == "initialize") {
+    for (const std::string& asked : scripts.askedOnInitialize) asks.emplace_back(asked, "");
+  }
   if (params.HasMember("ask") && params["ask"].IsArray()) {
     for (const rapidjson::Value& asked : params["ask"].GetArray()) {
-      if (asked.IsString()) methods.emplace_back(asked.GetString(), "");
-      if (asked.IsObject() && asked.HasMember("params")) methods.emplace_back(StringParam(asked, "method"), Text(asked["params"]));
+      if (asked.IsString()) asks.emplace_back(asked.GetString(), "");
+      else asks.emplace_back(StringParam(asked, "method"), asked.HasMember("params") ? Text(asked["params"]) : "null");
     }
   }
   bool sameId = params.HasMember("askSameId") && params["askSameId"].IsTrue();
   std::vector<std::string> answers;
   int next = 0;
-  for (const auto& [asked, askedParams] : methods) {
-    const std::string id = sameId ? requestId : std::to_string(next++);
+  for (const auto& [asked, askedParams] : asks) {
+    std::string id = sameId ? requestId : std::to_string(next++);
     Send(askedParams.empty() ? Request(id, asked) : Request(id, asked, askedParams));
     SendNotifications(IntParam(params, "chatter"));
     answers.push_back(ReadAnswer());

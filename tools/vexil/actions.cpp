@@ -2,6 +2,7 @@
 // call of the connection, and the reply kept with the failure state the library reports.
 #include "actions.h"
 
+#include "actions_features.h"
 #include "columns.h"
 #include "vexil/client/uri.h"
 
@@ -32,7 +33,7 @@ const std::vector<ActionInfo> kActions = {
     {ActionKind::RangeFormat, "--range-format", Operand::Range, "textDocument/rangeFormatting", true,
      "formatting of the range, as a diff"},
     {ActionKind::Rename, "--rename", Operand::Rename, "textDocument/rename", true,
-     "the edits of a rename, as a diff (not applied)"},
+     "the edits of a rename, as a diff"},
     {ActionKind::Change, "--change", Operand::File, "textDocument/didChange", false, "send the file's current text"},
     {ActionKind::Save, "--save", Operand::File, "textDocument/didSave", false, "tell the server it was saved"},
     {ActionKind::Close, "--close", Operand::File, "textDocument/didClose", false, "close it"},
@@ -43,15 +44,24 @@ const std::vector<ActionInfo> kActions = {
     {ActionKind::Request, "--request", Operand::MethodParams, "", true,
      "any request; PARAMS a JSON object, the result printed as JSON"},
     {ActionKind::Notify, "--notify", Operand::MethodParams, "", false, "any notification"},
+    {ActionKind::CodeActions, "--code-actions", Operand::PositionOrRange, "textDocument/codeAction", true,
+     "quick fixes and refactorings there, each with its diff"},
+    {ActionKind::Highlight, "--highlight", Operand::Position, "textDocument/documentHighlight", true,
+     "the symbol's uses in the file, read or written"},
+    {ActionKind::Folding, "--folding", Operand::File, "textDocument/foldingRange", true, "the lines that fold"},
+    {ActionKind::SelectionRange, "--selection-range", Operand::Position, "textDocument/selectionRange", true,
+     "the ranges a selection grows through, innermost first"},
+    {ActionKind::SemanticTokens, "--semantic-tokens", Operand::File, "textDocument/semanticTokens/full", true,
+     "every token with its type and modifiers"},
+    {ActionKind::InlayHints, "--inlay-hints", Operand::File, "textDocument/inlayHint", true,
+     "the hints shown inside the text (types, parameter names)"},
+    {ActionKind::PrepareRename, "--prepare-rename", Operand::Position, "textDocument/prepareRename", true,
+     "whether a rename is possible there, and of what"},
+    {ActionKind::CallHierarchy, "--call-hierarchy", Operand::Position, "textDocument/prepareCallHierarchy", true,
+     "the function there, its callers and what it calls"},
+    {ActionKind::Execute, "--execute", Operand::CommandArguments, "workspace/executeCommand", true,
+     "run a server command; ARGUMENTS a JSON array or null"},
 };
-
-template <typename P>
-P Positioned(Session& session, const Action& action) {
-  P params;
-  params.textDocument.uri = session.Document(action.path);
-  params.position = ProtocolPosition(action.path, action.line, action.column);
-  return params;
-}
 
 std::vector<LSP::Location> Locations(Session& session, const Action& action) {
   auto params = Positioned<LSP::TextDocumentPositionParams>(session, action);
@@ -65,14 +75,6 @@ std::vector<LSP::Location> Locations(Session& session, const Action& action) {
   }
 }
 
-std::vector<FileEdits> Edits(const LSP::WorkspaceEdit& edit) {
-  std::vector<FileEdits> files;
-  for (const LSP::TextDocumentEdit& document : edit.documentChanges) {
-    files.push_back({UriToFile(document.textDocument.uri.c_str()), document.edits});
-  }
-  return files;
-}
-
 std::vector<FileEdits> Formatting(Session& session, const Action& action) {
   std::string uri = session.Document(action.path);
   std::vector<LSP::TextEdit> edits;
@@ -83,14 +85,15 @@ std::vector<FileEdits> Formatting(Session& session, const Action& action) {
   } else {
     LSP::DocumentRangeFormattingParams params;
     params.textDocument.uri = uri;
-    params.range = LSP::Range(ProtocolPosition(action.path, action.line, action.column),
-                              ProtocolPosition(action.path, action.endLine, action.endColumn));
+    params.range = LSP::Range(ProtocolPosition(TextOf(action.path), action.line, action.column),
+                              ProtocolPosition(TextOf(action.path), action.endLine, action.endColumn));
     edits = session.Server().TextDocument_RangeFormatting(&params);
   }
   return {{action.path, edits}};
 }
 
 void Ask(Session& session, const Action& action, Outcome& outcome) {
+  if (IsNewer(action.kind)) return AskFeature(session, action, outcome);
   xLanguageServer& server = session.Server();
   switch (action.kind) {
     case ActionKind::Open: session.Document(action.path); break;
@@ -136,7 +139,7 @@ void Ask(Session& session, const Action& action, Outcome& outcome) {
     case ActionKind::Rename: {
       auto params = Positioned<LSP::RenameParams>(session, action);
       params.newName = action.text;
-      outcome.edits = Edits(server.TextDocument_Rename(&params));
+      outcome.edits = FilesOf(server.TextDocument_Rename(&params));
       break;
     }
     default: outcome.locations = Locations(session, action); break;
@@ -167,6 +170,8 @@ const char* OperandForm(Operand operand) {
     case Operand::Rename: return "FILE:LINE:COL:NEWNAME";
     case Operand::None: return "";
     case Operand::MethodParams: return "METHOD PARAMS";
+    case Operand::PositionOrRange: return "FILE:LINE:COL[:L2:C2]";
+    case Operand::CommandArguments: return "COMMAND ARGUMENTS";
     default: return "QUERY";
   }
 }
@@ -174,7 +179,7 @@ const char* OperandForm(Operand operand) {
 std::string Describe(const Action& action) {
   std::string name = std::string(InfoOf(action.kind).option).substr(2);
   if (action.kind == ActionKind::WorkspaceSymbols || action.kind == ActionKind::Request ||
-      action.kind == ActionKind::Notify) {
+      action.kind == ActionKind::Notify || action.kind == ActionKind::Execute) {
     return name + " " + action.text;
   }
   if (action.kind == ActionKind::Capabilities) return name;
@@ -190,11 +195,33 @@ std::string MethodOf(const Action& action) {
                                                                                 : InfoOf(action.kind).method;
 }
 
+bool Writes(ActionKind kind) {
+  return kind == ActionKind::Format || kind == ActionKind::RangeFormat || kind == ActionKind::Rename ||
+         kind == ActionKind::CodeActions;
+}
+
+bool IsNewer(ActionKind kind) { return kind >= ActionKind::CodeActions; }
+
 Outcome Perform(Session& session, const Action& action) {
   Outcome outcome;
   session.Mark();
   Ask(session, action, outcome);
-  outcome.failed = session.Failed(MethodOf(action), outcome.why);
+  // An action of several requests judges each of them itself.
+  if (action.kind != ActionKind::CallHierarchy) outcome.failed = session.Failed(MethodOf(action), outcome.why);
+  if (!outcome.failed && session.Applies() && action.kind == ActionKind::CodeActions) {
+    ApplyCodeAction(session, outcome);
+  } else if (!outcome.failed && session.Applies() && Writes(action.kind)) {
+    outcome.failed = !WriteEdits(outcome.edits, outcome.why);
+    outcome.applied = !outcome.failed && HasEdits(outcome.edits);
+  }
+  bool written = false;
+  std::string failure;
+  outcome.requested = TakeRequestedEdits(written, failure);
+  outcome.applied = outcome.applied || written;
+  if (!failure.empty() && !outcome.failed) {
+    outcome.failed = true;
+    outcome.why = "the server asked for edits: " + failure;
+  }
   return outcome;
 }
 

@@ -9,25 +9,31 @@
 // - readable output starts with the action as Describe() names it, then its answer indented,
 //   "(none)" for an empty one; --json writes one object per line (see render.h);
 // - a failure is one reason in Outcome::why: printed, and the exit status becomes 1; a
-//   method the server does not offer reads "SERVER does not support METHOD".
+//   method the server does not offer reads "SERVER does not support METHOD";
+// - edits are shown as a diff and written only with --apply, all files or none.
 #pragma once
 
 #include <string>
 #include <vector>
 
+#include "apply.h"
 #include "session.h"
+#include "vexil/protocol/call_hierarchy.h"
+#include "vexil/protocol/document_features.h"
+#include "vexil/protocol/semantic_tokens.h"
 
 namespace cli {
 
 enum class ActionKind {
   Open, Hover, Definition, Declaration, TypeDefinition, Implementation, References, Completion,
   Signature, Symbols, WorkspaceSymbols, Format, RangeFormat, Rename, Change, Save, Close, Diagnostics,
-  Capabilities, Request, Notify
+  Capabilities, Request, Notify, CodeActions, Highlight, Folding, SelectionRange, SemanticTokens, InlayHints,
+  PrepareRename, CallHierarchy, Execute
 };
 
 // How an action's operand is written on the command line. A request takes two operands:
-// the method and its params as JSON text.
-enum class Operand { File, Position, Range, Rename, Query, None, MethodParams };
+// the method and its params as JSON text; a command to execute, its name and arguments.
+enum class Operand { File, Position, Range, Rename, Query, None, MethodParams, PositionOrRange, CommandArguments };
 
 struct ActionInfo {
   ActionKind kind;
@@ -50,10 +56,14 @@ struct Action {
   std::string params;  // a request's params as JSON text
 };
 
-// The edits the server proposes for one file.
-struct FileEdits {
-  std::string path;
-  std::vector<LSP::TextEdit> edits;
+// A function of a call hierarchy, its callers and what it calls; a server may offer only
+// one of the two.
+struct CallTree {
+  LSP::CallHierarchyItem item;
+  std::vector<LSP::CallHierarchyIncomingCall> incoming;
+  std::vector<LSP::CallHierarchyOutgoingCall> outgoing;
+  bool incomingOffered = true;
+  bool outgoingOffered = true;
 };
 
 struct Outcome {
@@ -65,7 +75,18 @@ struct Outcome {
   std::vector<FileEdits> edits;
   std::vector<LSP::Diagnostic> diagnostics;
   LSP::ServerCapabilities capabilities;
-  std::string json;  // the capabilities, or a request's result, as JSON text
+  std::vector<LSP::CodeAction> codeActions;
+  int chosen = -1;  // the code action applied, from 0
+  std::vector<LSP::DocumentHighlight> highlights;
+  std::vector<LSP::FoldingRange> folds;
+  std::vector<LSP::SelectionRange> selections;
+  std::vector<LSP::SemanticToken> tokens;
+  std::vector<LSP::InlayHint> hints;
+  LSP::PrepareRenameResult prepared;
+  std::vector<CallTree> calls;
+  std::string json;  // the capabilities, a request's or a command's result, as JSON text
+  std::vector<FileEdits> requested;  // edits the server asked for meanwhile ("workspace/applyEdit")
+  bool applied = false;  // whether the edits, or those asked for, were written to the files
   bool failed = false;
   std::string why;  // when failed
 };
@@ -80,7 +101,14 @@ std::string MethodOf(const Action& action);
 const char* OperandForm(Operand operand);
 // The action as a person would name it: "hover main.cpp:15:18".
 std::string Describe(const Action& action);
+// Whether --apply writes the edits the action proposes.
+bool Writes(ActionKind kind);
+// Whether the action is one of the newer requests (code actions and after), asked and
+// printed apart from the classic ones.
+bool IsNewer(ActionKind kind);
 
+// Performs the action. When the session applies edits, those it proposes are written to
+// the files (see apply.h); once its answer has been shown, AfterWriting tells the server.
 Outcome Perform(Session& session, const Action& action);
 
 }  // namespace cli

@@ -1,17 +1,20 @@
-// Column conversion for the command-line host. Its runs are short and its files few, so
-// every file it converts in is read once and kept.
+// Column conversion for the command-line host, through the library's position helpers.
+// Its runs are short and its files few, so every file it converts in is read once and kept.
 #include "columns.h"
 
 #include <algorithm>
+#include <climits>
 #include <map>
 #include <mutex>
-#include <vector>
 
 #include "session.h"
-#include "text_edits.h"
+#include "vexil/client/text_edits.h"
 
 namespace cli {
 namespace {
+
+std::mutex textsMutex;
+std::map<std::string, std::string> texts;  // by path
 
 // The length of the UTF-8 sequence led by `lead`; 0 for a byte that cannot lead one.
 std::size_t SequenceLength(unsigned char lead) {
@@ -32,66 +35,37 @@ std::size_t SequenceAt(const std::string& text, std::size_t at) {
   return length;
 }
 
-// Steps through `line` a character at a time, a malformed byte counting as one character.
-template <typename Visit>
-void EachCharacter(const std::string& line, Visit visit) {
-  for (std::size_t at = 0; at < line.size();) {
-    std::size_t length = std::max<std::size_t>(SequenceAt(line, at), 1);
-    // Characters beyond the basic plane take two units.
-    if (!visit(at, length == 4 ? 2 : 1)) return;
-    at += length;
-  }
-}
+}  // namespace
 
-const std::vector<std::string>& LinesOf(const std::string& path) {
-  static std::mutex mutex;
-  static std::map<std::string, std::vector<std::string>> files;
-  std::lock_guard<std::mutex> lock(mutex);
-  auto found = files.find(path);
-  if (found == files.end()) found = files.emplace(path, SplitLines(ReadText(path))).first;
+const std::string& TextOf(const std::string& path) {
+  std::lock_guard<std::mutex> lock(textsMutex);
+  auto found = texts.find(path);
+  if (found == texts.end()) found = texts.emplace(path, ReadText(path)).first;
+  // Map entries stay where they are until erased, and only Reread erases.
   return found->second;
 }
 
-}  // namespace
-
-std::size_t BytesOf(const std::string& line, int units) {
-  std::size_t bytes = 0;
-  int counted = 0;
-  EachCharacter(line, [&](std::size_t at, int width) {
-    if (counted >= units) return false;
-    counted += width;
-    bytes = std::min(line.size(), at + std::max<std::size_t>(SequenceAt(line, at), 1));
-    return true;
-  });
-  return bytes + static_cast<std::size_t>(std::max(units - counted, 0));
-}
-
-int UnitsOf(const std::string& line, std::size_t bytes) {
-  int units = 0;
-  std::size_t reached = 0;
-  EachCharacter(line, [&](std::size_t at, int width) {
-    if (at >= bytes) return false;
-    units += width;
-    reached = at + std::max<std::size_t>(SequenceAt(line, at), 1);
-    return true;
-  });
-  return units + static_cast<int>(bytes > reached ? bytes - reached : 0);
+void Reread(const std::string& path) {
+  std::lock_guard<std::mutex> lock(textsMutex);
+  texts.erase(path);
 }
 
 std::string LineOf(const std::string& path, int line) {
-  const std::vector<std::string>& lines = LinesOf(path);
-  if (line < 0 || static_cast<std::size_t>(line) >= lines.size()) return "";
-  std::string text = lines[static_cast<std::size_t>(line)];
-  if (!text.empty() && text.back() == '\r') text.pop_back();
-  return text;
+  const std::string& text = TextOf(path);
+  std::size_t start = LSP::PositionToOffset(text, LSP::Position(line, 0));
+  std::size_t end = LSP::PositionToOffset(text, LSP::Position(line, INT_MAX));
+  return start < end ? text.substr(start, end - start) : "";
 }
 
-LSP::Position ProtocolPosition(const std::string& path, int line, int column) {
-  return LSP::Position(line - 1, UnitsOf(LineOf(path, line - 1), static_cast<std::size_t>(column - 1)));
+LSP::Position ProtocolPosition(const std::string& text, int line, int column) {
+  std::size_t start = LSP::PositionToOffset(text, LSP::Position(line - 1, 0));
+  std::size_t end = LSP::PositionToOffset(text, LSP::Position(line - 1, INT_MAX));
+  return LSP::OffsetToPosition(text, std::min(start + static_cast<std::size_t>(column - 1), end));
 }
 
-int ByteColumn(const std::string& path, const LSP::Position& position) {
-  return static_cast<int>(BytesOf(LineOf(path, position.line), position.character)) + 1;
+int ByteColumn(const std::string& text, const LSP::Position& position) {
+  std::size_t start = LSP::PositionToOffset(text, LSP::Position(position.line, 0));
+  return static_cast<int>(LSP::PositionToOffset(text, position) - start) + 1;
 }
 
 std::string NotUtf8At(const std::string& text) {

@@ -82,6 +82,10 @@ std::string LspHelp() {
       "  --progress        announce work-done progress, and show the server's on stderr\n"
       "  --watch           after the actions (none needed), tell the server about files changed\n"
       "                    under the root and print --diagnostics again as they change, until Ctrl-C\n"
+      "  --apply[=CHOICE]  write the edits of renames, formatting and code actions to the files,\n"
+      "                    and those the server asks for (without it they are only shown); a\n"
+      "                    code action is the preferred or only one, or CHOICE: its number or\n"
+      "                    words of its title\n"
       "  --help            show this help\n"
       "\n"
       "Actions (lines and columns count from 1, columns in bytes):\n";
@@ -130,6 +134,10 @@ int RunLsp(const Arguments& arguments) {
       std::cerr << "vexil: " << Describe(action) << ": " << outcome.why << "\n";
     } else if (action.kind == ActionKind::Rename && !outcome.edits.empty()) {
       NoteOpenOnly(session, outcome);
+    }
+    if (outcome.applied) {
+      AfterWriting(session, outcome.edits);
+      AfterWriting(session, outcome.requested);
     }
   }
   if (Interrupted()) return 128 + Interrupted();

@@ -24,6 +24,27 @@ std::vector<std::string> SplitFromRight(const std::string& text, std::size_t cou
   return pieces;
 }
 
+// Whether `text` ends in `count` numbers after colons, with something before them.
+bool EndsInNumbers(const std::string& text, std::size_t count) {
+  std::size_t end = text.size();
+  for (std::size_t i = 0; i < count; ++i) {
+    std::size_t colon = text.rfind(':', end - 1);
+    if (colon == std::string::npos || colon == 0 || colon + 1 == end) return false;
+    if (text.find_first_not_of("0123456789", colon + 1) < end) return false;
+    end = colon;
+  }
+  return true;
+}
+
+void ReadRange(const std::string& text, Action& action) {
+  std::vector<std::string> pieces = SplitFromRight(text, 4, "FILE:L1:C1:L2:C2");
+  action.file = pieces[0];
+  action.line = PositiveNumber(pieces[1], "L1");
+  action.column = PositiveNumber(pieces[2], "C1");
+  action.endLine = PositiveNumber(pieces[3], "L2");
+  action.endColumn = PositiveNumber(pieces[4], "C2");
+}
+
 void ReadPosition(const std::string& text, Action& action) {
   std::vector<std::string> pieces = SplitFromRight(text, 2, "FILE:LINE:COL");
   action.file = pieces[0];
@@ -45,39 +66,42 @@ void ReadOperand(const std::string& text, Operand operand, Action& action) {
       ReadPosition(text.substr(0, colon), action);
       break;
     }
-    case Operand::Range: {
-      std::vector<std::string> pieces = SplitFromRight(text, 4, "FILE:L1:C1:L2:C2");
-      action.file = pieces[0];
-      action.line = PositiveNumber(pieces[1], "L1");
-      action.column = PositiveNumber(pieces[2], "C1");
-      action.endLine = PositiveNumber(pieces[3], "L2");
-      action.endColumn = PositiveNumber(pieces[4], "C2");
-      break;
-    }
+    case Operand::Range: ReadRange(text, action); break;
+    // A file name may end in ":12:3" itself only when the position follows it.
+    case Operand::PositionOrRange: EndsInNumbers(text, 4) ? ReadRange(text, action) : ReadPosition(text, action); break;
     case Operand::None:
-    case Operand::MethodParams: break;  // read by ReadOperands
+    case Operand::MethodParams:
+    case Operand::CommandArguments: break;  // read by ReadOperands
   }
 }
 
-// A request's params: checked here, so that a typing error costs no server launch.
-std::string JsonParams(const std::string& option, const std::string& text) {
+// A request's params (an object) or a command's arguments (an array): checked here, so that
+// a typing error costs no server launch.
+std::string JsonOperand(const std::string& option, const std::string& text, bool array) {
   LSP::xReader reader;
+  const std::string name = array ? "ARGUMENTS" : "PARAMS";
   if (text.empty() || text == "null") return text;
   if (!reader.Parse(text)) {
     std::string why = reader.Error();
-    throw UsageError(option + ": PARAMS is not JSON: " + why.substr(0, why.find('\n')));
+    throw UsageError(option + ": " + name + " is not JSON: " + why.substr(0, why.find('\n')));
   }
-  if (!reader.Root().IsObject()) throw UsageError(option + ": PARAMS must be a JSON object, not '" + text + "'");
+  if (array ? !reader.Root().IsArray() : !reader.Root().IsObject()) {
+    throw UsageError(option + ": " + name + " must be a JSON " + (array ? "array" : "object") + ", not '" + text + "'");
+  }
   return text;
 }
 
 // Reads the operands of the action at hand.
 void ReadOperands(OptionReader& reader, const ActionInfo& info, Action& action) {
   if (info.operand == Operand::None) return reader.Flag();
-  if (info.operand != Operand::MethodParams) return ReadOperand(reader.Value(), info.operand, action);
+  const bool array = info.operand == Operand::CommandArguments;
+  if (info.operand != Operand::MethodParams && !array) return ReadOperand(reader.Value(), info.operand, action);
   action.text = reader.Value();
-  if (reader.Done()) throw UsageError(std::string(info.option) + " takes METHOD and PARAMS (e.g. {} or null)");
-  action.params = JsonParams(info.option, reader.Take());
+  if (reader.Done()) {
+    throw UsageError(std::string(info.option) + (array ? " takes COMMAND and ARGUMENTS (e.g. [] or null)"
+                                                       : " takes METHOD and PARAMS (e.g. {} or null)"));
+  }
+  action.params = JsonOperand(info.option, reader.Take(), array);
 }
 
 // "NAME=VALUE" of --env.
@@ -92,6 +116,13 @@ LSP::TraceLevel TraceLevelOf(const std::string& text) {
   if (text == "messages") return LSP::TraceLevel::Messages;
   if (text == "verbose") return LSP::TraceLevel::Verbose;
   throw UsageError("--trace takes off, messages or verbose, not '" + text + "'");
+}
+
+// "--apply", or "--apply=CHOICE" naming the code action to take.
+void ReadApply(OptionReader& reader, SessionOptions& session) {
+  session.apply = true;
+  if (reader.Current().find('=') == std::string::npos) return reader.Flag();
+  session.choice = reader.Value();
 }
 
 const ActionInfo* ActionAt(const OptionReader& reader) {
@@ -109,6 +140,7 @@ void ReadOptions(OptionReader& reader, LspOptions& options) {
     else if (reader.Is("--env")) options.session.environment.push_back(Variable(reader.Value()));
     else if (reader.Is("--progress")) reader.Flag(), options.session.progress = true;
     else if (reader.Is("--watch")) reader.Flag(), options.session.watch = true;
+    else if (reader.Is("--apply")) ReadApply(reader, options.session);
     else if (ActionAt(reader)) throw UsageError(reader.Current() + " is an action: it follows '-- SERVER [ARG]...'");
     else reader.Unknown();
   }

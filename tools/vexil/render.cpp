@@ -6,6 +6,7 @@
 #include <filesystem>
 
 #include "columns.h"
+#include "render_features.h"
 #include "text_edits.h"
 #include "vexil/client/text_edits.h"
 #include "vexil/client/uri.h"
@@ -18,12 +19,6 @@ std::string Relative(const std::string& path) {
   std::filesystem::path relative = std::filesystem::relative(path, std::filesystem::current_path(error), error);
   if (error || relative.empty() || relative.string().rfind("..", 0) == 0) return path;
   return relative.string();
-}
-
-std::string SourceLine(const std::string& path, int line) {
-  std::string text = LineOf(path, line);
-  text.erase(0, text.find_first_not_of(" \t"));
-  return text;
 }
 
 void PrintLocations(std::ostream& out, const std::vector<LSP::Location>& locations) {
@@ -72,18 +67,67 @@ void PrintDiagnostics(std::ostream& out, const std::string& path, const std::vec
   }
 }
 
+// The answer of one of the classic requests.
+void PrintAnswer(std::ostream& out, const Action& action, const Outcome& outcome) {
+  switch (action.kind) {
+    case ActionKind::Hover: {
+      std::string text = HoverText(outcome.hover);
+      out << (text.empty() ? "  (none)" : text) << "\n";
+      break;
+    }
+    case ActionKind::Completion:
+      if (outcome.completion.items.empty()) out << "  (none)\n";
+      for (const LSP::CompletionItem& item : outcome.completion.items) {
+        // clangd pads labels with a blank where an include marker may go.
+        out << "  " << item.label.substr(std::min(item.label.find_first_not_of(' '), item.label.size()))
+            << (item.detail.empty() ? "" : "  : " + item.detail) << "\n";
+      }
+      break;
+    case ActionKind::Signature: PrintSignature(out, outcome.signature); break;
+    case ActionKind::Symbols:
+    case ActionKind::WorkspaceSymbols: PrintSymbols(out, outcome.symbols, 0); break;
+    case ActionKind::Format:
+    case ActionKind::RangeFormat:
+    case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
+    case ActionKind::Diagnostics: PrintDiagnostics(out, action.path, outcome.diagnostics); break;
+    case ActionKind::Capabilities: PrintCapabilities(out, outcome); break;
+    case ActionKind::Request: PrintRequestResult(out, outcome); break;
+    default: PrintLocations(out, outcome.locations); break;
+  }
+}
+
+// The files the edits went to, each named once.
+void PrintWritten(std::ostream& out, const Outcome& outcome) {
+  std::vector<std::string> paths;
+  for (const std::vector<FileEdits>* files : {&outcome.edits, &outcome.requested}) {
+    for (const FileEdits& file : *files) {
+      std::string path = Relative(file.path);
+      if (std::find(paths.begin(), paths.end(), path) == paths.end()) paths.push_back(path);
+    }
+  }
+  out << "  written:";
+  for (const std::string& path : paths) out << " " << path;
+  out << "\n";
+}
+
+}  // namespace
+
+std::string SourceLine(const std::string& path, int line) {
+  std::string text = LineOf(path, line);
+  text.erase(0, text.find_first_not_of(" \t"));
+  return text;
+}
+
 void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files) {
   std::string diff;
   for (const FileEdits& file : files) diff += EditsAsDiff(file);
   out << (diff.empty() ? "  (no changes)\n" : diff);
 }
 
-}  // namespace
-
 std::string Where(const LSP::Location& location) {
   std::string path = UriToFile(location.uri.c_str());
   return Relative(path) + ":" + std::to_string(location.range.start.line + 1) + ":" +
-         std::to_string(ByteColumn(path, location.range.start));
+         std::to_string(ByteColumn(TextOf(path), location.range.start));
 }
 
 const char* SymbolKindName(int kind) {
@@ -115,7 +159,7 @@ std::string HoverText(const LSP::Hover& hover) {
 }
 
 std::string EditsAsDiff(const FileEdits& file) {
-  const std::string before = ReadText(file.path);
+  const std::string& before = TextOf(file.path);
   std::string after = before;
   std::string error;
   if (!LSP::ApplyTextEdits(after, file.edits, error)) return "  " + Relative(file.path) + ": " + error + "\n";
@@ -125,31 +169,13 @@ std::string EditsAsDiff(const FileEdits& file) {
 void PrintReadable(std::ostream& out, const Action& action, const Outcome& outcome) {
   if (!InfoOf(action.kind).query) return;
   out << Describe(action) << "\n";
-  switch (action.kind) {
-    case ActionKind::Hover: {
-      std::string text = HoverText(outcome.hover);
-      out << (text.empty() ? "  (none)" : text) << "\n";
-      break;
-    }
-    case ActionKind::Completion:
-      if (outcome.completion.items.empty()) out << "  (none)\n";
-      for (const LSP::CompletionItem& item : outcome.completion.items) {
-        // clangd pads labels with a blank where an include marker may go.
-        out << "  " << item.label.substr(std::min(item.label.find_first_not_of(' '), item.label.size()))
-            << (item.detail.empty() ? "" : "  : " + item.detail) << "\n";
-      }
-      break;
-    case ActionKind::Signature: PrintSignature(out, outcome.signature); break;
-    case ActionKind::Symbols:
-    case ActionKind::WorkspaceSymbols: PrintSymbols(out, outcome.symbols, 0); break;
-    case ActionKind::Format:
-    case ActionKind::RangeFormat:
-    case ActionKind::Rename: PrintEdits(out, outcome.edits); break;
-    case ActionKind::Diagnostics: PrintDiagnostics(out, action.path, outcome.diagnostics); break;
-    case ActionKind::Capabilities: PrintCapabilities(out, outcome); break;
-    case ActionKind::Request: PrintRequestResult(out, outcome); break;
-    default: PrintLocations(out, outcome.locations); break;
+  if (IsNewer(action.kind)) PrintFeature(out, action, outcome);
+  else PrintAnswer(out, action, outcome);
+  if (!outcome.requested.empty()) {
+    out << "  the server asked for edits:\n";
+    PrintEdits(out, outcome.requested);
   }
+  if (outcome.applied) PrintWritten(out, outcome);
 }
 
 }  // namespace cli

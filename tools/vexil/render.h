@@ -39,5 +39,9 @@ const char* SeverityName(int severity);
 std::string HoverText(const LSP::Hover& hover);
 // The text of `path` after the edits, as a unified diff against the file.
 std::string EditsAsDiff(const FileEdits& file);
+// The diffs of the edits of every file; "(no changes)" when there are none.
+void PrintEdits(std::ostream& out, const std::vector<FileEdits>& files);
+// Line `line` (from 0) of the file at `path`, without its indentation.
+std::string SourceLine(const std::string& path, int line);
 
 }  // namespace cli

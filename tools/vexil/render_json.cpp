@@ -3,6 +3,7 @@
 #include "render.h"
 
 #include "columns.h"
+#include "render_features.h"
 #include "vexil/client/uri.h"
 #include "vexil/json/json.h"
 
@@ -12,14 +13,7 @@ namespace {
 void Point(LSP::xWriter& writer, const char* line, const char* column, const std::string& path,
            const LSP::Position& position) {
   writer.Int(line, position.line + 1);
-  writer.Int(column, ByteColumn(path, position));
-}
-
-// The path and the range in it.
-void Span(LSP::xWriter& writer, const std::string& path, const LSP::Range& range) {
-  writer.RequiredString("path", path);
-  Point(writer, "line", "column", path, range.start);
-  Point(writer, "endLine", "endColumn", path, range.end);
+  writer.Int(column, ByteColumn(TextOf(path), position));
 }
 
 void Locations(LSP::xWriter& writer, const std::vector<LSP::Location>& locations) {
@@ -42,19 +36,6 @@ void Symbols(LSP::xWriter& writer, const char* name, const std::vector<LSP::Symb
     Span(writer, UriToFile(symbol.location.uri.c_str()), symbol.location.range);
     if (!symbol.children.empty()) Symbols(writer, "children", symbol.children);
     writer.EndObject();
-  }
-  writer.EndArray();
-}
-
-void Edits(LSP::xWriter& writer, const std::vector<FileEdits>& files) {
-  writer.StartArray("result");
-  for (const FileEdits& file : files) {
-    for (const LSP::TextEdit& edit : file.edits) {
-      writer.StartObject();
-      Span(writer, file.path, edit.range);
-      writer.RequiredString("newText", edit.newText);
-      writer.EndObject();
-    }
   }
   writer.EndArray();
 }
@@ -102,13 +83,8 @@ void Diagnostics(LSP::xWriter& writer, const std::string& path, const std::vecto
   writer.EndArray();
 }
 
-// JSON text as it came, under "result"; null when there is none.
-void RawResult(LSP::xWriter& writer, const std::string& json) {
-  LSP::xReader reader;
-  if (reader.Parse(json.empty() ? "null" : json)) writer.Raw("result", reader.Root().Value());
-}
-
 void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) {
+  if (IsNewer(action.kind)) return FeatureResult(writer, action, outcome);
   switch (action.kind) {
     case ActionKind::Hover: writer.RequiredString("result", HoverText(outcome.hover)); break;
     case ActionKind::Completion: Completion(writer, outcome.completion); break;
@@ -117,7 +93,7 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
     case ActionKind::WorkspaceSymbols: Symbols(writer, "result", outcome.symbols); break;
     case ActionKind::Format:
     case ActionKind::RangeFormat:
-    case ActionKind::Rename: Edits(writer, outcome.edits); break;
+    case ActionKind::Rename: Edits(writer, "result", outcome.edits); break;
     case ActionKind::Diagnostics: Diagnostics(writer, action.path, outcome.diagnostics); break;
     case ActionKind::Capabilities:
     case ActionKind::Request: RawResult(writer, outcome.json); break;
@@ -126,6 +102,31 @@ void Result(LSP::xWriter& writer, const Action& action, const Outcome& outcome) 
 }
 
 }  // namespace
+
+// JSON text as it came, under "result"; null when there is none.
+void RawResult(LSP::xWriter& writer, const std::string& json) {
+  LSP::xReader reader;
+  if (reader.Parse(json.empty() ? "null" : json)) writer.Raw("result", reader.Root().Value());
+}
+
+void Span(LSP::xWriter& writer, const std::string& path, const LSP::Range& range) {
+  writer.RequiredString("path", path);
+  Point(writer, "line", "column", path, range.start);
+  Point(writer, "endLine", "endColumn", path, range.end);
+}
+
+void Edits(LSP::xWriter& writer, const char* name, const std::vector<FileEdits>& files) {
+  writer.StartArray(name);
+  for (const FileEdits& file : files) {
+    for (const LSP::TextEdit& edit : file.edits) {
+      writer.StartObject();
+      Span(writer, file.path, edit.range);
+      writer.RequiredString("newText", edit.newText);
+      writer.EndObject();
+    }
+  }
+  writer.EndArray();
+}
 
 void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome) {
   if (!InfoOf(action.kind).query && !outcome.failed) return;
@@ -141,6 +142,8 @@ void PrintJson(std::ostream& out, const Action& action, const Outcome& outcome) 
   writer.Bool("failed", outcome.failed);
   if (outcome.failed) writer.RequiredString("error", outcome.why);
   else Result(writer, action, outcome);
+  if (!outcome.requested.empty()) Edits(writer, "requested", outcome.requested);
+  if (outcome.applied) writer.Bool("applied", true);
   writer.EndObject();
   out << writer.GetString() << "\n";
 }

@@ -7,6 +7,7 @@
 #include <mutex>
 #include <string>
 
+#include "apply.h"
 #include "host_process.h"
 #include "session.h"
 #include "vexil/json/json.h"
@@ -87,9 +88,10 @@ void ShowMessage(const std::string& program, const LSP::xObject& params) {
 
 void ShowServerMessage(void* user, const char* method, const char* idJson, const char* paramsJson) {
   Session& session = *static_cast<Session*>(user);
-  // Only a progress token is asked for (with --progress): granted.
-  if (idJson) session.Server().Reply(idJson, "null");
   std::string name = method;
+  if (idJson && name == "workspace/applyEdit") return AnswerApplyEdit(session.Server(), session.Applies(), idJson, paramsJson);
+  // The other request routed here is a progress token's (with --progress): granted.
+  if (idJson) session.Server().Reply(idJson, "null");
   LSP::xReader reader;
   if (!reader.Parse(paramsJson) || !reader.Root().IsObject()) return;
   try {

@@ -6,7 +6,7 @@
 namespace cli {
 
 // The connection's message handler; `user` is the Session, whose server it answers when
-// the server asks to create a progress token.
+// the server asks to create a progress token or to apply an edit.
 void ShowServerMessage(void* user, const char* method, const char* idJson, const char* paramsJson);
 // Clears a progress line left on the terminal.
 void EndProgressLine();

@@ -111,6 +111,8 @@ Session::Session(const SessionOptions& options) : options_(options), server_(nul
   for (const auto& [name, value] : options.environment) server_->SetEnvironment(name.c_str(), value.c_str());
   if (options.progress) server_->Enable("progress");
   if (options.watch) server_->Enable("watchedFiles");
+  // The newer requests, and the server's requests to apply edits, which the handler answers.
+  server_->Enable("features");
   server_->SetMessageHandler(&ShowServerMessage, this);
 }
 
@@ -212,11 +214,13 @@ void Session::Sent(OpenDocument& document) {
 }
 
 // Each didOpen and didChange brings one publication; so once as many have come since this
-// document's last send as there were sends from it on, its own is among them.
+// document's last send as there were sends from it on, its own is among them. Diagnostics
+// stored for a document that was changed (by edits written) may be those of the old text.
 bool Session::Published(const std::string& uri) {
   const OpenDocument& document = documents_[uri];
   int arrived = server_->DiagnosticsVersion() - document.diagnosticsMark;
-  return !server_->TextDocument_Diagnostics(uri.c_str()).empty() || arrived > sends_ - document.sendsMark;
+  bool stored = document.version == 1 && !server_->TextDocument_Diagnostics(uri.c_str()).empty();
+  return stored || arrived > sends_ - document.sendsMark;
 }
 
 std::vector<LSP::Diagnostic> Session::Diagnostics(const std::string& path) {
@@ -239,13 +243,15 @@ std::string Session::LanguageOf(const std::string& path) const {
 
 void Session::Mark() { errorMark_ = TraceErrors(); }
 
+// An error answer that leaves no error state is the server's "method not found".
+bool Session::Unsupported() { return !server_->HaveErrors() && *server_->ErrorMessage(); }
+
 bool Session::Failed(const std::string& method, std::string& why) {
   if (server_->HaveErrors()) {
     why = server_->ErrorMessage();
     return true;
   }
-  // An error answer that leaves no error state is the server's "method not found".
-  if (*server_->ErrorMessage()) {
+  if (Unsupported()) {
     why = Program() + " does not support " + method;
     return true;
   }

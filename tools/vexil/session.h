@@ -22,6 +22,8 @@ struct SessionOptions {
   std::vector<std::pair<std::string, std::string>> environment;  // the server's, over ours
   bool progress = false;  // announce work-done progress, and show it
   bool watch = false;     // tell the server about files changed under the root
+  bool apply = false;     // write proposed edits, and those the server asks for, to the files
+  std::string choice;     // the code action applied: its number from 1, or words of its title
 };
 
 class Session {
@@ -39,6 +41,10 @@ class Session {
   xLanguageServer& Server() { return *server_; }
   // The server's program as people name it: "clangd".
   std::string Program() const;
+  // Whether edits are written to the files (--apply), or only shown.
+  bool Applies() const { return options_.apply; }
+  // Which code action --apply takes; "" for the preferred or only one.
+  const std::string& Choice() const { return options_.choice; }
 
   // The URI of the absolute `path`, opened first (didOpen with its text) unless it is open.
   std::string Document(const std::string& path);
@@ -58,6 +64,8 @@ class Session {
   // the mark, or the server's end.
   void Mark();
   bool Failed(const std::string& method, std::string& why);
+  // Whether the server answered the last request as a method it does not offer.
+  bool Unsupported();
 
  private:
   // What was sent last about a document: its version, and the diagnostics version and the

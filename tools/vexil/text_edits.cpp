@@ -5,7 +5,6 @@
 #include <algorithm>
 #include <sstream>
 
-#include "columns.h"
 
 namespace cli {
 namespace {
