@@ -30,7 +30,12 @@ class LanguageServer final : public xLanguageServer {
   bool HaveErrors() override { return server.HaveErrors(); }
   int Id() override { return server.Id(); }
   bool Initialize(const xServerInitialise& init) override;
-  bool IsRunning() override { return server.IsRunning(); }
+  // Also traces what the library's threads left for the host: a host that only polls
+  // (a watching session) still sees those lines as they come.
+  bool IsRunning() override {
+    server.TraceDeferred();
+    return server.IsRunning();
+  }
   bool Start(const xServerInitialise& init) override;
   bool Shutdown() override;
 

@@ -113,6 +113,8 @@ class xServer {
   bool SendFromAnyThread(const std::string& body);
   // Traces `text` under "Error" on the host's thread, at its next call.
   void ErrorLater(const std::string& text) { deferred_.Error("%s", text.c_str()); }
+  // Traces, on the host's thread, the lines the library's threads have left for it.
+  void TraceDeferred() { deferred_.Deliver(); }
 
   // Large texts to a busy server need time to go through.
   static constexpr int kMinimumWriteMs = 5000;
