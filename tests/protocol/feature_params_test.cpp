@@ -29,15 +29,6 @@ T AtPosition(int line, int character) {
 
 std::string Json(LSP::JsonObject& value) { return LSP::ToJsonText(value); }
 
-TEST(FeatureParams, WorkspaceSymbolQueryIsWrittenEvenWhenEmpty) {
-  LSP::WorkspaceSymbolParams params;
-  EXPECT_EQ(Json(params), R"({"query":""})");
-  params.query = "Rect";
-  LSP::RequestMessage request("workspace/symbol", &params);
-  request.id = 5;
-  EXPECT_EQ(request.ToJSON(), R"({"jsonrpc":"2.0","id":5,"method":"workspace/symbol","params":{"query":"Rect"}})");
-}
-
 TEST(FeatureParams, CodeActionContextGivesDiagnosticsBackInTheProtocolsShape) {
   // One as published (kept verbatim, "data" and all), one built by the host.
   LSP::PublishDiagnosticsParams published;
@@ -108,6 +99,7 @@ TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
   callsBuilt.item.name = "f";
   callsBuilt.item.kind = 12;
   callsBuilt.item.uri = "file:///a.c";
+  LSP::WorkspaceSymbolParams query;  // written even when empty
   LSP::ApplyWorkspaceEditResult answer;
   answer.failureReason = "read-only";
   const std::string document = std::string("{") + kDocument;
@@ -138,6 +130,7 @@ TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
                     R"("end":{"line":0,"character":0}},"selectionRange":{"start":{"line":0,"character":0},)"
                     R"("end":{"line":0,"character":0}}}})"},
       {&answer, R"({"applied":false,"failureReason":"read-only"})"},
+      {&query, R"({"query":""})"},
   };
   for (const auto& [params, expected] : rows) EXPECT_EQ(Json(*params), expected) << expected;
 
