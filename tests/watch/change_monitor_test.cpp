@@ -39,6 +39,55 @@ TEST(ChangeMonitor, ReportsFilesAndDirectoriesCreatedRemovedAndRenamed) {
   EXPECT_TRUE(probe.WatchErrors().empty());
 }
 
+TEST(ChangeMonitor, ChangesOfOneReadAreOneBatchAndEachRenameABatchOfItsOwn) {
+  TempDir root;
+  for (int i = 0; i < 10; ++i) Touch(root / ("f" + std::to_string(i)));
+  Probe probe;
+  WorkerGate gate;
+  ChangeMonitor monitor(gate.Wrap(probe.Handlers()));
+  ASSERT_NO_FATAL_FAILURE(gate.HoldIn(monitor, root, 7));
+
+  // Made while the worker is held, so that one read takes them all: a receiver that pairs
+  // the halves of a batch by name order must never see two renames in one batch.
+  Touch(root / "a.txt");
+  fs::remove(root / "a.txt");
+  fs::create_directory(root / "sub");
+  for (int i = 0; i < 10; ++i) fs::rename(root / ("f" + std::to_string(i)), root / ("g" + std::to_string(9 - i)));
+  gate.Release();
+  const std::vector<Change> together = {{"a.txt", kAdded}, {"a.txt", kRemoved}, {DirectoryName("sub"), kAdded}};
+  ASSERT_TRUE(probe.WaitForAll(7, together));
+  EXPECT_TRUE(probe.SawInOneBatch(7, together));
+  for (int i = 0; i < 10; ++i) {
+    const std::string from = "f" + std::to_string(i), to = "g" + std::to_string(9 - i);
+    ASSERT_TRUE(probe.WaitFor(7, {to, kNew}));
+    EXPECT_TRUE(probe.SawBatch(7, {{from, kOld}, {to, kNew}})) << from;
+  }
+}
+
+TEST(ChangeMonitor, OverflowSilencesOnlyThatWatchAndSaysSo) {
+  const std::size_t burst = OverflowingBurst();
+  if (burst == 0) GTEST_SKIP() << "the queue is too long to fill here";
+  TempDir root, fence;
+  Probe probe;
+  WorkerGate gate;
+  ChangeMonitor monitor(gate.Wrap(probe.Handlers()));
+  ASSERT_NO_FATAL_FAILURE(gate.HoldIn(monitor, root, 1));
+
+  for (std::size_t i = 0; i < burst; ++i) Touch(root / ("file-with-a-longer-name-" + std::to_string(i)));
+  gate.Release();
+  // A loss the backend does not report leaves both the names and the error missing.
+  ASSERT_TRUE(probe.WaitUntilSettled(1, burst + 1));
+  if (probe.WatchErrors().empty()) GTEST_SKIP() << "this system delivered the whole burst instead of reporting the loss";
+
+  ASSERT_TRUE(monitor.AddWatch(fence.Path().string(), 2));
+  const std::size_t before = probe.EventsFor(1);
+  Touch(root / "after");
+  Fence(probe, fence, 2, "fence");
+  EXPECT_EQ(probe.EventsFor(1), before);
+  EXPECT_EQ(probe.WatchErrors(), std::vector<std::int64_t>{1});
+  EXPECT_TRUE(probe.ErrorTexts().empty());
+}
+
 TEST(ChangeMonitor, RefusesARootThatIsAFileOrMissing) {
   TempDir dir;
   Touch(dir / "plain.txt");

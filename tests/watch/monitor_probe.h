@@ -150,6 +150,10 @@ class WorkerGate {
   bool open_ = true;
 };
 
+// Changes that overflow what the platform holds for one watch until it is read; 0 when
+// that is more than a test can make.
+std::size_t OverflowingBurst();
+
 // A change in another watch is queued behind everything before it, and a read's batches
 // go out in id order: once the fence (with the highest id) has arrived, anything the other
 // watches were going to report has been reported too.
