@@ -16,12 +16,9 @@ namespace {
 
 using namespace watchtest;
 
-TEST(ChangeMonitor, ReportsFilesAndDirectoriesCreatedRemovedAndRenamed) {
-  TempDir root;
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
+TEST_F(ChangeMonitorTest, ReportsFilesAndDirectoriesCreatedRemovedAndRenamed) {
   ASSERT_EQ(monitor.ErrorText(), "");
-  ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 7));
+  ASSERT_TRUE(Watch(7));
 
   Touch(root / "a.txt");
   EXPECT_TRUE(probe.WaitFor(7, {"a.txt", kAdded}));
@@ -39,12 +36,8 @@ TEST(ChangeMonitor, ReportsFilesAndDirectoriesCreatedRemovedAndRenamed) {
   EXPECT_TRUE(probe.WatchErrors().empty());
 }
 
-TEST(ChangeMonitor, ChangesOfOneReadAreOneBatchAndEachRenameABatchOfItsOwn) {
-  TempDir root;
+TEST_F(ChangeMonitorTest, ChangesOfOneReadAreOneBatchAndEachRenameABatchOfItsOwn) {
   for (int i = 0; i < 10; ++i) Touch(root / ("f" + std::to_string(i)));
-  Probe probe;
-  WorkerGate gate;
-  ChangeMonitor monitor(gate.Wrap(probe.Handlers()));
   ASSERT_NO_FATAL_FAILURE(gate.HoldIn(monitor, root, 7));
 
   // Made while the worker is held, so that one read takes them all: a receiver that pairs
@@ -64,13 +57,9 @@ TEST(ChangeMonitor, ChangesOfOneReadAreOneBatchAndEachRenameABatchOfItsOwn) {
   }
 }
 
-TEST(ChangeMonitor, OverflowSilencesOnlyThatWatchAndSaysSo) {
+TEST_F(ChangeMonitorTest, OverflowSilencesOnlyThatWatchAndSaysSo) {
   const std::size_t burst = OverflowingBurst();
   if (burst == 0) GTEST_SKIP() << "the queue is too long to fill here";
-  TempDir root, fence;
-  Probe probe;
-  WorkerGate gate;
-  ChangeMonitor monitor(gate.Wrap(probe.Handlers()));
   ASSERT_NO_FATAL_FAILURE(gate.HoldIn(monitor, root, 1));
 
   for (std::size_t i = 0; i < burst; ++i) Touch(root / ("file-with-a-longer-name-" + std::to_string(i)));
@@ -88,20 +77,15 @@ TEST(ChangeMonitor, OverflowSilencesOnlyThatWatchAndSaysSo) {
   EXPECT_TRUE(probe.ErrorTexts().empty());
 }
 
-TEST(ChangeMonitor, RefusesARootThatIsAFileOrMissing) {
-  TempDir dir;
-  Touch(dir / "plain.txt");
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
-
-  EXPECT_FALSE(monitor.AddWatch(dir / "plain.txt", 1));
-  EXPECT_FALSE(monitor.AddWatch(dir / "missing", 2));
+TEST_F(ChangeMonitorTest, RefusesARootThatIsAFileOrMissing) {
+  Touch(root / "plain.txt");
+  EXPECT_FALSE(monitor.AddWatch(root / "plain.txt", 1));
+  EXPECT_FALSE(monitor.AddWatch(root / "missing", 2));
   EXPECT_EQ(probe.ErrorTexts(),
-            (std::vector<std::string>{"Path provided is not a directory: " + (dir / "plain.txt") + "\n",
+            (std::vector<std::string>{"Path provided is not a directory: " + (root / "plain.txt") + "\n",
                                       "Cannot create directory handle: 2\n"}));
   EXPECT_TRUE(probe.WatchErrors().empty());
 }
-
 
 TEST(ChangeMonitor, DestroyWhileEventsFlowReturnsAndNoCallbackFollows) {
   TempDir root;

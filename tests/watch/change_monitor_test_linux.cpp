@@ -18,14 +18,11 @@ namespace {
 
 using namespace watchtest;
 
-TEST(ChangeMonitor, RenamedDirectoriesStayWatchedAndARenameAcrossThemIsOneBatch) {
-  TempDir root;
+TEST_F(ChangeMonitorTest, RenamedDirectoriesStayWatchedAndARenameAcrossThemIsOneBatch) {
   fs::create_directories(root / "sub/from");
   fs::create_directories(root / "to");
   Touch(root / "sub/from/f");
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
-  ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 7));
+  ASSERT_TRUE(Watch(7));
 
   fs::rename(root / "sub/from/f", root / "to/g");
   ASSERT_TRUE(probe.WaitForAll(7, {{"sub/from/f", kOld}, {"to/g", kNew}}));
@@ -92,18 +89,15 @@ TEST(ChangeMonitor, DirectoriesPublishedInABurstAreAllWatched) {
   }
 }
 
-TEST(ChangeMonitor, ContentChangesAndTheRootOnlyForWatchesThatAsk) {
-  TempDir root, fence;
+TEST_F(ChangeMonitorTest, ContentChangesAndTheRootOnlyForWatchesThatAsk) {
   fs::create_directory(root / "sub");
   fs::create_directory(root / "tmp");
   Touch(root / "saved.txt");
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
   vexil::WatchOptions rootOnly;
   rootOnly.recursive = false;
   rootOnly.modifications = true;
-  ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 1, rootOnly));
-  ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 2));  // the same directory, as a host watches it
+  ASSERT_TRUE(Watch(1, rootOnly));
+  ASSERT_TRUE(Watch(2));  // the same directory, as a host watches it
   ASSERT_TRUE(monitor.AddWatch(fence.Path().string(), 3));
 
   std::ofstream(root / "written.txt") << "text";
@@ -120,14 +114,12 @@ TEST(ChangeMonitor, ContentChangesAndTheRootOnlyForWatchesThatAsk) {
   EXPECT_FALSE(probe.Saw(2, {"saved.txt", kModified}));
 }
 
-TEST(ChangeMonitor, MovesIntoAndOutOfTheTreeAreAdditionsAndRemovals) {
-  TempDir root, outside, fence;
+TEST_F(ChangeMonitorTest, MovesIntoAndOutOfTheTreeAreAdditionsAndRemovals) {
+  TempDir outside;
   fs::create_directories(outside / "incoming/deep");
   Touch(outside / "incoming/deep/old.txt");
   Touch(outside / "loose.txt");
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
-  ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 1));
+  ASSERT_TRUE(Watch(1));
   ASSERT_TRUE(monitor.AddWatch(fence.Path().string(), 2));
 
   fs::rename(outside / "loose.txt", root / "loose.txt");
@@ -149,40 +141,34 @@ TEST(ChangeMonitor, MovesIntoAndOutOfTheTreeAreAdditionsAndRemovals) {
   EXPECT_FALSE(probe.Saw(1, {"incoming/deep/after.txt", kAdded}));
 }
 
-TEST(ChangeMonitor, RootThatDisappearsEndsItsWatchOnly) {
-  TempDir parent, fence;
-  const std::string root = parent / "root";
-  fs::create_directories(root + "/sub");
-  Touch(root + "/sub/f");
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
-  ASSERT_TRUE(monitor.AddWatch(root, 1));
+TEST_F(ChangeMonitorTest, RootThatDisappearsEndsItsWatchOnly) {
+  const std::string first = root / "first";
+  fs::create_directories(first + "/sub");
+  Touch(first + "/sub/f");
+  ASSERT_TRUE(monitor.AddWatch(first, 1));
   ASSERT_TRUE(monitor.AddWatch(fence.Path().string(), 2));
 
-  fs::remove_all(root);
+  fs::remove_all(first);
   ASSERT_TRUE(probe.WaitForWatchError(1));
   EXPECT_TRUE(probe.Saw(1, {"sub/", kRemoved}));
 
   // A new directory under the old name is not the watched one.
-  fs::create_directories(root);
-  Touch(root + "/again");
+  fs::create_directories(first);
+  Touch(first + "/again");
   Fence(probe, fence, 2, "fence");
   EXPECT_FALSE(probe.Saw(1, {"again", kAdded}));
   EXPECT_EQ(probe.WatchErrors(), std::vector<std::int64_t>{1});
 
   // Moving a root away ends its watch the same way.
-  const std::string second = parent / "second";
+  const std::string second = root / "second";
   fs::create_directories(second);
   ASSERT_TRUE(monitor.AddWatch(second, 3));
-  fs::rename(second, parent / "elsewhere");
+  fs::rename(second, root / "elsewhere");
   EXPECT_TRUE(probe.WaitForWatchError(3));
 }
 
-TEST(ChangeMonitor, BurstOfTenThousandFilesReportsEveryNameOrTheLoss) {
-  TempDir root;
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
-  ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 1));
+TEST_F(ChangeMonitorTest, BurstOfTenThousandFilesReportsEveryNameOrTheLoss) {
+  ASSERT_TRUE(Watch(1));
 
   constexpr std::size_t kFiles = 10000;
   for (std::size_t i = 0; i < kFiles; ++i) Touch(root / ("f" + std::to_string(i)));
@@ -192,13 +178,9 @@ TEST(ChangeMonitor, BurstOfTenThousandFilesReportsEveryNameOrTheLoss) {
   for (std::size_t i = 0; i < kFiles; ++i) ASSERT_EQ(names.count("f" + std::to_string(i)), 1u) << i;
 }
 
-TEST(ChangeMonitor, OverlappingRootsShareDirectoriesAndRemovalKeepsTheOther) {
-  TempDir root, fence;
+TEST_F(ChangeMonitorTest, OverlappingRootsShareDirectoriesAndRemovalKeepsTheOther) {
   fs::create_directories(root / "sub/deeper");
-  Probe probe;
-  WorkerGate gate;
-  ChangeMonitor monitor(gate.Wrap(probe.Handlers()));
-  ASSERT_TRUE(monitor.AddWatch(root.Path().string(), 1));
+  ASSERT_TRUE(Watch(1));
   ASSERT_TRUE(monitor.AddWatch(root / "sub", 2));
   ASSERT_TRUE(monitor.AddWatch(fence.Path().string(), 3));
 

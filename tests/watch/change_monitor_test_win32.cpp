@@ -19,11 +19,8 @@ bool HasExtendedRead() {
   return GetProcAddress(GetModuleHandleA("kernel32.dll"), "ReadDirectoryChangesExW") != nullptr;
 }
 
-TEST(CompletionPortMonitor, DirectoriesThatStillExistEndInABackslash) {
-  TempDir root;
+TEST_F(ChangeMonitorTest, DirectoriesThatStillExistEndInABackslash) {
   fs::create_directories(root / "old");
-  Probe probe;
-  ChangeMonitor monitor(probe.Handlers());
   // A root written with its own trailing backslash names the same entries.
   ASSERT_TRUE(monitor.AddWatch(root.Path().string() + "\\", 2));
 
