@@ -29,8 +29,9 @@ T AtPosition(int line, int character) {
 
 std::string Json(LSP::JsonObject& value) { return LSP::ToJsonText(value); }
 
-TEST(FeatureParams, CodeActionContextGivesDiagnosticsBackInTheProtocolsShape) {
-  // One as published (kept verbatim, "data" and all), one built by the host.
+TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
+  // A code action's context gives diagnostics back in the protocol's shape: one as published
+  // (kept verbatim, "data" and all), one built by the host.
   LSP::PublishDiagnosticsParams published;
   const std::string sent = R"({"range":{"start":{"line":1,"character":2},"end":{"line":1,"character":5}},)"
                            R"("severity":1,"code":"E1","source":"lint","message":"bad","data":{"fix":7}})";
@@ -45,16 +46,6 @@ TEST(FeatureParams, CodeActionContextGivesDiagnosticsBackInTheProtocolsShape) {
   actions.range = built.range;
   actions.context.diagnostics = {published.diagnostics[0], built};
   actions.context.only = {"quickfix"};
-  EXPECT_EQ(Json(actions), std::string("{") + kDocument +
-                               R"(,"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
-                               R"("context":{"diagnostics":[)" + sent +
-                               R"(,{"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
-                               R"("code":42,"message":"m"}],"only":["quickfix"]}})");
-  // The diagnostic's own writing stays flattened.
-  EXPECT_EQ(Json(built), R"({"start":{"line":3,"character":0},"end":{"line":3,"character":1},"code":42,"message":"m"})");
-}
-
-TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
   auto position = AtPosition<LSP::TextDocumentPositionParams>(3, 7);
   auto completion = AtPosition<LSP::CompletionParams>(1, 2);
   auto triggered = AtPosition<LSP::CompletionParams>(1, 2);
@@ -131,6 +122,10 @@ TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
                     R"("end":{"line":0,"character":0}}}})"},
       {&answer, R"({"applied":false,"failureReason":"read-only"})"},
       {&query, R"({"query":""})"},
+      {&actions, document + R"(,"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
+                            R"("context":{"diagnostics":[)" + sent +
+                     R"(,{"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
+                     R"("code":42,"message":"m"}],"only":["quickfix"]}})"},
   };
   for (const auto& [params, expected] : rows) EXPECT_EQ(Json(*params), expected) << expected;
 
