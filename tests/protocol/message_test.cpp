@@ -8,6 +8,8 @@
 #include <vector>
 
 #include "reply_helpers.h"
+#include "vexil/protocol/code_actions.h"
+#include "vexil/protocol/feature_params.h"
 #include "vexil/protocol/message.h"
 #include "vexil/protocol/structures.h"
 
@@ -15,40 +17,22 @@ namespace {
 
 using namespace vexil_test;
 
-// A result that records what it was given, to see whether the reply reached it.
-class Recorded : public LSP::Result {
- public:
-  void Read(const LSP::xObject& value) override { text = value.String("text"), reads++; }
-  using LSP::JsonObject::Read;
-  void Write(LSP::xWriter&) override {}
-  std::string text;
-  int reads = 0;
-};
-
-class PositionParams : public LSP::Params {
- public:
-  void Write(LSP::xWriter& writer) override {
-    writer.Object(document, true);
-    writer.Object(position, true);
-  }
-  LSP::TextDocumentIdentifier document{"file:///a.c"};
-  LSP::Position position{3, 7};
-};
-
-// A whole reply read into a Recorded result, or what the reading threw.
+// A whole reply read into a result that keeps its text, or what the reading threw.
 std::string Reply(const std::string& json) {
-  Recorded result;
+  LSP::JsonResult result;
   LSP::xReader reader;
   EXPECT_TRUE(reader.Parse(json)) << reader.Error();
   LSP::ResponseMessage response(&result);
   const std::string thrown = ThrownText([&] { response.Read(reader); });
   if (!thrown.empty()) return "threw: " + thrown;
   return Fields(response.id, response.jsonrpc, response.HaveError(), response.MethodNotFound(), response.error.code,
-                response.ErrorMessage(), result.reads, result.text);
+                response.ErrorMessage(), result.json);
 }
 
 TEST(Envelope, RequestsAndNotificationsInWireOrder) {
-  PositionParams params;
+  LSP::TextDocumentPositionParams params;
+  params.textDocument.uri = "file:///a.c";
+  params.position = LSP::Position(3, 7);
   LSP::RequestMessage hover("textDocument/hover", &params), shutdown("shutdown", nullptr), nameless("", nullptr);
   LSP::NotificationMessage exit("exit", nullptr);
   LSP::CancelParams cancel(12);
@@ -95,13 +79,13 @@ TEST(Envelope, RequestIdsAreConsecutiveUniqueUnderConcurrencyAndNotForNotificati
 
 TEST(Envelope, RepliesAreReadIntoTheCallersResult) {
   CheckRows({
-      {"result", Reply(R"({"jsonrpc":"2.0","id":4,"result":{"text":"hi"}})"), "4|2.0|0|0|0||1|hi"},
-      {"id as text, null result", Reply(R"({"jsonrpc":"2.0","id":"12","result":null})"), "12|2.0|0|0|0||0|"},
+      {"result", Reply(R"({"jsonrpc":"2.0","id":4,"result":{"text":"hi"}})"), "4|2.0|0|0|0||{\"text\":\"hi\"}"},
+      {"id as text, null result", Reply(R"({"jsonrpc":"2.0","id":"12","result":null})"), "12|2.0|0|0|0||"},
       {"method not found",
        Reply(R"({"jsonrpc":"2.0","id":3,"error":{"code":-32601,"message":"Unhandled method x"}})"),
-       "3|2.0|1|1|-32601|Unhandled method x|0|"},
-      {"error without code", Reply(R"({"jsonrpc":"2.0","id":3,"error":{"message":"boom"}})"), "3|2.0|1|0|-1|boom|0|"},
-      {"notification", Reply(R"({"jsonrpc":"2.0","method":"window/logMessage","params":{}})"), "-1|2.0|0|0|0||0|"},
+       "3|2.0|1|1|-32601|Unhandled method x|"},
+      {"error without code", Reply(R"({"jsonrpc":"2.0","id":3,"error":{"message":"boom"}})"), "3|2.0|1|0|-1|boom|"},
+      {"notification", Reply(R"({"jsonrpc":"2.0","method":"window/logMessage","params":{}})"), "-1|2.0|0|0|0||"},
       {"id not a number", Reply(R"({"id":"x1"})"), "threw: invalid stoi argument"},
       {"id null", Reply(R"({"id":null})"), "threw: Expecting a 'int' JSON object but found 'null' JSON object."},
   });
