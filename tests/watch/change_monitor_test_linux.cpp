@@ -4,11 +4,8 @@
 
 #include <gtest/gtest.h>
 
-#include <algorithm>
-#include <atomic>
 #include <fstream>
 #include <functional>
-#include <map>
 #include <set>
 #include <vector>
 
