@@ -115,7 +115,7 @@ TEST(FeatureResults, EveryShapeAServerMaySendReadsIntoItsResult) {
        "Expecting a array JSON object but found 4 JSON object."},
       // Code actions mix with bare commands in one list.
       {"code actions", ReadAs<LSP::CodeActionList>(actions, Actions),
-       "Run||Run|run|[1,{\"a\":null}]||;Fix|quickfix|Then|after||E1|file:///a.c|3|2:1-2:5|x;Bare||||||"},
+       "Run||0|1|Run|run|[1,{\"a\":null}]||;Fix|quickfix|1|1|Then|after||E1|file:///a.c|3|2:1-2:5|x;Bare||0|0|||||"},
       {"code actions not an array", ReadAs<LSP::CodeActionList>("{}", Actions), kNotAnArray},
       // Parents are read innermost first.
       {"selection ranges",

@@ -70,10 +70,11 @@ TEST(RecordedClangd, RepliesReadIntoTheirResults) {
 
 TEST(RecordedClangd, CodeActionsAsLiteralsAndAsBareCommandsAndWhatTheCommandsDo) {
   const auto fixes = Recorded<LSP::CodeActionList>("clangd/codeAction");
-  EXPECT_EQ(Actions(fixes), "insert ';'|quickfix||||expected_semi_after_stmt|/examples/cpp/broken.cpp|-1|2:39-2:39|;");
+  EXPECT_EQ(Actions(fixes), "insert ';'|quickfix|1|0||||expected_semi_after_stmt|/examples/cpp/broken.cpp|-1|2:39-2:39|;");
   EXPECT_TRUE(fixes.items.at(0).isPreferred);
   const LSP::CodeAction command = Recorded<LSP::CodeActionList>("clangd/codeActionCommands").items.at(0);
-  EXPECT_EQ(Fields(command.title, command.command.command, Changes(command.edit)), "Apply fix: insert ';'|clangd.applyFix|");
+  EXPECT_EQ(Fields(command.title, command.HasEdit(), command.HasCommand(), command.command.command),
+            "Apply fix: insert ';'|0|1|clangd.applyFix");
 
   // A refactoring's arguments go back in the execute request; the edit that it makes
   // arrives as the server's own request.

@@ -137,7 +137,7 @@ inline std::string Changes(const LSP::WorkspaceEdit& edit) {
 }
 inline std::string Actions(const LSP::CodeActionList& list) {
   return Items(list.items, [](const LSP::CodeAction& a) {
-    return Fields(a.title, a.kind, a.command.title, a.command.command, a.command.arguments,
+    return Fields(a.title, a.kind, a.HasEdit(), a.HasCommand(), a.command.title, a.command.command, a.command.arguments,
                   Items(a.diagnostics, [](const LSP::Diagnostic& d) { return d.codeText; }),
                   Changes(a.edit));
   });
