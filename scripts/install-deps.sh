@@ -7,7 +7,7 @@ packages=(
   build-essential cmake ninja-build pkg-config
   libpoco-dev rapidjson-dev
   googletest libgtest-dev libgmock-dev libbenchmark-dev
-  clangd python3-pylsp python3-pyflakes
+  clangd python3-pylsp python3-pyflakes python3-pycodestyle
 )
 
 exec "$(dirname "$0")/apt-ensure.sh" install-deps "${packages[@]}"

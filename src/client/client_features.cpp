@@ -4,11 +4,15 @@
 
 #include <algorithm>
 
+#include "client/watched_files.h"
+#include "vexil/protocol/feature_capabilities.h"
+
 namespace LSP {
 namespace {
 
 constexpr char kProgressCreate[] = "window/workDoneProgress/create";
 constexpr char kConfiguration[] = "workspace/configuration";
+constexpr char kApplyEdit[] = "workspace/applyEdit";
 
 struct Feature {
   const char* name;
@@ -27,6 +31,27 @@ const Feature kFeatures[] = {
      [](EnabledFeatures& enabled) {
        enabled.capabilities.push_back(R"({"workspace":{"configuration":true}})");
        enabled.hostRequests.push_back(kConfiguration);
+     }},
+    // The requests IDEs use beyond the classic ones (code action literals, prepared
+    // renames, semantic tokens, will-save) and edits the server asks the host to apply.
+    {"features",
+     [](EnabledFeatures& enabled) {
+       FeatureClientCapabilities capabilities;
+       enabled.capabilities.push_back(ToJsonText(capabilities));
+       enabled.hostRequests.push_back(kApplyEdit);
+     }},
+    // Files changed on disk in the workspace folders, told to the server as it registers
+    // for them (or all of them, when it registers nothing).
+    {"watchedFiles",
+     [](EnabledFeatures& enabled) {
+       enabled.capabilities.push_back(vexil::kWatchedFilesCapabilities);
+       enabled.watchedFiles = true;
+     }},
+    // Columns counted in UTF-8 bytes when the server agrees (ServerCapabilities says which):
+    // hosts that keep their texts in UTF-8 then need no conversion.
+    {"positionEncoding",
+     [](EnabledFeatures& enabled) {
+       enabled.capabilities.push_back(R"({"general":{"positionEncodings":["utf-8","utf-16"]}})");
      }},
     // The host answers what the server asks (applyEdit, showMessageRequest...).
     {"messages",

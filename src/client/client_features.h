@@ -16,6 +16,8 @@ struct EnabledFeatures {
   std::vector<std::string> hostRequests;
   // ...and whether it also answers every request the library has no answer for.
   bool hostAnswersUnknown = false;
+  // Whether the connection tells the server about files changed on disk.
+  bool watchedFiles = false;
 };
 
 // Adds `feature` to `enabled`; false for a name the library does not know. Enabling a

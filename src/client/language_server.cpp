@@ -45,6 +45,7 @@ LanguageServer::LanguageServer(const xServerStart& start) : server(start) {}
 
 bool LanguageServer::Start(const xServerInitialise& init) {
   if (!IsRunning()) {
+    StopWatchingFiles();
     initialized = false;
     server.Start();  // a failed launch shows in Initialize, which then finds nothing running
   }
@@ -66,7 +67,8 @@ bool LanguageServer::Initialize(const xServerInitialise& init) {
   }
   // A reply that never came still counts: only an error reply or a dead server fails.
   initialized = !server.HaveErrors();
-  Initialized();
+  if (initialized) WatchFiles(init);
+  if (Initialized()) FilesInitialized();
   return initialized;
 }
 
@@ -78,6 +80,7 @@ bool LanguageServer::Initialized() {
 }
 
 bool LanguageServer::Shutdown() {
+  StopWatchingFiles();
   if (IsRunning()) {
     // Waiting for the reply's own id: nothing follows a shutdown reply, so waiting for
     // anything else would always run the whole time-out.
@@ -92,6 +95,7 @@ bool LanguageServer::Shutdown() {
 }
 
 bool LanguageServer::Exit() {
+  StopWatchingFiles();
   if (IsRunning()) {
     // Answered before "exit": a server must never wait on a host that is going away.
     server.DeclineHostRequests();

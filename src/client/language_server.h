@@ -3,8 +3,12 @@
 // one protocol message.
 #pragma once
 
+#include <memory>
+#include <mutex>
+
 #include "client/client_features.h"
 #include "client/json_params.h"
+#include "client/watched_files.h"
 #include "host/trace_line.h"
 #include "transport/server.h"
 #include "vexil/host/language_server.h"
@@ -19,7 +23,7 @@ class LanguageServer final : public xLanguageServer {
   explicit LanguageServer(const xServerStart& start);
   LanguageServer(const LanguageServer&) = delete;
   LanguageServer& operator=(const LanguageServer&) = delete;
-  ~LanguageServer() = default;
+  ~LanguageServer() { StopWatchingFiles(); }
 
   bool Exit() override;
   const char* ErrorMessage() override { return server.ErrorMessage(); }
@@ -63,6 +67,21 @@ class LanguageServer final : public xLanguageServer {
   }
   void Cancel() override { server.CancelWait(); }
   bool SetEnvironment(const char* name, const char* value) override { return server.Environment(name, value); }
+  std::vector<CodeAction> TextDocument_CodeAction(CodeActionParams* params) override;
+  std::string Workspace_ExecuteCommand(ExecuteCommandParams* params) override;
+  std::vector<DocumentHighlight> TextDocument_DocumentHighlight(TextDocumentPositionParams* params) override;
+  std::vector<FoldingRange> TextDocument_FoldingRange(FoldingRangeParams* params) override;
+  std::vector<SelectionRange> TextDocument_SelectionRange(SelectionRangeParams* params) override;
+  SemanticTokens TextDocument_SemanticTokensFull(SemanticTokensParams* params) override;
+  std::vector<InlayHint> TextDocument_InlayHint(InlayHintParams* params) override;
+  CompletionItem CompletionItem_Resolve(CompletionItem* item) override;
+  PrepareRenameResult TextDocument_PrepareRename(TextDocumentPositionParams* params) override;
+  std::vector<CallHierarchyItem> TextDocument_PrepareCallHierarchy(TextDocumentPositionParams* params) override;
+  std::vector<CallHierarchyIncomingCall> CallHierarchy_IncomingCalls(CallHierarchyItem* item) override;
+  std::vector<CallHierarchyOutgoingCall> CallHierarchy_OutgoingCalls(CallHierarchyItem* item) override;
+  void Workspace_DidChangeConfiguration(DidChangeConfigurationParams* params) override;
+  void Workspace_DidChangeWorkspaceFolders(DidChangeWorkspaceFoldersParams* params) override;
+  void TextDocument_WillSave(WillSaveTextDocumentParams* params) override;
 
  protected:
   // Sends "initialized" once the handshake succeeded and the server still runs.
@@ -79,17 +98,33 @@ class LanguageServer final : public xLanguageServer {
   // The request pattern for a holder made here, returned with whatever it was given.
   template <typename Holder>
   Holder Ask(const char* method, Params* params, Holder holder = Holder());
+  // The request pattern for a result of any shape: its JSON text, "null" for a null
+  // result, "" on any failure.
+  std::string RequestJson(const char* method, Params* params);
   bool Send(const char* method, Params* params);
+  // Whether `params` can be written; false, with the error state set and traced, when
+  // JSON text the host gave in them is not JSON.
+  bool Writable(Params& params);
   // Checks a method and its params given as JSON text; false, with the error state set
   // and traced, when they cannot be sent.
   bool Prepared(const char* method, const char* paramsJson, JsonParams& params);
   // Polls until the process has ended or the limit has passed; true when it ended.
   bool AwaitEnd();
+  // With "watchedFiles" enabled: watches the workspace folders of `init` and takes the
+  // server's registrations, before "initialized" is sent. Nothing is sent before
+  // FilesInitialized().
+  void WatchFiles(const xServerInitialise& init);
+  void FilesInitialized();
+  // Ends the watching, before the server is stopped, started again or left.
+  void StopWatchingFiles();
 
   vexil::xServer server;
   bool initialized = false;
   InitializeResult result;
   EnabledFeatures features;
+  // Swapped under its lock: the output reader hands it the server's registrations.
+  std::mutex filesMutex;
+  std::unique_ptr<vexil::WatchedFilesNotifier> files;
 };
 
 template <typename Holder>

@@ -40,7 +40,10 @@ bool LanguageServer::Send(const char* method, Params* params) {
 }
 
 CompletionList LanguageServer::TextDocument_Completion(CompletionParams* params) {
-  return Ask<CompletionList>("textDocument/completion", params);
+  // Keeping each item's text costs time on big lists; only resolving needs it.
+  CompletionList holder;
+  holder.keepItemJson = result.capabilities.completionProvider.resolveProvider;
+  return Ask("textDocument/completion", params, std::move(holder));
 }
 
 std::vector<Location> LanguageServer::TextDocument_Declaration(TextDocumentPositionParams* params) {

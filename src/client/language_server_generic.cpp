@@ -27,8 +27,12 @@ bool LanguageServer::Prepared(const char* method, const char* paramsJson, JsonPa
 std::string LanguageServer::Request(const char* method, const char* paramsJson) {
   JsonParams params;
   if (!Prepared(method, paramsJson, params)) return "";
+  return RequestJson(method, params.Empty() ? nullptr : &params);
+}
+
+std::string LanguageServer::RequestJson(const char* method, Params* params) {
   JsonResult holder;
-  if (!Request(method, params.Empty() ? nullptr : &params, holder)) return "";
+  if (!Request(method, params, holder)) return "";
   return holder.json.empty() ? "null" : holder.json;
 }
 

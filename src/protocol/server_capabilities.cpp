@@ -131,6 +131,8 @@ void ServerCapabilities::Read(const xObject& value) {
   inlayHintProvider = ReadProvider(value, "inlayHintProvider");
   prepareRenameProvider = ReadOption(value, "renameProvider", "prepareProvider");
   ReadDocumentSync(value, documentSync, documentSyncSave);
+  xObject encoding = value.Object("positionEncoding");
+  positionEncoding = encoding.IsString() && !encoding.GetString().empty() ? encoding.GetString() : "utf-16";
 }
 
 }  // namespace LSP

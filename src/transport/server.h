@@ -3,6 +3,8 @@
 #pragma once
 
 #include <atomic>
+#include <functional>
+#include <map>
 #include <memory>
 #include <mutex>
 #include <string>
@@ -98,6 +100,20 @@ class xServer {
   // The server's diagnostics by document, kept whether or not a request is waiting.
   DiagnosticsStore& Diagnostics() { return diagnostics_; }
 
+  // A part of the library that answers the server's requests of `method` itself (the
+  // watched files take registrations): `answer` gets the params as JSON text and says
+  // whether it took them, with the reason when not; the request is answered with null or
+  // with error -32602 and that reason. It runs on the output reader's thread. A null
+  // `answer` gives the method back to the default answers once a call in progress ended.
+  using OwnAnswer = std::function<bool(const std::string& params, std::string& error)>;
+  void AnswerWith(const std::string& method, OwnAnswer answer);
+  // Sends `body`, a message of the library's own, from a thread other than the host's:
+  // traced like the host's messages, the error state untouched. The caller stops calling it
+  // before the server is started again and before the connection goes. True once written.
+  bool SendFromAnyThread(const std::string& body);
+  // Traces `text` under "Error" on the host's thread, at its next call.
+  void ErrorLater(const std::string& text) { deferred_.Error("%s", text.c_str()); }
+
   // Large texts to a busy server need time to go through.
   static constexpr int kMinimumWriteMs = 5000;
 
@@ -155,6 +171,9 @@ class xServer {
   void EndRequest();
   void StoreDiagnostics(const LSP::xObject& notification);
   std::vector<LSP::WorkspaceFolder> Folders();
+  // The library's own answer to `request`, a server request of `method`; empty when no
+  // part of it answers that method.
+  std::string OwnAnswerTo(const std::string& method, const LSP::xObject& request);
 
   std::string joined_;
   Tracer tracer_;
@@ -169,6 +188,8 @@ class xServer {
   std::vector<std::string> arguments_;
   bool haveErrors_ = false;
   std::string errorMessage_;
+  std::mutex ownAnswersMutex_;  // held while an own answer runs, so that removing it waits
+  std::map<std::string, OwnAnswer> ownAnswers_;
   std::mutex foldersMutex_;  // the host sets the folders while the reader may answer with them
   std::vector<LSP::WorkspaceFolder> folders_;
   DiagnosticsStore diagnostics_;

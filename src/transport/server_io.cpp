@@ -7,6 +7,8 @@
 #include <memory>
 #include <stdexcept>
 
+#include "json/json_depth.h"
+#include "protocol/raw_json.h"
 #include "transport/server.h"
 #include "transport/server_requests.h"
 #include "transport/server_streams.h"
@@ -240,8 +242,43 @@ xServer::Answer xServer::Respond(LSP::xReader& message) {
     return {};
   }
   if (!IsServerRequest(root)) return {};
+  std::string method = root.Object("method").GetString();
+  std::string own = OwnAnswerTo(method, root);
+  if (!own.empty()) return {method, own};
   std::vector<LSP::WorkspaceFolder> folders = Folders();
-  return {root.Object("method").GetString(), AnswerServerRequest(root, folders)};
+  return {method, AnswerServerRequest(root, folders)};
+}
+
+void xServer::AnswerWith(const std::string& method, OwnAnswer answer) {
+  std::lock_guard<std::mutex> lock(ownAnswersMutex_);
+  if (answer) {
+    ownAnswers_[method] = std::move(answer);
+  } else {
+    ownAnswers_.erase(method);
+  }
+}
+
+std::string xServer::OwnAnswerTo(const std::string& method, const LSP::xObject& request) {
+  constexpr int kInvalidParams = -32602;
+  std::lock_guard<std::mutex> lock(ownAnswersMutex_);
+  const auto found = ownAnswers_.find(method);
+  const LSP::JsonValue& id = request.Object("id").Value();
+  if (found == ownAnswers_.end() || !(id.IsNumber() || id.IsString())) return "";
+  const std::string idText = LSP::RawJsonText(request.Object("id"));
+  LSP::xObject params = request.Object("params");
+  // Written out recursively: deeper nesting could exhaust the stack of this thread.
+  std::string error = "params nested deeper than " + std::to_string(LSP::kNestingLimit) + " levels";
+  if (LSP::NestedWithin(params.Value(), LSP::kNestingLimit) &&
+      found->second(params.IsNull() ? "null" : LSP::RawJsonText(params), error))
+    return ResultResponse(idText, "null");
+  return ErrorResponse(idText, kInvalidParams, error);
+}
+
+bool xServer::SendFromAnyThread(const std::string& body) {
+  if (!streams_) return false;
+  std::string framed = Framed(body);
+  deferred_.Message("\nSent: %s\n", framed.c_str());
+  return streams_->input.Send(std::move(framed), writeLimitMs_) == InputWriter::Outcome::Written;
 }
 
 void xServer::Dispatch(ServerStreams& streams, LSP::xReader& message) {

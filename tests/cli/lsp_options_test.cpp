@@ -49,6 +49,8 @@ TEST(LspOptions, ServerArgumentsRunUpToTheFirstActionAndPositionsStayOneBased) {
   cli::LspOptions environment = ParseLspOptions({"--env", "A=b=c", "--env=EMPTY=", "--progress", "--", "s", "--capabilities"});
   EXPECT_EQ(environment.session.environment, (std::vector<std::pair<std::string, std::string>>{{"A", "b=c"}, {"EMPTY", ""}}));
   EXPECT_TRUE(environment.session.progress);
+  EXPECT_FALSE(environment.session.watch);
+  EXPECT_TRUE(ParseLspOptions({"--watch", "--", "s"}).session.watch) << "watching needs no action";
 }
 
 TEST(LspOptions, BadUsageIsRefusedWithAReason) {

@@ -41,6 +41,14 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
                              "rangeFormatting", "rename"}) {
     nulls += std::string("result=textDocument/") + method + ":null;";
   }
+  for (const char* method : {"codeAction", "documentHighlight", "foldingRange", "selectionRange",
+                             "semanticTokens/full", "inlayHint", "prepareRename", "prepareCallHierarchy"}) {
+    nulls += std::string("result=textDocument/") + method + ":null;";
+  }
+  for (const char* method : {"workspace/executeCommand", "completionItem/resolve", "callHierarchy/incomingCalls",
+                             "callHierarchy/outgoingCalls"}) {
+    nulls += std::string("result=") + method + ":null;";
+  }
   xLanguageServer* server = Started({nulls + "result=workspace/symbol:null"});
   auto position = At<LSP::TextDocumentPositionParams>(3, 4);
   auto completion = At<LSP::CompletionParams>(3, 4);
@@ -64,6 +72,27 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   EXPECT_TRUE(server->TextDocument_Formatting(&formatting).empty());
   EXPECT_TRUE(server->TextDocument_RangeFormatting(&rangeFormatting).empty());
   EXPECT_TRUE(server->TextDocument_Rename(&rename).documentChanges.empty());
+  LSP::CodeActionParams actions;
+  LSP::ExecuteCommandParams command;
+  command.command = "fake.run";
+  LSP::FoldingRangeParams folding;
+  LSP::SelectionRangeParams selection;
+  LSP::SemanticTokensParams tokens;
+  LSP::InlayHintParams hints;
+  LSP::CompletionItem item;
+  LSP::CallHierarchyItem function;
+  EXPECT_TRUE(server->TextDocument_CodeAction(&actions).empty());
+  EXPECT_EQ(server->Workspace_ExecuteCommand(&command), "null");
+  EXPECT_TRUE(server->TextDocument_DocumentHighlight(&position).empty());
+  EXPECT_TRUE(server->TextDocument_FoldingRange(&folding).empty());
+  EXPECT_TRUE(server->TextDocument_SelectionRange(&selection).empty());
+  EXPECT_TRUE(server->TextDocument_SemanticTokensFull(&tokens).data.empty());
+  EXPECT_TRUE(server->TextDocument_InlayHint(&hints).empty());
+  EXPECT_EQ(server->CompletionItem_Resolve(&item).label, "");
+  EXPECT_FALSE(server->TextDocument_PrepareRename(&position).CanRename());
+  EXPECT_TRUE(server->TextDocument_PrepareCallHierarchy(&position).empty());
+  EXPECT_TRUE(server->CallHierarchy_IncomingCalls(&function).empty());
+  EXPECT_TRUE(server->CallHierarchy_OutgoingCalls(&function).empty());
   EXPECT_FALSE(server->HaveErrors());
 
   std::vector<std::string> methods;
@@ -76,7 +105,11 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
                          "textDocument/typeDefinition", "textDocument/implementation", "textDocument/references",
                          "textDocument/documentSymbol", "workspace/symbol", "textDocument/hover",
                          "textDocument/signatureHelp", "textDocument/formatting", "textDocument/rangeFormatting",
-                         "textDocument/rename"}));
+                         "textDocument/rename", "textDocument/codeAction", "workspace/executeCommand",
+                         "textDocument/documentHighlight", "textDocument/foldingRange", "textDocument/selectionRange",
+                         "textDocument/semanticTokens/full", "textDocument/inlayHint", "completionItem/resolve",
+                         "textDocument/prepareRename", "textDocument/prepareCallHierarchy",
+                         "callHierarchy/incomingCalls", "callHierarchy/outgoingCalls"}));
   EXPECT_FALSE(TraceLog::Contains("Timed out"));
 }
 
@@ -99,11 +132,23 @@ TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
   server->TextDocument_DidChange(&change);
   server->TextDocument_DidSave(&save);
   server->TextDocument_DidClose(&close);
+  LSP::DidChangeConfigurationParams settings;
+  settings.settings = R"({"pylsp": {"plugins":{}}})";
+  LSP::DidChangeWorkspaceFoldersParams folders;
+  folders.event.added.emplace_back("file:///work/b", "b");
+  LSP::WillSaveTextDocumentParams willSave;
+  willSave.textDocument.uri = kUri;
+  server->Workspace_DidChangeConfiguration(&settings);
+  server->Workspace_DidChangeWorkspaceFolders(&folders);
+  server->TextDocument_WillSave(&willSave);
   EXPECT_EQ(SentBodies(), (std::vector<std::string>{
       R"({"jsonrpc":"2.0","method":"textDocument/didOpen","params":{"textDocument":{"uri":"file:///work/a.cpp","languageId":"cpp","version":1,"text":"int x;\n"}}})",
       R"({"jsonrpc":"2.0","method":"textDocument/didChange","params":{"textDocument":{"uri":"file:///work/a.cpp","version":2},"contentChanges":[{"text":"int y;\n"}]}})",
       R"({"jsonrpc":"2.0","method":"textDocument/didSave","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})",
-      R"({"jsonrpc":"2.0","method":"textDocument/didClose","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})"}));
+      R"({"jsonrpc":"2.0","method":"textDocument/didClose","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})",
+      R"({"jsonrpc":"2.0","method":"workspace/didChangeConfiguration","params":{"settings":{"pylsp":{"plugins":{}}}}})",
+      R"({"jsonrpc":"2.0","method":"workspace/didChangeWorkspaceFolders","params":{"event":{"added":[{"uri":"file:///work/b","name":"b"}],"removed":[]}}})",
+      R"({"jsonrpc":"2.0","method":"textDocument/willSave","params":{"textDocument":{"uri":"file:///work/a.cpp"},"reason":1}})"}));
   EXPECT_TRUE(TraceLog::Texts("Error").empty());
 }
 
@@ -121,6 +166,62 @@ TEST_F(ConnectionFeatures, PlainReferencesIncludeTheDeclarationAndReferenceParam
       << bodies[0];
   EXPECT_NE(bodies[1].find(std::string(params) + R"("context":{"includeDeclaration":false}}})"), std::string::npos)
       << bodies[1];
+}
+
+// Servers match quick fixes to the diagnostics they published, and resolve completion items
+// by their "data": both go back as the server sent them.
+TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
+  for (bool resolves : {true, false}) {
+    SCOPED_TRACE(resolves ? "resolve provider" : "no resolve provider");
+    xLanguageServer* server = Started(
+        {"diagnose", std::string("result=initialize:{\"capabilities\": {\"completionProvider\":{\"resolveProvider\":") +
+                         (resolves ? "true" : "false") + "}}}",
+         R"(result=textDocument/completion:[{"label": "clamp","data":{"id":7}}])",
+         R"x(result=completionItem/resolve:{"label": "clamp","detail":"int clamp(int)"})x",
+         R"(result=textDocument/codeAction:[{"title": "Fix it","command":"fake.fix","arguments":[1,{"a":2}]}])"});
+    LSP::DidOpenTextDocumentParams open;
+    open.textDocument.uri = kUri;
+    open.textDocument.text = "ok\nerror here\nok\nerror again\n";
+    server->TextDocument_DidOpen(&open);
+    ASSERT_TRUE(transport_test::WaitFor([&] { return server->TextDocument_Diagnostics(kUri).size() == 2; }));
+
+    LSP::CodeActionParams actions;
+    actions.textDocument.uri = kUri;
+    actions.range = LSP::Range(LSP::Position(1, 2), LSP::Position(1, 2));
+    std::vector<LSP::CodeAction> offered = server->TextDocument_CodeAction(&actions);
+    EXPECT_TRUE(actions.context.diagnostics.empty()) << "the host's params stay as they are";
+    EXPECT_NE(SentBody("textDocument/codeAction").find(
+                  R"("context":{"diagnostics":[{"range":{"start":{"line":1,"character":0},"end":{"line":1,"character":5}},)"
+                  R"("severity":1,"code":"fake-error","source":"fake","message":"found error"}]}}})"),
+              std::string::npos)
+        << SentBody("textDocument/codeAction");
+    ASSERT_EQ(offered.size(), 1u);
+    LSP::ExecuteCommandParams command(offered[0].command);
+    EXPECT_NE(server->Workspace_ExecuteCommand(&command).find("workspace/executeCommand"), std::string::npos);
+    EXPECT_NE(SentBody("workspace/executeCommand").find(R"("params":{"command":"fake.fix","arguments":[1,{"a":2}]}})"),
+              std::string::npos);
+
+    auto completion = At<LSP::CompletionParams>(0, 0);
+    std::vector<LSP::CompletionItem> items = server->TextDocument_Completion(&completion).items;
+    ASSERT_EQ(items.size(), 1u);
+    EXPECT_EQ(server->CompletionItem_Resolve(&items[0]).detail, "int clamp(int)");
+    EXPECT_NE(SentBody("completionItem/resolve").find(resolves ? R"("params":{"label":"clamp","data":{"id":7}}})"
+                                                               : R"("params":{"label":"clamp"}})"),
+              std::string::npos);
+    Dispose(kName);
+  }
+  // Host-given JSON text that is not JSON is refused before anything is sent.
+  xLanguageServer* server = Started();
+  LSP::ExecuteCommandParams command;
+  command.arguments = "[1,";
+  LSP::DidChangeConfigurationParams settings;
+  settings.settings = "{";
+  EXPECT_EQ(server->Workspace_ExecuteCommand(&command), "");
+  EXPECT_STREQ(server->ErrorMessage(), "Invalid JSON for arguments: Invalid value.");
+  server->Workspace_DidChangeConfiguration(&settings);
+  EXPECT_STREQ(server->ErrorMessage(), "Invalid JSON for settings: Missing a name for object member.");
+  EXPECT_TRUE(SentBodies().empty());
+  EXPECT_EQ(TraceLog::Texts("Error").size(), 2u);
 }
 
 TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {

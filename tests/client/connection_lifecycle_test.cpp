@@ -4,6 +4,8 @@
 
 #include <atomic>
 #include <chrono>
+#include <filesystem>
+#include <fstream>
 #include <functional>
 #include <mutex>
 #include <set>
@@ -82,11 +84,24 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
     std::vector<std::pair<std::string, std::string>> changes;  // on the expected text
   };
   const std::string treeEnd = R"("diagnostic":{"dynamicRegistration":false}})";
+  const std::string features = vexil_test::ReadDataFile("feature_capabilities.json");
   const Row rows[] = {
       {{}, {}},
       {{"messages", "unknown"}, {}},
       {{"progress"}, {{treeEnd + "}", treeEnd + R"(,"window":{"workDoneProgress":true}})"}}},
       {{"configuration", "configuration"}, {{R"("configuration":false)", R"("configuration":true)"}}},
+      {{"features"},
+       {{R"("applyEdit":false,"workspaceEdit":{"documentChanges":false)", R"("applyEdit":true,"workspaceEdit":{"documentChanges":true)"},
+        {R"("willSave":false)", R"("willSave":true)"},
+        {R"("codeAction":{"dynamicRegistration":false})",
+         R"("codeAction":{"dynamicRegistration":false,)" + features.substr(features.find(R"("codeActionLiteralSupport")"),
+                                                                           features.find(R"(,"rename")") - features.find(R"("codeActionLiteralSupport")"))},
+        {R"("rename":{"dynamicRegistration":false})", R"("rename":{"dynamicRegistration":false,"prepareSupport":true})"},
+        {treeEnd + "}", treeEnd.substr(0, treeEnd.size() - 1) + features.substr(features.find(R"(,"semanticTokens")"))}}},
+      {{"positionEncoding"}, {{treeEnd + "}", treeEnd + R"(,"general":{"positionEncodings":["utf-8","utf-16"]}})"}}},
+      {{"watchedFiles"},
+       {{R"("didChangeWatchedFiles":{"dynamicRegistration":false})",
+         R"("didChangeWatchedFiles":{"dynamicRegistration":true,"relativePatternSupport":true})"}}},
   };
   for (const Row& row : rows) {
     xLanguageServer* server = Connection();
@@ -114,12 +129,14 @@ TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
     std::string capabilities;
     int change;
     bool openClose, save, includeText;
+    const char* encoding = "utf-16";
   };
   const Row rows[] = {
-      {R"({"textDocumentSync": 2,"hoverProvider":true})", 2, true, true, false},
+      {R"({"textDocumentSync": 2,"hoverProvider":true,"positionEncoding":"utf-8"})", 2, true, true, false, "utf-8"},
       {R"({"textDocumentSync": {"openClose":true,"change":1,"save":{"includeText":true}},"hoverProvider":true})", 1,
        true, true, true},
-      {R"({"textDocumentSync": {"change":2,"save":false},"hoverProvider":true})", 2, false, false, false},
+      {R"({"textDocumentSync": {"change":2,"save":false},"hoverProvider":true,"positionEncoding":8})", 2, false, false,
+       false},
       {R"({"textDocumentSync": "full","hoverProvider":true})", 0, false, false, false},
   };
   for (const Row& row : rows) {
@@ -132,6 +149,7 @@ TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
     EXPECT_EQ(read.documentSync.openClose, row.openClose) << row.capabilities;
     EXPECT_EQ(read.documentSyncSave, row.save) << row.capabilities;
     EXPECT_EQ(read.documentSync.save.includeText, row.includeText) << row.capabilities;
+    EXPECT_EQ(read.positionEncoding, row.encoding) << row.capabilities;
     EXPECT_EQ(read.textDocumentSync.change, 0) << "the old member stays unread";
     std::string compact = row.capabilities;
     compact.erase(compact.find(' '), 1);
@@ -197,6 +215,9 @@ TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAns
        R"({"jsonrpc":"2.0","id":0,"result":[{"tabSize":4}]})"},
       {"not opted in: the library answers", {}, {}, "[1]", ask(R"({"ask":["workspace/configuration"]})"), {},
        R"({"jsonrpc":"2.0","id":0,"result":[null,null]})"},
+      {"an edit to apply, routed by its feature", {"features"}, {}, R"({"applied": true})",
+       ask(R"({"ask":["workspace/applyEdit"]})"), {"workspace/applyEdit 0 " + items},
+       R"({"jsonrpc":"2.0","id":0,"result":{"applied":true}})"},
       {"any other request, declined by the host", {"messages"}, {}, "error", ask(R"({"ask":["workspace/applyEdit"]})"),
        {"workspace/applyEdit 0 " + items},
        R"({"jsonrpc":"2.0","id":0,"error":{"code":-32001,"message":"declined"}})"},
@@ -232,6 +253,57 @@ TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAns
     Dispose(kName);
     TraceLog::Clear();
   }
+}
+
+// Registration, batching and unregistration of watched files, with the server's own
+// requests; what the fake server received is in every reply to "fake/echo".
+TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem) {
+  vexil_test::TempDirectory temporary;
+  const std::filesystem::path root = std::filesystem::absolute(temporary.Path());
+  const auto file = [&](const std::string& name) { return (root / name).make_preferred().string(); };
+  xLanguageServer* server = Connection();
+  ASSERT_TRUE(server->Enable("watchedFiles"));
+  xServerInitialise init;
+  init.rootPath = root.string();
+  ASSERT_TRUE(server->Start(init));
+  const auto ask = [&](const char* method, const std::string& params) {
+    return server->Request("fake/echo", (R"({"ask":[{"method":")" + std::string(method) + R"(","params":)" + params + "}]}").c_str());
+  };
+  const auto registration = [](const char* id, const char* glob) {
+    return R"({"registrations":[{"id":")" + std::string(id) + R"(","method":"workspace/didChangeWatchedFiles",)" +
+           R"("registerOptions":{"watchers":[{"globPattern":")" + glob + R"("}]}}]})";
+  };
+  const auto echo = [&] { return server->Request("fake/echo", "{}"); };
+  const auto received = [&](const std::string& name) {
+    return echo().find(FileToUri(file(name).c_str()) + "\\\",") != std::string::npos;
+  };
+  // Nothing registered yet: every change under the folder is told.
+  std::ofstream(file("early.txt")).put('x');
+  EXPECT_TRUE(transport_test::WaitFor([&] { return received("early.txt"); }, 30s));
+  EXPECT_NE(ask("client/registerCapability", registration("py", "**/*.py")).find(R"("id":0,"result":null)"), std::string::npos);
+  for (int i = 0; i < 20; ++i) std::ofstream(file("f" + std::to_string(i) + ".py")).put('x');
+  std::ofstream(file("a.txt")).put('x');
+  EXPECT_TRUE(transport_test::WaitFor([&] { return received("f19.py") && received("f0.py"); }, 30s));
+  const std::string echoed = echo();
+  int batches = 0;
+  for (std::size_t at = 0; (at = echoed.find("didChangeWatchedFiles", at)) != std::string::npos; ++at) ++batches;
+  EXPECT_LE(batches, 5) << echoed;
+  EXPECT_FALSE(received("a.txt"));
+
+  const char* dropped = R"({"unregisterations":[{"id":"py","method":"workspace/didChangeWatchedFiles"}]})";
+  EXPECT_NE(ask("client/unregisterCapability", dropped).find(R"("result":null)"), std::string::npos);
+  EXPECT_NE(ask("client/registerCapability", registration("txt", "**/*.txt")).find(R"("result":null)"), std::string::npos);
+  std::ofstream(file("b.py")).put('x');
+  std::ofstream(file("b.txt")).put('x');
+  EXPECT_TRUE(transport_test::WaitFor([&] { return received("b.txt"); }, 30s));
+  EXPECT_FALSE(received("b.py"));
+  EXPECT_NE(ask("client/registerCapability", "{}").find(R"("error":{"code":-32602,)"), std::string::npos);
+
+  // Shut down and initialized again: the registrations of the earlier session are gone.
+  EXPECT_TRUE(server->Shutdown());
+  ASSERT_TRUE(server->Start(init));
+  std::ofstream(file("c.py")).put('x');
+  EXPECT_TRUE(transport_test::WaitFor([&] { return received("c.py"); }, 30s));
 }
 
 TEST_F(ConnectionLifecycle, StartUpDetailsAreVerboseOnlyAndNothingIsSentToAStoppedServer) {

@@ -60,6 +60,21 @@ TEST(ConnectionSlots, OperationsSitInTheHostsSlotOrder) {
   EXPECT_EQ(Slot(&S::ReplyError), 35);
   EXPECT_EQ(Slot(&S::Cancel), 36);
   EXPECT_EQ(Slot(&S::SetEnvironment), 37);
+  EXPECT_EQ(Slot(&S::TextDocument_CodeAction), 38);
+  EXPECT_EQ(Slot(&S::Workspace_ExecuteCommand), 39);
+  EXPECT_EQ(Slot(&S::TextDocument_DocumentHighlight), 40);
+  EXPECT_EQ(Slot(&S::TextDocument_FoldingRange), 41);
+  EXPECT_EQ(Slot(&S::TextDocument_SelectionRange), 42);
+  EXPECT_EQ(Slot(&S::TextDocument_SemanticTokensFull), 43);
+  EXPECT_EQ(Slot(&S::TextDocument_InlayHint), 44);
+  EXPECT_EQ(Slot(&S::CompletionItem_Resolve), 45);
+  EXPECT_EQ(Slot(&S::TextDocument_PrepareRename), 46);
+  EXPECT_EQ(Slot(&S::TextDocument_PrepareCallHierarchy), 47);
+  EXPECT_EQ(Slot(&S::CallHierarchy_IncomingCalls), 48);
+  EXPECT_EQ(Slot(&S::CallHierarchy_OutgoingCalls), 49);
+  EXPECT_EQ(Slot(&S::Workspace_DidChangeConfiguration), 50);
+  EXPECT_EQ(Slot(&S::Workspace_DidChangeWorkspaceFolders), 51);
+  EXPECT_EQ(Slot(&S::TextDocument_WillSave), 52);
 }
 
 }  // namespace

@@ -30,6 +30,7 @@ class ClangdSession : public ::testing::Test {
  protected:
   void SetUp() override {
     server = Vexil_Start(StartRecord(project, "clangd-session"));
+    EXPECT_TRUE(server->Enable("features"));  // code action literals, semantic tokens
     ASSERT_TRUE(server->Start(InitRecord(project)));
     for (const char* file : {"shapes.h", "shapes.cpp", "main.cpp"}) Open(*server, project, file);
     ASSERT_TRUE(AwaitIndexed());
@@ -158,6 +159,84 @@ TEST_F(ClangdSession, EditsFormatTheOddLayoutAndRenameEveryUse) {
   }
   EXPECT_EQ(change.documentChanges.size(), 3u);
   EXPECT_EQ(renamed, 5);
+}
+
+TEST_F(ClangdSession, IdeFeaturesFixHighlightFoldColourAndFollowCalls) {
+  auto at = At(project, "shapes.cpp", Find(project, "shapes.cpp", "Clamp(width_"));
+  std::vector<int> highlighted;
+  for (const LSP::DocumentHighlight& highlight : server->TextDocument_DocumentHighlight(&at)) {
+    highlighted.push_back(highlight.range.start.line);
+  }
+  std::sort(highlighted.begin(), highlighted.end());
+  EXPECT_EQ(highlighted, (std::vector<int>{at.position.line, at.position.line + 1, LineOf(project, "shapes.cpp", "int Clamp(")}));
+
+  // clangd folds only from version 15 on; before, it refuses the method.
+  LSP::FoldingRangeParams folding;
+  folding.textDocument.uri = Uri(project, "shapes.cpp");
+  std::vector<LSP::FoldingRange> folds = server->TextDocument_FoldingRange(&folding);
+  if (server->ServerCapabilities().foldingRangeProvider) {
+    EXPECT_TRUE(std::any_of(folds.begin(), folds.end(), [&](const LSP::FoldingRange& fold) {
+      return fold.startLine == LineOf(project, "shapes.cpp", "int Clamp(") && fold.endLine > fold.startLine;
+    }));
+  } else {
+    EXPECT_TRUE(folds.empty());
+    EXPECT_STREQ(server->ErrorMessage(), "method not found");
+  }
+
+  LSP::SelectionRangeParams selection;
+  selection.textDocument.uri = Uri(project, "main.cpp");
+  selection.positions = {clampCall};
+  std::vector<LSP::SelectionRange> selected = server->TextDocument_SelectionRange(&selection);
+  ASSERT_EQ(selected.size(), 1u);
+  EXPECT_EQ(selected[0].range.start.line, clampCall.line);
+  ASSERT_FALSE(selected[0].parents.empty());
+  EXPECT_EQ(selected[0].parents.back().start.line, LineOf(project, "main.cpp", "int main"));
+
+  LSP::SemanticTokensParams colouring;
+  colouring.textDocument.uri = folding.textDocument.uri;
+  std::vector<LSP::SemanticToken> tokens = server->TextDocument_SemanticTokensFull(&colouring)
+                                               .Decode(server->ServerCapabilities().semanticTokensProvider.legend);
+  EXPECT_TRUE(std::any_of(tokens.begin(), tokens.end(), [&](const LSP::SemanticToken& token) {
+    return token.line == at.position.line && token.character == at.position.character && token.length == 5 &&
+           token.type == "function";
+  }));
+
+  std::vector<LSP::CallHierarchyItem> items = server->TextDocument_PrepareCallHierarchy(&at);
+  ASSERT_EQ(items.size(), 1u);
+  EXPECT_EQ(items[0].name, "Clamp");
+  std::map<std::string, std::size_t> callers;
+  for (const LSP::CallHierarchyIncomingCall& call : server->CallHierarchy_IncomingCalls(&items[0])) {
+    callers[call.from.name] = call.fromRanges.size();
+  }
+  EXPECT_EQ(callers, (std::map<std::string, std::size_t>{{"Scale", 2}, {"main", 1}}));
+
+
+  // Last, as it changes main.cpp: a misspelt call. clangd publishes the error with a fix,
+  // and offers the fix as a quick fix only for the diagnostic it published.
+  std::string text = ReadFile(Path(project, "main.cpp"));
+  text.replace(text.find("shapes::Clamp(") + 8, 5, "Clamq");
+  LSP::DidChangeTextDocumentParams change;
+  change.textDocument = LSP::VersionedTextDocumentIdentifier(Uri(project, "main.cpp"), 2);
+  change.contentChanges.emplace_back();
+  change.contentChanges.back().text = text;
+  server->TextDocument_DidChange(&change);
+  auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(60);
+  while (server->TextDocument_Diagnostics(change.textDocument.uri.c_str()).empty() &&
+         std::chrono::steady_clock::now() < deadline) {
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+  }
+  LSP::CodeActionParams actions;
+  actions.textDocument.uri = change.textDocument.uri;
+  actions.range = LSP::Range(clampCall, clampCall);
+  actions.context.only = {"quickfix"};  // clangd offers refactorings too
+  std::vector<LSP::CodeAction> fixes = server->TextDocument_CodeAction(&actions);
+  ASSERT_EQ(fixes.size(), 1u);
+  EXPECT_EQ(fixes[0].kind, "quickfix");
+  ASSERT_EQ(fixes[0].edit.documentChanges.size(), 1u);
+  ASSERT_EQ(fixes[0].edit.documentChanges[0].edits.size(), 1u);
+  EXPECT_EQ(fixes[0].edit.documentChanges[0].edits[0].newText, "Clamp");
+  EXPECT_EQ(fixes[0].diagnostics.size(), 1u);
+  EXPECT_FALSE(server->HaveErrors());
 }
 
 TEST_F(ClangdSession, ChangedTextIsWhatTheServerAnswersAboutUntilShutdownAndExit) {

@@ -39,6 +39,17 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   std::string highlights = server->Request("textDocument/documentHighlight", LSP::ToJsonText(call).c_str());
   EXPECT_EQ(StartLines(highlights), (std::vector<int>{LineOf(project, "main.py", "import"), call.position.line}))
       << highlights;
+  std::vector<int> highlighted;
+  for (const LSP::DocumentHighlight& highlight : server->TextDocument_DocumentHighlight(&call)) {
+    highlighted.push_back(highlight.range.start.line);
+  }
+  EXPECT_EQ(highlighted, StartLines(highlights));
+  LSP::FoldingRangeParams folding;
+  folding.textDocument.uri = Uri(project, "geometry.py");
+  std::vector<LSP::FoldingRange> folds = server->TextDocument_FoldingRange(&folding);
+  EXPECT_TRUE(std::any_of(folds.begin(), folds.end(), [&](const LSP::FoldingRange& fold) {
+    return fold.startLine == LineOf(project, "geometry.py", "class Rectangle") && fold.endLine >= LineOf(project, "geometry.py", "self.height = clamp");
+  }));
 
   auto member = At<LSP::CompletionParams>(project, "main.py", Find(project, "main.py", "rectangle.scale", 10));
   std::set<std::string> labels;

@@ -28,7 +28,8 @@
 // params.names, null when unset), "fake/received" (the notifications seen so far),
 // "shutdown" (null), "exit" (a notification: ends the server). Any request may carry
 // params: delay (ms), stderr, garbage (raw stdout text), notifications (count), stale
-// (ids answered first), ask (methods sent to the client, each answer awaited), chatter
+// (ids answered first), ask (methods sent to the client, each answer awaited; a method
+// given as {"method", "params"} goes with those params), chatter
 // (notifications sent after each asked method, before its answer is read), askSameId,
 // error {code, message, id: "same"|"null"|"none"|number}, unparsable, size (bytes of "data"
 // in the result), split (write the answer in pieces of this size), trickle (ms of one
@@ -143,9 +144,9 @@ void Flood(int descriptor, const std::string& pattern, long long total) {
 // Arrays nested `depth` levels deep.
 std::string Nested(int depth) { return std::string(static_cast<std::size_t>(depth), '[') + std::string(static_cast<std::size_t>(depth), ']'); }
 
-std::string Request(const std::string& id, const std::string& method) {
-  return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"method\":" + Quote(method) +
-         ",\"params\":{\"items\":[{\"section\":\"a\"},{\"section\":\"b\"}]}}";
+std::string Request(const std::string& id, const std::string& method,
+                    const std::string& params = R"({"items":[{"section":"a"},{"section":"b"}]})") {
+  return "{\"jsonrpc\":\"2.0\",\"id\":" + id + ",\"method\":" + Quote(method) + ",\"params\":" + params + "}";
 }
 
 // Reads until the client's answer to one of our requests; its notifications on the way
@@ -215,16 +216,21 @@ bool Refused(const std::string& method) {
 // to the client and waits for its answer.
 std::vector<std::string> AskClient(const std::string& method, const rapidjson::Value& params,
                                    const std::string& requestId) {
-  std::vector<std::string> methods;
-  if (method == "initialize") methods = scripts.askedOnInitialize;
+  std::vector<std::pair<std::string, std::string>> methods;  // with their params, when given
+  if (method == "initialize")
+    for (const std::string& asked : scripts.askedOnInitialize) methods.emplace_back(asked, "");
   if (params.HasMember("ask") && params["ask"].IsArray()) {
-    for (const rapidjson::Value& asked : params["ask"].GetArray()) methods.push_back(asked.GetString());
+    for (const rapidjson::Value& asked : params["ask"].GetArray()) {
+      if (asked.IsString()) methods.emplace_back(asked.GetString(), "");
+      if (asked.IsObject() && asked.HasMember("params")) methods.emplace_back(StringParam(asked, "method"), Text(asked["params"]));
+    }
   }
   bool sameId = params.HasMember("askSameId") && params["askSameId"].IsTrue();
   std::vector<std::string> answers;
   int next = 0;
-  for (const std::string& asked : methods) {
-    Send(Request(sameId ? requestId : std::to_string(next++), asked));
+  for (const auto& [asked, askedParams] : methods) {
+    const std::string id = sameId ? requestId : std::to_string(next++);
+    Send(askedParams.empty() ? Request(id, asked) : Request(id, asked, askedParams));
     SendNotifications(IntParam(params, "chatter"));
     answers.push_back(ReadAnswer());
   }

@@ -2,6 +2,7 @@
 // and the way out after one.
 #include "host_process.h"
 
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
 #include <cstdio>
@@ -19,6 +20,7 @@ struct InterruptState {
   std::mutex mutex;
   std::condition_variable arrived;
   int signal = 0;
+  std::atomic<bool> windUpChildren{false};
 };
 
 // Never destroyed: the thread that ends the process may still hold it while main returns.
@@ -36,11 +38,14 @@ void EndAfterInterrupt(int signal) {
     state.signal = signal;
   }
   state.arrived.notify_all();
-  EndChildren();
+  if (!state.windUpChildren) EndChildren();
   std::this_thread::sleep_for(kWindUp);
+  if (state.windUpChildren) EndChildren();
   std::fflush(stdout);
   std::_Exit(128 + signal);
 }
+
+void WindUpChildren() { State().windUpChildren = true; }
 
 int Interrupted() {
   std::lock_guard<std::mutex> lock(State().mutex);

@@ -18,6 +18,9 @@ int WaitForInterrupt();
 // Called by the platform's side on the interrupt `signal`, on a thread of its own: tells
 // every waiter, ends the children, and ends the process unless the command does first.
 [[noreturn]] void EndAfterInterrupt(int signal);
+// From now on an interrupt leaves the children to the command for the few seconds it has
+// to wind up (it shuts its server down rather than have it killed); what is left then ends.
+void WindUpChildren();
 // Ends every process started below ours (servers, commands and what they started).
 void EndChildren();
 // How the most recent child to end did ("status 1", "signal 9"); "" when none has ended

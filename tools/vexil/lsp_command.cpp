@@ -1,7 +1,9 @@
 // `vexil lsp`: checks the files, starts one server, performs the actions in order, prints
 // each answer, and ends the server. Any failure makes the exit status 1; an interrupt
 // ends the server with it.
+#include <chrono>
 #include <iostream>
+#include <thread>
 
 #include "commands.h"
 #include "host_process.h"
@@ -32,6 +34,35 @@ void NoteOpenOnly(Session& session, const Outcome& outcome) {
             << "files it has not indexed are not included (open them first with --open)\n";
 }
 
+// --watch: the session stays open while the library tells the server about files changed
+// on disk; the diagnostics asked for are printed again whenever the server publishes new
+// ones. An interrupt ends it, the server shut down first.
+int WatchUntilInterrupted(Session& session, const LspOptions& options) {
+  constexpr std::chrono::milliseconds kTick{200};
+  WindUpChildren();
+  std::cerr << "vexil: telling " << session.Program() << " about changes under " << options.session.root
+            << "; Ctrl-C ends\n";
+  xLanguageServer& server = session.Server();
+  int version = server.DiagnosticsVersion();
+  while (!Interrupted() && server.IsRunning()) {
+    std::this_thread::sleep_for(kTick);
+    const int now = server.DiagnosticsVersion();
+    if (now == version) continue;
+    version = now;
+    for (const Action& action : options.actions) {
+      if (action.kind != ActionKind::Diagnostics) continue;
+      Outcome outcome;
+      outcome.diagnostics = server.TextDocument_Diagnostics(FileToUri(action.path.c_str()).c_str());
+      if (options.json) PrintJson(std::cout, action, outcome);
+      else PrintReadable(std::cout, action, outcome);
+      std::cout.flush();
+    }
+  }
+  if (!Interrupted()) return Fail(options, "watch", session.Program() + " exited" + (LastExit().empty() ? "" : " with " + LastExit()));
+  if (!session.Stop()) EndChildren();
+  return 128 + Interrupted();
+}
+
 }  // namespace
 
 std::string LspHelp() {
@@ -49,6 +80,8 @@ std::string LspHelp() {
       "  --trace=LEVEL     show the library's trace on stderr: off, messages or verbose\n"
       "  --env=NAME=VALUE  set a variable of the server's environment (repeatable)\n"
       "  --progress        announce work-done progress, and show the server's on stderr\n"
+      "  --watch           after the actions (none needed), tell the server about files changed\n"
+      "                    under the root and print --diagnostics again as they change, until Ctrl-C\n"
       "  --help            show this help\n"
       "\n"
       "Actions (lines and columns count from 1, columns in bytes):\n";
@@ -100,6 +133,7 @@ int RunLsp(const Arguments& arguments) {
     }
   }
   if (Interrupted()) return 128 + Interrupted();
+  if (options.session.watch) return WatchUntilInterrupted(session, options);
   // The library waits about a second for the server to end; the answers are in, and a
   // slower server is ended rather than left running.
   if (!session.Stop()) EndChildren();

@@ -108,6 +108,7 @@ void ReadOptions(OptionReader& reader, LspOptions& options) {
     else if (reader.Is("--json")) reader.Flag(), options.json = true;
     else if (reader.Is("--env")) options.session.environment.push_back(Variable(reader.Value()));
     else if (reader.Is("--progress")) reader.Flag(), options.session.progress = true;
+    else if (reader.Is("--watch")) reader.Flag(), options.session.watch = true;
     else if (ActionAt(reader)) throw UsageError(reader.Current() + " is an action: it follows '-- SERVER [ARG]...'");
     else reader.Unknown();
   }
@@ -143,7 +144,7 @@ LspOptions ParseLspOptions(const std::vector<std::string>& arguments) {
     ReadOperands(reader, *info, action);
     options.actions.push_back(action);
   }
-  if (options.actions.empty()) throw UsageError("no action given");
+  if (options.actions.empty() && !options.session.watch) throw UsageError("no action given");
   options.session.root = AbsolutePath(options.session.root.empty() ? "." : options.session.root);
   for (Action& action : options.actions) {
     if (!action.file.empty()) action.path = ResolvePath(options.session.root, action.file);

@@ -110,6 +110,7 @@ Session::Session(const SessionOptions& options) : options_(options), server_(nul
   server_ = Vexil_Start(StartRecord(options));
   for (const auto& [name, value] : options.environment) server_->SetEnvironment(name.c_str(), value.c_str());
   if (options.progress) server_->Enable("progress");
+  if (options.watch) server_->Enable("watchedFiles");
   server_->SetMessageHandler(&ShowServerMessage, this);
 }
 

@@ -21,6 +21,7 @@ struct SessionOptions {
   std::string language;  // the language id of every document, instead of the file's own
   std::vector<std::pair<std::string, std::string>> environment;  // the server's, over ours
   bool progress = false;  // announce work-done progress, and show it
+  bool watch = false;     // tell the server about files changed under the root
 };
 
 class Session {

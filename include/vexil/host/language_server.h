@@ -8,10 +8,15 @@
 #include "vexil/export.h"
 #include "vexil/host/records.h"
 #include "vexil/host/server_messages.h"
+#include "vexil/protocol/call_hierarchy.h"
+#include "vexil/protocol/code_actions.h"
 #include "vexil/protocol/diagnostics.h"
+#include "vexil/protocol/document_features.h"
 #include "vexil/protocol/feature_params.h"
 #include "vexil/protocol/feature_results.h"
+#include "vexil/protocol/semantic_tokens.h"
 #include "vexil/protocol/server_capabilities.h"
+#include "vexil/protocol/workspace_notifications.h"
 
 // One connection. Hosts call through the virtual slots, so the declaration order below is
 // part of the calling contract and must never change (Exit first, RangeFormatting after
@@ -66,7 +71,11 @@ class VEXIL_API xLanguageServer {
   // server's "window/workDoneProgress/create" to the message handler; "configuration"
   // announces workspace.configuration and hands "workspace/configuration" to the handler;
   // "messages" hands the handler both of those and every server request the library
-  // cannot answer itself. With nothing enabled the initialize request is what it always was.
+  // cannot answer itself; "features" announces what the calls after SetEnvironment need and
+  // hands the handler "workspace/applyEdit"; "watchedFiles" tells the server about files
+  // changed in the workspace folders as it registers for them; "positionEncoding" offers
+  // UTF-8 columns (ServerCapabilities().positionEncoding says what the server chose). With
+  // nothing enabled the initialize request is what it always was.
   virtual bool Enable(const char* feature) = 0;
   // What the server announced in its reply to initialize.
   virtual LSP::ServerCapabilities ServerCapabilities() = 0;
@@ -97,6 +106,35 @@ class VEXIL_API xLanguageServer {
   // host's own plus these; before Start. False for a name that cannot be a variable's and
   // while the server runs.
   virtual bool SetEnvironment(const char* name, const char* value) = 0;
+  // The requests IDEs use beyond the classic ones, under the same rules: empty results on
+  // any failure, the error state and trace lines as for the other calls. Enable("features")
+  // announces the client capabilities that servers look for before they answer them.
+  // Quick fixes and refactorings for a range. A context without diagnostics is sent with
+  // the diagnostics the server published for the document that touch the range, as the
+  // server sent them (servers match fixes to their own diagnostics).
+  virtual std::vector<LSP::CodeAction> TextDocument_CodeAction(LSP::CodeActionParams* params) = 0;
+  // Runs a command of a code action or a code lens; its result as JSON text, "null" for
+  // a null result, "" on failure. Arguments that are not a JSON array are refused.
+  virtual std::string Workspace_ExecuteCommand(LSP::ExecuteCommandParams* params) = 0;
+  virtual std::vector<LSP::DocumentHighlight> TextDocument_DocumentHighlight(LSP::TextDocumentPositionParams* params) = 0;
+  virtual std::vector<LSP::FoldingRange> TextDocument_FoldingRange(LSP::FoldingRangeParams* params) = 0;
+  virtual std::vector<LSP::SelectionRange> TextDocument_SelectionRange(LSP::SelectionRangeParams* params) = 0;
+  // Decode the tokens with ServerCapabilities().semanticTokensProvider.legend.
+  virtual LSP::SemanticTokens TextDocument_SemanticTokensFull(LSP::SemanticTokensParams* params) = 0;
+  virtual std::vector<LSP::InlayHint> TextDocument_InlayHint(LSP::InlayHintParams* params) = 0;
+  // Sends an item of a completion list back as the server sent it, "data" included, and
+  // returns it with the details the server adds. Items keep what the server sent only when
+  // it announced completionProvider.resolveProvider; others go back as their label.
+  virtual LSP::CompletionItem CompletionItem_Resolve(LSP::CompletionItem* item) = 0;
+  virtual LSP::PrepareRenameResult TextDocument_PrepareRename(LSP::TextDocumentPositionParams* params) = 0;
+  virtual std::vector<LSP::CallHierarchyItem> TextDocument_PrepareCallHierarchy(LSP::TextDocumentPositionParams* params) = 0;
+  // `item` is one that TextDocument_PrepareCallHierarchy (or a call) returned.
+  virtual std::vector<LSP::CallHierarchyIncomingCall> CallHierarchy_IncomingCalls(LSP::CallHierarchyItem* item) = 0;
+  virtual std::vector<LSP::CallHierarchyOutgoingCall> CallHierarchy_OutgoingCalls(LSP::CallHierarchyItem* item) = 0;
+  // Settings that are not JSON are refused with the "Error" line "Invalid JSON for settings: <reason>".
+  virtual void Workspace_DidChangeConfiguration(LSP::DidChangeConfigurationParams* params) = 0;
+  virtual void Workspace_DidChangeWorkspaceFolders(LSP::DidChangeWorkspaceFoldersParams* params) = 0;
+  virtual void TextDocument_WillSave(LSP::WillSaveTextDocumentParams* params) = 0;
 
  protected:
   // Not virtual, so no slot precedes Exit; protected, so hosts end connections with Exit.

@@ -138,6 +138,9 @@ class VEXIL_API ServerCapabilities : public Params {
   TextDocumentSyncOptions documentSync;
   // Whether the server wants "textDocument/didSave" ("save": true or an options object).
   bool documentSyncSave = false;
+  // How the server counts the columns of positions: "utf-16" unless it names another
+  // ("utf-8", "utf-32"), which it does only for a client that offered it.
+  std::string positionEncoding = "utf-16";
 };
 
 }  // namespace LSP
