@@ -29,17 +29,9 @@ T AtPosition(int line, int character) {
 
 std::string Json(LSP::JsonObject& value) { return LSP::ToJsonText(value); }
 
-TEST(FeatureParams, WorkspaceSymbolQueryIsWrittenEvenWhenEmpty) {
-  LSP::WorkspaceSymbolParams params;
-  EXPECT_EQ(Json(params), R"({"query":""})");
-  params.query = "Rect";
-  LSP::RequestMessage request("workspace/symbol", &params);
-  request.id = 5;
-  EXPECT_EQ(request.ToJSON(), R"({"jsonrpc":"2.0","id":5,"method":"workspace/symbol","params":{"query":"Rect"}})");
-}
-
-TEST(FeatureParams, CodeActionContextGivesDiagnosticsBackInTheProtocolsShape) {
-  // One as published (kept verbatim, "data" and all), one built by the host.
+TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
+  // A code action's context gives diagnostics back in the protocol's shape: one as published
+  // (kept verbatim, "data" and all), one built by the host.
   LSP::PublishDiagnosticsParams published;
   const std::string sent = R"({"range":{"start":{"line":1,"character":2},"end":{"line":1,"character":5}},)"
                            R"("severity":1,"code":"E1","source":"lint","message":"bad","data":{"fix":7}})";
@@ -54,16 +46,6 @@ TEST(FeatureParams, CodeActionContextGivesDiagnosticsBackInTheProtocolsShape) {
   actions.range = built.range;
   actions.context.diagnostics = {published.diagnostics[0], built};
   actions.context.only = {"quickfix"};
-  EXPECT_EQ(Json(actions), std::string("{") + kDocument +
-                               R"(,"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
-                               R"("context":{"diagnostics":[)" + sent +
-                               R"(,{"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
-                               R"("code":42,"message":"m"}],"only":["quickfix"]}})");
-  // The diagnostic's own writing stays flattened.
-  EXPECT_EQ(Json(built), R"({"start":{"line":3,"character":0},"end":{"line":3,"character":1},"code":42,"message":"m"})");
-}
-
-TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
   auto position = AtPosition<LSP::TextDocumentPositionParams>(3, 7);
   auto completion = AtPosition<LSP::CompletionParams>(1, 2);
   auto triggered = AtPosition<LSP::CompletionParams>(1, 2);
@@ -108,6 +90,7 @@ TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
   callsBuilt.item.name = "f";
   callsBuilt.item.kind = 12;
   callsBuilt.item.uri = "file:///a.c";
+  LSP::WorkspaceSymbolParams query;  // written even when empty
   LSP::ApplyWorkspaceEditResult answer;
   answer.failureReason = "read-only";
   const std::string document = std::string("{") + kDocument;
@@ -138,6 +121,11 @@ TEST(FeatureParams, RequestsAndNotificationsWriteExactlyTheirMembers) {
                     R"("end":{"line":0,"character":0}},"selectionRange":{"start":{"line":0,"character":0},)"
                     R"("end":{"line":0,"character":0}}}})"},
       {&answer, R"({"applied":false,"failureReason":"read-only"})"},
+      {&query, R"({"query":""})"},
+      {&actions, document + R"(,"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
+                            R"("context":{"diagnostics":[)" + sent +
+                     R"(,{"range":{"start":{"line":3,"character":0},"end":{"line":3,"character":1}},)"
+                     R"("code":42,"message":"m"}],"only":["quickfix"]}})"},
   };
   for (const auto& [params, expected] : rows) EXPECT_EQ(Json(*params), expected) << expected;
 

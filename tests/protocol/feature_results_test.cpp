@@ -1,9 +1,8 @@
 // Feature results in every shape a server may send: bare arrays and list objects, null,
 // single locations, string / object / array hover contents, hierarchical symbols, code
 // actions mixed with bare commands, selection chains, hint labels, rename answers, tokens.
-#include <gtest/gtest.h>
-
 #include <gmock/gmock.h>
+#include <gtest/gtest.h>
 
 #include "reply_helpers.h"
 #include "vexil/protocol/document_features.h"
@@ -12,283 +11,176 @@
 
 namespace {
 
-using vexil_test::ReadResult;
-using vexil_test::ThrownText;
+using namespace vexil_test;
 
-const char kRange[] = R"({"start":{"line":2,"character":1},"end":{"line":2,"character":5}})";
+const std::string kRange = R"({"start":{"line":2,"character":1},"end":{"line":2,"character":5}})";
+const std::string kNotAnArray = "threw: Expecting a array JSON object but found 3 JSON object .";
 
-TEST(CompletionList, ReadsArraysListsAndNullAlike) {
-  LSP::CompletionList array;
-  ReadResult(R"([{"label":"a"},{"label":"b"}])", array);
-  EXPECT_EQ(array.items.size(), 2u);
-  EXPECT_FALSE(array.isIncomplete);
-
+LSP::CompletionList WithoutItemJson() {
   LSP::CompletionList list;
-  ReadResult(R"({"isIncomplete":true,"items":[{"label":"a"},{"label":"b"}]})", list);
-  ASSERT_EQ(list.items.size(), 2u);
-  EXPECT_TRUE(list.isIncomplete);
-  EXPECT_EQ(list.items[1].label, "b");
-
-  for (const char* nothing : {"null", R"("text")", "3"}) {
-    LSP::CompletionList empty;
-    ReadResult(nothing, empty);
-    EXPECT_TRUE(empty.items.empty()) << nothing;
-  }
-  LSP::CompletionList bad;
-  EXPECT_EQ(ThrownText([&] { ReadResult(R"({"items":{}})", bad); }),
-            "Expecting a array JSON object but found 3 JSON object .");
-  EXPECT_TRUE(LSP::CompletionList().IsObject());
+  list.keepItemJson = false;
+  return list;
 }
 
-TEST(CompletionItem, ReadsEveryKeptMemberAndDefaultsTheAbsentOnes) {
-  LSP::CompletionList list;
-  ReadResult(std::string(R"j([{"label":"push_back","labelDetails":{"detail":"(T)","description":"void"},"kind":2,)j"
-                         R"("detail":"void","documentation":"Appends.","deprecated":true,"sortText":"1","filterText":"pb",)"
-                         R"("insertText":"push_back","insertTextFormat":2,"textEdit":{"range":)") +
-                 kRange + R"(,"newText":"push_back"},"commitCharacters":["("]},{"label":"x"}])",
-             list);
-  ASSERT_EQ(list.items.size(), 2u);
-  const LSP::CompletionItem& full = list.items[0];
-  EXPECT_EQ(full.labelDetails.detail, "(T)");
-  EXPECT_EQ(full.labelDetails.description, "void");
-  EXPECT_EQ(full.kind, 2);
-  EXPECT_EQ(full.documentation.value, "Appends.");
-  EXPECT_TRUE(full.deprecated);
-  EXPECT_EQ(full.sortText + full.filterText + full.insertText, "1pbpush_back");
-  EXPECT_EQ(full.insertTextFormat, 2);
-  EXPECT_EQ(full.textEdit.range.end.character, 5);
-  EXPECT_EQ(full.textEdit.newText, "push_back");
-  const LSP::CompletionItem& bare = list.items[1];
-  EXPECT_EQ(bare.kind, -1);
-  EXPECT_EQ(bare.insertTextFormat, -1);
-  EXPECT_EQ(bare.textEdit.range.start.line, -1);
-  // Each item keeps its text, for a resolve, unless the list is told it need not.
-  EXPECT_EQ(bare.rawJson, R"({"label":"x"})");
-  EXPECT_NE(full.rawJson.find(R"("commitCharacters":["("])"), std::string::npos);
-  LSP::CompletionList lean;
-  lean.keepItemJson = false;
-  ReadResult(R"({"items":[{"label":"x","data":1}]})", lean);
-  EXPECT_EQ(lean.items.at(0).rawJson, "");
+TEST(FeatureResults, EveryShapeAServerMaySendReadsIntoItsResult) {
+  const std::string item = R"j({"label":"push_back","labelDetails":{"detail":"(T)","description":"void"},"kind":2,)j"
+                           R"("detail":"void","documentation":"Appends.","deprecated":true,"sortText":"1",)"
+                           R"("filterText":"pb","insertText":"push_back","insertTextFormat":2,"textEdit":{"range":)" +
+                           kRange + R"(,"newText":"push_back"},"commitCharacters":["("]})";
+  const std::string symbols = R"([{"name":"body","kind":5,"range":)" + kRange +
+                              R"(,"selectionRange":{"start":{"line":2,"character":1},"end":{"line":2,"character":2}},)"
+                              R"("children":[{"name":"color","kind":7,"range":{"start":{"line":3,"character":2},)"
+                              R"("end":{"line":3,"character":9}},"selectionRange":{"start":{"line":3,"character":2},)"
+                              R"("end":{"line":3,"character":7}}}]},)"
+                              R"({"name":"flat","kind":12,"location":{"uri":"file:///other.css","range":)" +
+                              kRange + "}}]";
+  const std::string actions =
+      R"([{"title":"Run","command":"run","arguments":[1,{"a":null}]},)"
+      R"({"title":"Fix","kind":"quickfix","diagnostics":[{"range":)" + kRange +
+      R"(,"message":"m","code":"E1"}],"edit":{"documentChanges":[{"textDocument":)"
+      R"({"uri":"file:///a.c","version":3},"edits":[{"range":)" + kRange +
+      R"(,"newText":"x"}]}]},"command":{"title":"Then","command":"after"}},{"title":"Bare"}])";
+  const std::string hints =
+      R"([{"position":{"line":3,"character":8},"label":"value:","kind":2,"paddingRight":true},)"
+      R"({"position":{"line":4,"character":1},"label":[{"value":": "},{"value":"Rectangle","location":)"
+      R"({"uri":"file:///s.h","range":{"start":{"line":9,"character":6},"end":{"line":9,"character":15}}}}],)"
+      R"("tooltip":"type","textEdits":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":1}},)"
+      R"("newText":": Rectangle"}]}])";
+  vexil_test::CheckRows({
+      {"completion array", ReadAs<LSP::CompletionList>(R"([{"label":"a"},{"label":"b"}])", Completions), "2|0|b"},
+      {"completion list",
+       ReadAs<LSP::CompletionList>(R"({"isIncomplete":true,"items":[{"label":"a"},{"label":"b"}]})", Completions),
+       "2|1|b"},
+      {"completion null", ReadAs<LSP::CompletionList>("null", Completions), "0|0|"},
+      {"completion text", ReadAs<LSP::CompletionList>(R"("text")", Completions), "0|0|"},
+      {"completion number", ReadAs<LSP::CompletionList>("3", Completions), "0|0|"},
+      {"completion items not an array", ReadAs<LSP::CompletionList>(R"({"items":{}})", Completions), kNotAnArray},
+      // Each item keeps its text, for a resolve, unless the list is told it need not.
+      {"completion items",
+       ReadAs<LSP::CompletionList>("[" + item + R"(,{"label":"x"}])",
+                                   [&](const LSP::CompletionList& l) {
+                                     return Items(l.items, Item) + "|" + std::to_string(l.items[0].rawJson == item) +
+                                            "|" + l.items[1].rawJson;
+                                   }),
+       "push_back|(T)|void|2|void|Appends.|1|1|pb|push_back|2|2:1-2:5|push_back;x|||-1|||0||||-1|" + kNoRange +
+           "||1|{\"label\":\"x\"}"},
+      {"completion item text not kept",
+       ReadAs<LSP::CompletionList>(R"({"items":[{"label":"x","data":1}]})",
+                                   [](const LSP::CompletionList& l) { return "[" + l.items.at(0).rawJson + "]"; },
+                                   WithoutItemJson()),
+       "[]"},
+      {"locations null", ReadAs<LSP::LocationsList>("null", Locations), "0|"},
+      {"location single", ReadAs<LSP::LocationsList>(R"({"uri":"file:///a.c","range":)" + kRange + "}", Locations),
+       "1|file:///a.c|2:1-2:5"},
+      {"locations array", ReadAs<LSP::LocationsList>(R"([{"uri":"file:///a.c"},{"uri":"file:///b.c"}])", Locations),
+       "2|file:///a.c|" + kNoRange + ";file:///b.c|" + kNoRange},
+      {"hover text", ReadAs<LSP::Hover>(R"({"contents":"int x"})", Hovered), "|int x||" + kNoRange},
+      {"hover markup",
+       ReadAs<LSP::Hover>(R"({"contents":{"kind":"markdown","value":"**x**"},"range":)" + kRange + "}", Hovered),
+       "markdown|**x**||2:1-2:5"},
+      {"hover marked strings",
+       ReadAs<LSP::Hover>(R"({"contents":["first",{"language":"c","value":"int x"},"second"]})", Hovered),
+       "|first|c:int x|" + kNoRange},
+      {"signature help",
+       ReadAs<LSP::SignatureHelp>(
+           R"j({"signatures":[{"label":"f(int a)","documentation":"Does f.","parameters":[{"label":"int a"}]}]})j",
+           Signatures),
+       "-1|-1|f(int a)|Does f.|int a"},
+      {"signature parameter labelled by offsets",
+       ReadAs<LSP::SignatureHelp>(R"j({"signatures":[{"label":"f(int a)","parameters":[{"label":[2,7]}]}]})j",
+                                  Signatures),
+       "threw: Error:Error:Expecting a 'string' JSON object but found 'array ' JSON object.\n\n"
+       "Expecting a array JSON object but found 4 JSON object.\n\n"
+       "Expecting a array JSON object but found 4 JSON object."},
+      // Hierarchical symbols take the requested document and their own range.
+      {"document symbols",
+       ReadAs<LSP::SymbolInformationList>(
+           symbols, [](const LSP::SymbolInformationList& l) { return Symbols(l.items); },
+           LSP::SymbolInformationList("file:///style.css")),
+       "body|5|file:///style.css|2:1-2:5{color|7|file:///style.css|3:2-3:9};flat|12|file:///other.css|2:1-2:5"},
+      {"workspace symbol without location",
+       ReadAs<LSP::SymbolInformationList>(R"([{"name":"x","kind":13}])",
+                                          [](const LSP::SymbolInformationList& l) { return Symbols(l.items); }),
+       "x|13||" + kNoRange},
+      {"symbols not an array",
+       ReadAs<LSP::SymbolInformationList>("{}", [](const LSP::SymbolInformationList&) { return ""; }), kNotAnArray},
+      {"formatting edits",
+       ReadAs<LSP::DocumentFormattingList>("[{\"range\":" + kRange + R"(,"newText":"  "}])",
+                                           [](const LSP::DocumentFormattingList& l) { return Edits(l.items); }),
+       "2:1-2:5|  "},
+      {"formatting edit text not a string",
+       ReadAs<LSP::DocumentFormattingList>(R"([{"range":{},"newText":1}])",
+                                           [](const LSP::DocumentFormattingList&) { return ""; }),
+       "threw: Error:Expecting a 'string' JSON object but found 'number' JSON object.\n\n"
+       "Expecting a array JSON object but found 4 JSON object."},
+      // Code actions mix with bare commands in one list.
+      {"code actions", ReadAs<LSP::CodeActionList>(actions, Actions),
+       "Run||0|1|Run|run|[1,{\"a\":null}]||;Fix|quickfix|1|1|Then|after||E1|file:///a.c|3|2:1-2:5|x;Bare||0|0|||||"},
+      {"code actions not an array", ReadAs<LSP::CodeActionList>("{}", Actions), kNotAnArray},
+      // Parents are read innermost first.
+      {"selection ranges",
+       ReadAs<LSP::SelectionRangeList>(
+           R"([{"range":{"start":{"line":5,"character":2},"end":{"line":5,"character":4}},"parent":{"range":)"
+           R"({"start":{"line":5,"character":0},"end":{"line":6,"character":0}},"parent":{"range":)"
+           R"({"start":{"line":0,"character":0},"end":{"line":9,"character":0}}}}},{"range":{}}])",
+           Selections),
+       "5:2-5:4|5:0-6:0,0:0-9:0;" + kNoRange + "|"},
+      // A label is text or its parts joined.
+      {"inlay hints", ReadAs<LSP::InlayHintList>(hints, Hints),
+       "value:||2|0|1||;: Rectangle|: @,Rectangle@file:///s.h|-1|0|0|type|4:1-4:1|: Rectangle"},
+      {"prepare rename: range", ReadAs<LSP::PrepareRenameResult>(kRange, Renaming), "1|2:1-2:5|"},
+      {"prepare rename: range and placeholder",
+       ReadAs<LSP::PrepareRenameResult>(
+           R"({"range":{"start":{"line":2,"character":3},"end":{"line":2,"character":5}},"placeholder":"x"})",
+           Renaming),
+       "1|2:3-2:5|x"},
+      {"prepare rename: default", ReadAs<LSP::PrepareRenameResult>(R"({"defaultBehavior":true})", Renaming),
+       "1|" + kNoRange + "|"},
+      {"prepare rename: no default", ReadAs<LSP::PrepareRenameResult>(R"({"defaultBehavior":false})", Renaming),
+       "0|" + kNoRange + "|"},
+      {"prepare rename: null", ReadAs<LSP::PrepareRenameResult>("null", Renaming), "0|" + kNoRange + "|"},
+  });
 }
 
-TEST(LocationsList, ReadsNullASingleLocationOrAnArray) {
-  LSP::LocationsList none;
-  ReadResult("null", none);
-  EXPECT_TRUE(none.items.empty());
-  EXPECT_FALSE(none.IsObject());
-
-  LSP::LocationsList single;
-  ReadResult(std::string(R"({"uri":"file:///a.c","range":)") + kRange + "}", single);
-  ASSERT_EQ(single.items.size(), 1u);
-  EXPECT_EQ(single.items[0].uri, "file:///a.c");
-  EXPECT_EQ(single.items[0].range.start.character, 1);
-
-  LSP::LocationsList several;
-  ReadResult(R"([{"uri":"file:///a.c"},{"uri":"file:///b.c"}])", several);
-  ASSERT_EQ(several.items.size(), 2u);
-  EXPECT_EQ(several.items[1].uri, "file:///b.c");
-}
-
-TEST(Hover, ContentsMayBeAStringAnObjectOrAnArray) {
-  LSP::Hover text;
-  ReadResult(R"({"contents":"int x"})", text);
-  EXPECT_EQ(text.contents.value, "int x");
-  EXPECT_EQ(text.contents.kind, "");
-  EXPECT_EQ(text.range.start.line, -1);
-  EXPECT_EQ(text.range.end.character, -1);
-
-  LSP::Hover markup;
-  ReadResult(std::string(R"({"contents":{"kind":"markdown","value":"**x**"},"range":)") + kRange + "}", markup);
-  EXPECT_EQ(markup.contents.kind, "markdown");
-  EXPECT_EQ(markup.contents.value, "**x**");
-  EXPECT_EQ(markup.range.end.character, 5);
-
-  LSP::Hover marked;
-  ReadResult(R"({"contents":["first",{"language":"c","value":"int x"},"second"]})", marked);
-  EXPECT_EQ(marked.contents.value, "first");
-  ASSERT_EQ(marked.contents.items.size(), 1u);
-  EXPECT_EQ(marked.contents.items[0].language + ":" + marked.contents.items[0].value, "c:int x");
-}
-
-TEST(SignatureHelp, ReadsSignaturesAndRejectsOffsetLabels) {
-  LSP::SignatureHelp help;
-  ReadResult(R"j({"signatures":[{"label":"f(int a)","documentation":"Does f.","parameters":[{"label":"int a"}]}]})j", help);
-  ASSERT_EQ(help.signatures.size(), 1u);
-  EXPECT_EQ(help.signatures[0].documentation.value, "Does f.");
-  EXPECT_EQ(help.signatures[0].parameters[0].label, "int a");
-  EXPECT_EQ(help.activeSignature, -1);
-  EXPECT_EQ(help.activeParameter, -1);
-
-  LSP::SignatureHelp offsets;
-  EXPECT_EQ(ThrownText([&] { ReadResult(R"j({"signatures":[{"label":"f(int a)","parameters":[{"label":[2,7]}]}]})j", offsets); }),
-            "Error:Error:Expecting a 'string' JSON object but found 'array ' JSON object.\n\n"
-            "Expecting a array JSON object but found 4 JSON object.\n\n"
-            "Expecting a array JSON object but found 4 JSON object.");
-}
-
-TEST(SymbolInformationList, HierarchicalSymbolsTakeTheRequestedDocumentAndTheirRange) {
-  LSP::SymbolInformationList symbols("file:///style.css");
-  ReadResult(std::string(R"([{"name":"body","kind":5,"range":)") + kRange +
-                 R"(,"selectionRange":{"start":{"line":2,"character":1},"end":{"line":2,"character":2}},)"
-                 R"("children":[{"name":"color","kind":7,"range":{"start":{"line":3,"character":2},)"
-                 R"("end":{"line":3,"character":9}},"selectionRange":{"start":{"line":3,"character":2},)"
-                 R"("end":{"line":3,"character":7}}}]},)"
-                 R"({"name":"flat","kind":12,"location":{"uri":"file:///other.css","range":)" +
-                 kRange + "}}]",
-             symbols);
-  ASSERT_EQ(symbols.items.size(), 2u);
-  const LSP::SymbolInformation& body = symbols.items[0];
-  EXPECT_EQ(body.location.uri, "file:///style.css");
-  EXPECT_EQ(body.location.range.end.character, 5);
-  ASSERT_EQ(body.children.size(), 1u);
-  EXPECT_EQ(body.children[0].location.uri, "file:///style.css");
-  EXPECT_EQ(body.children[0].location.range.end.character, 9);
-  EXPECT_EQ(symbols.items[1].location.uri, "file:///other.css");
-
-  LSP::SymbolInformationList workspace;
-  ReadResult(R"([{"name":"x","kind":13}])", workspace);
-  EXPECT_EQ(workspace.items[0].location.uri, "");
-  EXPECT_EQ(workspace.items[0].location.range.start.line, -1);
-  EXPECT_EQ(ThrownText([&] { ReadResult("{}", workspace); }), "Expecting a array JSON object but found 3 JSON object .");
-
-  // Reading nests as deep as the tree: 1,000 levels read, deeper ones are malformed.
+TEST(FeatureResults, NestingIsReadToAThousandLevelsAndNoDeeper) {
   for (int depth : {1000, 1001, 300000}) {
     std::string tree;
     for (int level = 0; level < depth; ++level) tree += R"({"name":"s","kind":5,"children":[)";
     for (int level = 0; level < depth; ++level) tree += "]}";
     LSP::SymbolInformationList nested("file:///deep.css");
-    std::string thrown = ThrownText([&] { ReadResult("[" + tree + "]", nested); });
+    std::string thrown = ThrownText([&] { vexil_test::ReadResult("[" + tree + "]", nested); });
     EXPECT_EQ(thrown.find("Failed to read JSON object: nested deeper than 1000 levels") != std::string::npos,
               depth > 1000)
-        << depth << ": " << thrown;
+        << "symbols " << depth << ": " << thrown;
   }
-}
-
-TEST(DocumentFormattingList, ReadsEditsAsAnArrayOnly) {
-  LSP::DocumentFormattingList edits;
-  ReadResult(std::string(R"([{"range":)") + kRange + R"(,"newText":"  "}])", edits);
-  ASSERT_EQ(edits.items.size(), 1u);
-  EXPECT_EQ(edits.items[0].newText, "  ");
-  EXPECT_FALSE(edits.IsObject());
-  LSP::DocumentFormattingList bad;
-  EXPECT_EQ(ThrownText([&] { ReadResult(R"([{"range":{},"newText":1}])", bad); }),
-            "Error:Expecting a 'string' JSON object but found 'number' JSON object.\n\n"
-            "Expecting a array JSON object but found 4 JSON object.");
-}
-
-TEST(CodeActionList, ActionsAndBareCommandsMixInOneList) {
-  LSP::CodeActionList list;
-  ReadResult(std::string(R"([{"title":"Run","command":"run","arguments":[1,{"a":null}]},)"
-                         R"({"title":"Fix","kind":"quickfix","diagnostics":[{"range":)") +
-                 kRange + R"(,"message":"m","code":"E1"}],"edit":{"documentChanges":[{"textDocument":)"
-                          R"({"uri":"file:///a.c","version":3},"edits":[{"range":)" +
-                 kRange + R"(,"newText":"x"}]}]},"command":{"title":"Then","command":"after"}},{"title":"Bare"}])",
-             list);
-  ASSERT_EQ(list.items.size(), 3u);
-  const LSP::CodeAction& command = list.items[0];
-  EXPECT_EQ(command.title, "Run");
-  EXPECT_EQ(command.command.arguments, R"([1,{"a":null}])");
-  EXPECT_FALSE(command.HasEdit());
-  const LSP::CodeAction& fix = list.items[1];
-  EXPECT_EQ(fix.diagnostics[0].codeText, "E1");
-  EXPECT_EQ(fix.edit.documentChanges[0].textDocument.version, 3);
-  EXPECT_EQ(fix.command.command, "after");
-  EXPECT_FALSE(list.items[2].HasEdit() || list.items[2].HasCommand());
-  EXPECT_EQ(ThrownText([&] { ReadResult("{}", list); }), "Expecting a array JSON object but found 3 JSON object .");
-}
-
-TEST(SelectionRange, ParentsAreReadInnermostFirstUpToAThousand) {
-  LSP::SelectionRangeList list;
-  ReadResult(R"([{"range":{"start":{"line":5,"character":2},"end":{"line":5,"character":4}},"parent":{"range":)"
-             R"({"start":{"line":5,"character":0},"end":{"line":6,"character":0}},"parent":{"range":)"
-             R"({"start":{"line":0,"character":0},"end":{"line":9,"character":0}}}}},{"range":{}}])",
-             list);
-  ASSERT_EQ(list.items.size(), 2u);
-  EXPECT_EQ(list.items[0].range.start.character, 2);
-  ASSERT_EQ(list.items[0].parents.size(), 2u);
-  EXPECT_EQ(list.items[0].parents[0].end.line, 6);
-  EXPECT_EQ(list.items[0].parents[1].end.line, 9);
-  EXPECT_TRUE(list.items[1].parents.empty());
-
   // Each parent wraps the range before it; the last wrapped is the innermost.
   for (const int depth : {1000, 1001}) {
-    std::string json = std::string(R"({"range":)") + kRange + "}";
-    for (int k = 0; k < depth; ++k) json = std::string(R"({"range":)") + kRange + R"(,"parent":)" + json + "}";
+    std::string json = R"({"range":)" + kRange + "}";
+    for (int k = 0; k < depth; ++k) json = R"({"range":)" + kRange + R"(,"parent":)" + json + "}";
     LSP::SelectionRangeList deep;
-    const std::string thrown = ThrownText([&] { ReadResult("[" + json + "]", deep); });
+    const std::string thrown = ThrownText([&] { vexil_test::ReadResult("[" + json + "]", deep); });
     if (depth == 1000) EXPECT_EQ(deep.items.at(0).parents.size(), 1000u) << thrown;
     else EXPECT_THAT(thrown, testing::HasSubstr("parent\nFailed to read JSON object: nested deeper than 1000 levels"));
   }
 }
 
-TEST(InlayHint, LabelIsTextOrPartsJoined) {
-  LSP::InlayHintList hints;
-  ReadResult(R"([{"position":{"line":3,"character":8},"label":"value:","kind":2,"paddingRight":true},)"
-             R"({"position":{"line":4,"character":1},"label":[{"value":": "},{"value":"Rectangle","location":)"
-             R"({"uri":"file:///s.h","range":{"start":{"line":9,"character":6},"end":{"line":9,"character":15}}}}],)"
-             R"("tooltip":"type","textEdits":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":1}},)"
-             R"("newText":": Rectangle"}]}])",
-             hints);
-  ASSERT_EQ(hints.items.size(), 2u);
-  EXPECT_EQ(hints.items[0].label, "value:");
-  EXPECT_TRUE(hints.items[0].labelParts.empty());
-  EXPECT_TRUE(hints.items[0].paddingRight && !hints.items[0].paddingLeft);
-  const LSP::InlayHint& parts = hints.items[1];
-  EXPECT_EQ(parts.label, ": Rectangle");
-  ASSERT_EQ(parts.labelParts.size(), 2u);
-  EXPECT_EQ(parts.labelParts[1].location.uri, "file:///s.h");
-  EXPECT_EQ(parts.labelParts[0].location.uri, "");
-  EXPECT_EQ(parts.kind, -1);
-  EXPECT_EQ(parts.tooltip.value, "type");
-  EXPECT_EQ(parts.textEdits.at(0).newText, ": Rectangle");
-}
-
-TEST(PrepareRenameResult, RangeRangeWithPlaceholderOrDefaultBehavior) {
-  struct Row {
-    const char* result;
-    bool canRename;
-    int startCharacter;
-    const char* placeholder;
-  } rows[] = {
-      {kRange, true, 1, ""},
-      {R"({"range":{"start":{"line":2,"character":3},"end":{"line":2,"character":5}},"placeholder":"x"})", true, 3, "x"},
-      {R"({"defaultBehavior":true})", true, -1, ""},
-      {R"({"defaultBehavior":false})", false, -1, ""},
-      {"null", false, -1, ""},
-  };
-  for (const Row& row : rows) {
-    LSP::PrepareRenameResult result;
-    ReadResult(row.result, result);
-    EXPECT_EQ(result.CanRename(), row.canRename) << row.result;
-    EXPECT_EQ(result.range.start.character, row.startCharacter) << row.result;
-    EXPECT_EQ(result.placeholder, row.placeholder) << row.result;
-  }
-}
-
-TEST(SemanticTokens, DecodeMakesPositionsAbsoluteAndNamesWhatTheLegendKnows) {
+TEST(FeatureResults, SemanticTokensDecodeToAbsolutePositionsAndTheLegendsNames) {
   LSP::SemanticTokensLegend legend;
   legend.tokenTypes = {"variable", "function"};
   legend.tokenModifiers = {"declaration", "static"};
-  LSP::SemanticTokens tokens;
+  const auto decoded = [&](const LSP::SemanticTokens& tokens) {
+    return Fields(tokens.resultId, Items(tokens.Decode(legend), [](const LSP::SemanticToken& t) {
+                    return Fields(t.line, t.character, t.length, t.type, t.typeIndex, t.modifierBits,
+                                  Items(t.modifiers, [](const std::string& m) { return m; }, ","));
+                  }));
+  };
   // Same line twice (starts add up), a new line (start from 0), an unknown type and
   // modifier bits beyond the legend (the 32nd included), and an incomplete last group.
-  ReadResult(R"({"resultId":"7","data":[2,4,3,1,1, 0,6,2,0,2, 3,1,5,9,4294967295, 1,2]})", tokens);
-  const std::vector<LSP::SemanticToken> decoded = tokens.Decode(legend);
-  ASSERT_EQ(decoded.size(), 3u);
-  EXPECT_EQ(decoded[0].line * 100 + decoded[0].character, 204);
-  EXPECT_EQ(decoded[0].type, "function");
-  EXPECT_THAT(decoded[0].modifiers, testing::ElementsAre("declaration"));
-  EXPECT_EQ(decoded[1].line * 100 + decoded[1].character, 210);
-  EXPECT_THAT(decoded[1].modifiers, testing::ElementsAre("static"));
-  EXPECT_EQ(decoded[2].line * 100 + decoded[2].character, 501);
-  EXPECT_EQ(decoded[2].length, 5);
-  EXPECT_EQ(decoded[2].type, "");
-  EXPECT_EQ(decoded[2].typeIndex, 9);
-  EXPECT_EQ(decoded[2].modifierBits, 4294967295u);
-  EXPECT_THAT(decoded[2].modifiers, testing::ElementsAre("declaration", "static"));
-  LSP::SemanticTokens bad;
-  EXPECT_EQ(ThrownText([&] { ReadResult(R"({"data":[1,-2]})", bad); }),
-            "Expecting a uint JSON object but found 6 JSON object .");
+  EXPECT_EQ(ReadAs<LSP::SemanticTokens>(R"({"resultId":"7","data":[2,4,3,1,1, 0,6,2,0,2, 3,1,5,9,4294967295, 1,2]})",
+                                        decoded),
+            "7|2|4|3|function|1|1|declaration;2|10|2|variable|0|2|static;5|1|5||9|4294967295|declaration,static");
+  EXPECT_EQ(ReadAs<LSP::SemanticTokens>(R"({"data":[1,-2]})", decoded),
+            "threw: Expecting a uint JSON object but found 6 JSON object .");
 }
 
 }  // namespace

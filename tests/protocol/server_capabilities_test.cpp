@@ -7,98 +7,97 @@
 
 namespace {
 
-using vexil_test::ReadResult;
-using vexil_test::ThrownText;
+using namespace vexil_test;
 
-LSP::ServerCapabilities Read(const std::string& capabilities) {
-  LSP::InitializeResult result;
-  ReadResult(R"({"capabilities":)" + capabilities + "}", result);
-  return result.capabilities;
+// The capabilities of an initialize result `{"capabilities":<capabilities>}` as `digest` tells them.
+template <typename Digest>
+std::string Read(const std::string& capabilities, Digest digest) {
+  return ReadAs<LSP::InitializeResult>(R"({"capabilities":)" + capabilities + "}",
+                                       [&](const LSP::InitializeResult& r) { return digest(r.capabilities); });
 }
 
-TEST(ServerCapabilities, BooleanProviderIsTrueForTrueAndForAnOptionsObjectOnly) {
-  const LSP::ServerCapabilities read = Read(
-      R"({"hoverProvider":true,"definitionProvider":{},"renameProvider":{"prepareProvider":true},)"
-      R"("referencesProvider":false,"typeDefinitionProvider":null,"implementationProvider":1,)"
-      R"("documentSymbolProvider":"yes","workspaceSymbolProvider":[true]})");
-  for (bool provided : {read.hoverProvider, read.definitionProvider, read.renameProvider}) EXPECT_TRUE(provided);
-  for (bool absent : {read.referencesProvider, read.typeDefinitionProvider, read.implementationProvider,
-                      read.documentSymbolProvider, read.workspaceSymbolProvider, read.codeActionProvider,
-                      read.documentFormattingProvider})
-    EXPECT_FALSE(absent);
-
-  // A server that sends options objects for all of them supports them all.
-  const LSP::ServerCapabilities objects = Read(
-      R"({"hoverProvider":{},"definitionProvider":{},"typeDefinitionProvider":{},"implementationProvider":{},)"
-      R"("referencesProvider":{},"documentHighlightProvider":{},"documentSymbolProvider":{},)"
-      R"("workspaceSymbolProvider":{},"codeActionProvider":{},"documentFormattingProvider":{},)"
-      R"("documentRangeFormattingProvider":{},"renameProvider":{"prepareProvider":true},"foldingRangeProvider":{},)"
-      R"("selectionRangeProvider":{},"callHierarchyProvider":{},"inlayHintProvider":{}})");
-  for (bool provided : {objects.hoverProvider, objects.definitionProvider, objects.typeDefinitionProvider,
-                        objects.implementationProvider, objects.referencesProvider, objects.documentHighlightProvider,
-                        objects.documentSymbolProvider, objects.workspaceSymbolProvider, objects.codeActionProvider,
-                        objects.documentFormattingProvider, objects.documentRangeFormattingProvider,
-                        objects.renameProvider, objects.prepareRenameProvider, objects.foldingRangeProvider,
-                        objects.selectionRangeProvider, objects.callHierarchyProvider, objects.inlayHintProvider})
-    EXPECT_TRUE(provided);
-  EXPECT_TRUE(read.prepareRenameProvider);
-  EXPECT_FALSE(Read(R"({"renameProvider":true})").prepareRenameProvider);
+// Every boolean provider, in the order of the options-object row below.
+std::string Booleans(const LSP::ServerCapabilities& c) {
+  return Fields(c.hoverProvider, c.definitionProvider, c.typeDefinitionProvider, c.implementationProvider,
+                c.referencesProvider, c.documentHighlightProvider, c.documentSymbolProvider, c.workspaceSymbolProvider,
+                c.codeActionProvider, c.documentFormattingProvider, c.documentRangeFormattingProvider, c.renameProvider,
+                c.prepareRenameProvider, c.foldingRangeProvider, c.selectionRangeProvider, c.callHierarchyProvider,
+                c.inlayHintProvider);
 }
 
-TEST(ServerCapabilities, OptionProvidersFillTheirFieldsAndIgnoreTheSyncMember) {
-  const LSP::ServerCapabilities read = Read(
-      R"({"textDocumentSync":2,"completionProvider":{"triggerCharacters":[".",">"],"resolveProvider":true},)"
-      R"("signatureHelpProvider":{"triggerCharacters":["("]},"codeLensProvider":{"resolveProvider":true},)"
-      R"("documentOnTypeFormattingProvider":{"firstTriggerCharacter":"}","moreTriggerCharacter":[";"]},)"
-      R"("documentLinkProvider":{"resolveProvider":true},"colorProvider":true,)"
-      R"("executeCommandProvider":{"commands":["a","b"]},"semanticTokensProvider":{"legend":{"tokenTypes":["type"],)"
-      R"("tokenModifiers":["static"]},"range":true,"full":{"delta":false}}})");
-  EXPECT_EQ(read.textDocumentSync.change, 0);
-  EXPECT_FALSE(read.textDocumentSync.openClose);
-  EXPECT_TRUE(read.completionProvider.resolveProvider);
-  EXPECT_EQ(read.completionProvider.triggerCharacters, (std::vector<std::string>{".", ">"}));
-  EXPECT_EQ(read.signatureHelpProvider.triggerCharacters, std::vector<std::string>{"("});
-  EXPECT_TRUE(read.codeLensProvider.resolveProvider);
-  EXPECT_EQ(read.documentOnTypeFormattingProvider.firstTriggerCharacter, "}");
-  EXPECT_TRUE(read.documentOnTypeFormattingProvider.moreTriggerCharacter.empty());
-  EXPECT_TRUE(read.documentLinkProvider.resolveProvider);
-  EXPECT_EQ(read.executeCommandProvider.commands, (std::vector<std::string>{"a", "b"}));
-  const LSP::SemanticTokensOptions& tokens = read.semanticTokensProvider;
-  EXPECT_TRUE(tokens.range && tokens.full && !tokens.fullDelta);
-  EXPECT_EQ(tokens.legend.tokenTypes, std::vector<std::string>{"type"});
-  EXPECT_EQ(tokens.legend.tokenModifiers, std::vector<std::string>{"static"});
+std::string Options(const LSP::ServerCapabilities& c) {
+  const auto list = [](const std::vector<std::string>& texts) { return Items(texts, [](auto& t) { return t; }, ","); };
+  const LSP::SemanticTokensOptions& tokens = c.semanticTokensProvider;
+  return Fields(c.textDocumentSync.change, c.textDocumentSync.openClose, c.completionProvider.resolveProvider,
+                list(c.completionProvider.triggerCharacters), list(c.signatureHelpProvider.triggerCharacters),
+                c.codeLensProvider.resolveProvider, c.documentOnTypeFormattingProvider.firstTriggerCharacter,
+                list(c.documentOnTypeFormattingProvider.moreTriggerCharacter), c.documentLinkProvider.resolveProvider,
+                list(c.executeCommandProvider.commands), tokens.IsProvided(), tokens.range, tokens.full,
+                tokens.fullDelta, list(tokens.legend.tokenTypes), list(tokens.legend.tokenModifiers));
+}
 
-  LSP::CompletionOptions options = read.completionProvider;
+TEST(ServerCapabilities, ProvidersAreReadLenientlyAndOptionsStrictly) {
+  const std::string none = "0|0|0|0|0|0|0|0|0|0|0|0|0|0|0|0|0";
+  const std::string noOptions = "0|0|0|||0|||0||0|0|0|0||";
+  const auto tokens = [](const LSP::ServerCapabilities& c) {
+    return Fields(c.hoverProvider, c.semanticTokensProvider.IsProvided());
+  };
+  CheckRows({
+      // A boolean provider is true for true and for an options object only.
+      {"booleans mixed",
+       Read(R"({"hoverProvider":true,"definitionProvider":{},"renameProvider":{"prepareProvider":true},)"
+            R"("referencesProvider":false,"typeDefinitionProvider":null,"implementationProvider":1,)"
+            R"("documentSymbolProvider":"yes","workspaceSymbolProvider":[true]})",
+            Booleans),
+       "1|1|0|0|0|0|0|0|0|0|0|1|1|0|0|0|0"},
+      {"booleans as options objects",
+       Read(R"({"hoverProvider":{},"definitionProvider":{},"typeDefinitionProvider":{},"implementationProvider":{},)"
+            R"("referencesProvider":{},"documentHighlightProvider":{},"documentSymbolProvider":{},)"
+            R"("workspaceSymbolProvider":{},"codeActionProvider":{},"documentFormattingProvider":{},)"
+            R"("documentRangeFormattingProvider":{},"renameProvider":{"prepareProvider":true},)"
+            R"("foldingRangeProvider":{},"selectionRangeProvider":{},"callHierarchyProvider":{},"inlayHintProvider":{}})",
+            Booleans),
+       "1|1|1|1|1|1|1|1|1|1|1|1|1|1|1|1|1"},
+      {"rename without prepare", Read(R"({"renameProvider":true})", Booleans), "0|0|0|0|0|0|0|0|0|0|0|1|0|0|0|0|0"},
+      {"empty", Read("{}", Booleans) + Read("{}", Options), none + noOptions},
+      {"null", Read("null", Booleans) + Read("null", Options), none + noOptions},
+      {"absent", ReadAs<LSP::InitializeResult>("{}", [](auto& r) { return Booleans(r.capabilities) + Options(r.capabilities); }),
+       none + noOptions},
+      // Option providers fill their fields; the sync member is not read.
+      {"options",
+       Read(R"({"textDocumentSync":2,"completionProvider":{"triggerCharacters":[".",">"],"resolveProvider":true},)"
+            R"("signatureHelpProvider":{"triggerCharacters":["("]},"codeLensProvider":{"resolveProvider":true},)"
+            R"("documentOnTypeFormattingProvider":{"firstTriggerCharacter":"}","moreTriggerCharacter":[";"]},)"
+            R"("documentLinkProvider":{"resolveProvider":true},"colorProvider":true,)"
+            R"("executeCommandProvider":{"commands":["a","b"]},"semanticTokensProvider":{"legend":{"tokenTypes":)"
+            R"(["type"],"tokenModifiers":["static"]},"range":true,"full":{"delta":false}}})",
+            Options),
+       "0|0|1|.,>|(|1|}||1|a,b|1|1|1|0|type|static"},
+      // An option provider of the wrong type fails the whole reading; the color provider has
+      // nothing to read, so nothing to fail.
+      {"completion true", Read(R"({"completionProvider":true})", Options),
+       "threw: resolveProvider\nFailed to read JSON bool: IsObject()"},
+      {"code lens false", Read(R"({"codeLensProvider":false})", Options),
+       "threw: resolveProvider\nFailed to read JSON bool: IsObject()"},
+      {"signature help true", Read(R"({"signatureHelpProvider":true})", Options), "threw: IsObject()"},
+      {"commands not an array", Read(R"({"executeCommandProvider":{"commands":"run"}})", Options),
+       "threw: Expecting a 'array' JSON object but found 'string' JSON object."},
+      {"color true", Read(R"({"colorProvider":true})", Options), noOptions},
+      // Semantic tokens came later: a malformed provider is only left unread.
+      {"semantic tokens true", Read(R"({"hoverProvider":true,"semanticTokensProvider":true})", tokens), "1|0"},
+      {"semantic token types not an array",
+       Read(R"({"hoverProvider":true,"semanticTokensProvider":{"legend":{"tokenTypes":"type"},"full":true}})", tokens),
+       "1|0"},
+  });
+}
+
+TEST(ServerCapabilities, CompletionOptionsWriteTheirTriggersUnderTheirOldKeyWhenThereAreAny) {
+  LSP::CompletionOptions options;
+  options.resolveProvider = true;
+  options.triggerCharacters = {".", ">"};
   EXPECT_EQ(LSP::ToJsonText(options), R"({"resolveProvider":true,"triggerCharacter":[".",">"]})");
   options.triggerCharacters.clear();
   EXPECT_EQ(LSP::ToJsonText(options), R"({"resolveProvider":true})");
-}
-
-TEST(ServerCapabilities, OptionProviderOfTheWrongTypeFailsTheWholeReading) {
-  // The color provider has nothing to read, so nothing to fail.
-  const std::pair<const char*, const char*> rows[] = {
-      {R"({"completionProvider":true})", "resolveProvider\nFailed to read JSON bool: IsObject()"},
-      {R"({"codeLensProvider":false})", "resolveProvider\nFailed to read JSON bool: IsObject()"},
-      {R"({"signatureHelpProvider":true})", "IsObject()"},
-      {R"({"executeCommandProvider":{"commands":"run"}})", "Expecting a 'array' JSON object but found 'string' JSON object."},
-      {R"({"colorProvider":true})", ""}};
-  for (const auto& [capabilities, thrown] : rows) EXPECT_EQ(ThrownText([&] { Read(capabilities); }), thrown) << capabilities;
-  // Semantic tokens came later: a malformed provider is only left unread.
-  for (const char* malformed : {R"(true)", R"({"legend":{"tokenTypes":"type"},"full":true})"}) {
-    const LSP::ServerCapabilities read = Read(std::string(R"({"hoverProvider":true,"semanticTokensProvider":)") + malformed + "}");
-    EXPECT_TRUE(read.hoverProvider) << malformed;
-    EXPECT_FALSE(read.semanticTokensProvider.IsProvided()) << malformed;
-  }
-}
-
-TEST(ServerCapabilities, MissingOrNullCapabilitiesLeaveEveryDefault) {
-  for (const char* reply : {R"({})", R"({"capabilities":null})", R"({"capabilities":{}})"}) {
-    LSP::InitializeResult result;
-    vexil_test::ReadResult(reply, result);
-    EXPECT_FALSE(result.capabilities.hoverProvider) << reply;
-    EXPECT_FALSE(result.capabilities.completionProvider.resolveProvider) << reply;
-    EXPECT_TRUE(result.capabilities.completionProvider.triggerCharacters.empty()) << reply;
-  }
 }
 
 }  // namespace

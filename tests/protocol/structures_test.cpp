@@ -1,12 +1,16 @@
 // Core structures on the wire: the flattened ranges of edits and diagnostics, the
-// protocol-shaped change events, document text always sent, and every reading rule.
+// protocol-shaped change events, document text always sent, workspace edits from either
+// member servers answer with, and every reading rule.
 #include <gtest/gtest.h>
 
 #include <string>
 
+#include "reply_helpers.h"
 #include "vexil/protocol/structures.h"
 
 namespace {
+
+using namespace vexil_test;
 
 template <typename T>
 T ReadJson(const std::string& json) {
@@ -17,71 +21,69 @@ T ReadJson(const std::string& json) {
   return value;
 }
 
+// `json` read as a T and written back, or what the reading threw.
 template <typename T>
-std::string ErrorReading(const std::string& json) {
-  try {
-    ReadJson<T>(json);
-  } catch (const std::exception& e) {
-    return e.what();
-  }
-  return "no exception";
+std::string RoundTrip(const std::string& json) {
+  std::string written;
+  const std::string thrown = ThrownText([&] {
+    T value = ReadJson<T>(json);
+    written = LSP::ToJsonText(value);
+  });
+  return thrown.empty() ? written : "threw: " + thrown;
 }
 
-}  // namespace
+const std::string kRange = R"({"start":{"line":1,"character":0},"end":{"line":1,"character":4}})";
+const std::string kFlat = R"("start":{"line":1,"character":0},"end":{"line":1,"character":4})";
 
-TEST(Structures, EditsAndDiagnosticsWriteTheirRangeFlattened) {
-  auto edit = ReadJson<LSP::TextEdit>(
-      R"({"range":{"start":{"line":2,"character":0},"end":{"line":2,"character":3}},"newText":""})");
-  EXPECT_EQ(edit.range.end.character, 3);
-  EXPECT_EQ(LSP::ToJsonText(edit), R"({"start":{"line":2,"character":0},"end":{"line":2,"character":3}})");
-  edit.newText = "abc";
-  EXPECT_EQ(LSP::ToJsonText(edit),
-            R"({"start":{"line":2,"character":0},"end":{"line":2,"character":3},"newText":"abc"})");
-
-  auto diagnostic = ReadJson<LSP::Diagnostic>(
-      R"({"range":{"start":{"line":1,"character":2},"end":{"line":1,"character":5}},"code":7,"source":"x","message":"bad"})");
-  EXPECT_EQ(LSP::ToJsonText(diagnostic),
-            R"({"start":{"line":1,"character":2},"end":{"line":1,"character":5},"code":7,"source":"x","message":"bad"})");
-  EXPECT_STREQ(diagnostic.Name(), "params");
-}
-
-TEST(Structures, DiagnosticsReadTextCodesAndSeverityButWriteAsBefore) {
-  auto clangd = ReadJson<LSP::Diagnostic>(
-      R"({"range":{"start":{"line":3,"character":8},"end":{"line":3,"character":9}},"severity":1,)"
-      R"("code":"undeclared_var_use","source":"clang","message":"Use of undeclared identifier 'y'"})");
-  EXPECT_EQ(clangd.code, -1);
-  EXPECT_EQ(clangd.codeText, "undeclared_var_use");
-  EXPECT_EQ(clangd.severity, 1);
-  EXPECT_EQ(LSP::ToJsonText(clangd),
-            R"({"start":{"line":3,"character":8},"end":{"line":3,"character":9},"code":-1,"source":"clang",)"
-            R"("message":"Use of undeclared identifier 'y'"})");
-
-  auto bare = ReadJson<LSP::Diagnostic>(R"({"message":"m"})");
-  EXPECT_EQ(bare.severity, -1);
-  EXPECT_EQ(bare.code, -1);
-  EXPECT_EQ(bare.codeText, "");
-  EXPECT_THROW(ReadJson<LSP::Diagnostic>(R"({"code":{"value":1}})"), std::exception);
-}
-
-TEST(Structures, ChangeEventsCarryTheProtocolRangeAndAlwaysTheText) {
-  LSP::TextDocumentContentChangeEvent whole;
-  EXPECT_STREQ(whole.Name(), "contentChanges");
-  EXPECT_EQ(LSP::ToJsonText(whole), R"({"text":""})");
-  whole.text = "int x;\n";
-  EXPECT_EQ(LSP::ToJsonText(whole), R"({"text":"int x;\n"})");
-
-  LSP::TextDocumentContentChangeEvent ranged;
+TEST(Structures, WrittenBackAsServersParseThem) {
+  LSP::TextDocumentContentChangeEvent whole, ranged;
   ranged.range.reset(new LSP::Range({1, 0}, {1, 4}));
   ranged.text = "abc";
-  EXPECT_EQ(LSP::ToJsonText(ranged),
-            R"({"range":{"start":{"line":1,"character":0},"end":{"line":1,"character":4}},"text":"abc"})");
-  ranged.rangeLength.reset(new int(4));
-  ranged.text.clear();
-  const std::string deletion =
-      R"({"range":{"start":{"line":1,"character":0},"end":{"line":1,"character":4}},"rangeLength":4,"text":""})";
-  EXPECT_EQ(LSP::ToJsonText(ranged), deletion);
-
+  LSP::TextDocumentItem item;
+  item.uri = "file:///empty.cpp";
+  item.languageId = "cpp";
+  item.version = 1;
+  LSP::VersionedTextDocumentIdentifier versioned("file:///a.c", 3);
+  LSP::TextDocumentIdentifier unnamed;
+  LSP::WorkspaceFolder folder("file:///w", "");
+  const std::string symbol = R"({"name":"S","kind":5,"deprecated":false,"location":{"range":{"start":)"
+                             R"({"line":-1,"character":-1},"end":{"line":-1,"character":-1}}}})";
+  CheckRows({
+      // Edits and diagnostics write their range flattened, and an edit its text only when there is one.
+      {"edit without text", RoundTrip<LSP::TextEdit>(R"({"range":)" + kRange + R"(,"newText":""})"), "{" + kFlat + "}"},
+      {"edit", RoundTrip<LSP::TextEdit>(R"({"range":)" + kRange + R"(,"newText":"abc"})"),
+       "{" + kFlat + R"(,"newText":"abc"})"},
+      {"diagnostic", RoundTrip<LSP::Diagnostic>(R"({"range":)" + kRange + R"(,"code":7,"source":"x","message":"bad"})"),
+       "{" + kFlat + R"(,"code":7,"source":"x","message":"bad"})"},
+      // A text code and a severity are read, yet the diagnostic writes as before.
+      {"diagnostic with a text code",
+       RoundTrip<LSP::Diagnostic>(R"({"range":)" + kRange + R"(,"severity":1,"code":"undeclared_var_use","message":"m"})"),
+       "{" + kFlat + R"(,"code":-1,"message":"m"})"},
+      {"diagnostic with an object code", RoundTrip<LSP::Diagnostic>(R"({"code":{"value":1}})"),
+       "threw: Expecting a 'int' JSON object but found 'object' JSON object."},
+      {"whole change", LSP::ToJsonText(whole), R"({"text":""})"},
+      {"ranged change", LSP::ToJsonText(ranged), R"({"range":)" + kRange + R"(,"text":"abc"})"},
+      {"document always with its text", LSP::ToJsonText(item),
+       R"({"uri":"file:///empty.cpp","languageId":"cpp","version":1,"text":""})"},
+      {"versioned identifier", LSP::ToJsonText(versioned), R"({"uri":"file:///a.c","version":3})"},
+      {"identifier without uri", LSP::ToJsonText(unnamed), "{}"},
+      {"folder without name", LSP::ToJsonText(folder), R"({"uri":"file:///w"})"},
+      {"location", RoundTrip<LSP::Location>(R"({"uri":"file:///b.c","range":)" + kRange + "}"),
+       R"({"uri":"file:///b.c","range":)" + kRange + "}"},
+      {"markup", RoundTrip<LSP::MarkupContent>(R"({"kind":"markdown","value":"**x**"})"),
+       R"({"kind":"markdown","value":"**x**"})"},
+      {"symbol", RoundTrip<LSP::SymbolInformation>(R"({"name":"S","kind":5,"children":[{"name":"a"}]})"), symbol},
+      {"workspace edit",
+       RoundTrip<LSP::WorkspaceEdit>(R"({"documentChanges":[{"textDocument":{"uri":"file:///a.c","version":2},)"
+                                     R"("edits":[{"range":)" + kRange + R"(,"newText":"x"}]}]})"),
+       R"({"documentChanges":[{"textDocument":{"uri":"file:///a.c","version":2},"edits":[{)" + kFlat +
+           R"(,"newText":"x"}]}]})"},
+  });
   // Copies are deep: the original's range and length are not shared.
+  ranged.rangeLength.reset(new int(4));
+  ranged.text = "int x;\n";
+  const std::string deletion = R"({"range":)" + kRange + R"(,"rangeLength":4,"text":"int x;\n"})";
+  EXPECT_EQ(LSP::ToJsonText(ranged), deletion);
   LSP::TextDocumentContentChangeEvent copy = ranged;
   ranged.range.reset();
   ranged.rangeLength.reset();
@@ -90,78 +92,68 @@ TEST(Structures, ChangeEventsCarryTheProtocolRangeAndAlwaysTheText) {
   EXPECT_EQ(LSP::ToJsonText(copy), deletion);
 }
 
-TEST(Structures, DocumentsAndIdentifiers) {
-  LSP::TextDocumentItem item;
-  item.uri = "file:///empty.cpp";
-  item.languageId = "cpp";
-  item.version = 1;
-  EXPECT_EQ(LSP::ToJsonText(item), R"({"uri":"file:///empty.cpp","languageId":"cpp","version":1,"text":""})");
-  item = ReadJson<LSP::TextDocumentItem>(R"({"uri":"u","languageId":"c","text":"t"})");
-  EXPECT_EQ(item.version, -1);
-  EXPECT_EQ(item.text, "t");
-
-  LSP::VersionedTextDocumentIdentifier versioned("file:///a.c", 3);
-  EXPECT_EQ(LSP::ToJsonText(versioned), R"({"uri":"file:///a.c","version":3})");
-  EXPECT_EQ(ReadJson<LSP::VersionedTextDocumentIdentifier>(R"({"uri":"u","version":null})").version, -1);
-  EXPECT_STREQ(versioned.Name(), "textDocument");
-  LSP::TextDocumentIdentifier unnamed;
-  EXPECT_EQ(LSP::ToJsonText(unnamed), "{}");
-
-  auto position = ReadJson<LSP::Position>("{}");
-  EXPECT_EQ(position.line, -1);
-  EXPECT_EQ(position.character, -1);
-  auto location = ReadJson<LSP::Location>(
-      R"({"uri":"file:///b.c","range":{"start":{"line":4,"character":1},"end":{"line":4,"character":9}}})");
-  EXPECT_EQ(LSP::ToJsonText(location),
-            R"({"uri":"file:///b.c","range":{"start":{"line":4,"character":1},"end":{"line":4,"character":9}}})");
-  LSP::WorkspaceFolder folder("file:///w", "");
-  EXPECT_EQ(LSP::ToJsonText(folder), R"({"uri":"file:///w"})");
-}
-
-TEST(Structures, WorkspaceEditsAndTheirArrayErrors) {
-  auto edit = ReadJson<LSP::WorkspaceEdit>(
-      R"({"documentChanges":[{"textDocument":{"uri":"file:///a.c","version":2},"edits":[)"
-      R"({"range":{"start":{"line":0,"character":0},"end":{"line":0,"character":1}},"newText":"x"}]}]})");
-  EXPECT_EQ(LSP::ToJsonText(edit),
-            R"({"documentChanges":[{"textDocument":{"uri":"file:///a.c","version":2},"edits":[)"
-            R"({"start":{"line":0,"character":0},"end":{"line":0,"character":1},"newText":"x"}]}]})");
-
-  EXPECT_TRUE(ReadJson<LSP::WorkspaceEdit>("{}").documentChanges.empty());
-  EXPECT_EQ(ErrorReading<LSP::WorkspaceEdit>(R"({"documentChanges":{}})"),
-            "Expecting a array JSON object but found 3 JSON object .");
-  EXPECT_EQ(ErrorReading<LSP::WorkspaceEdit>(R"({"documentChanges":[{"edits":"no"}]})"),
-            "Error:Expecting a array JSON object but found 5 JSON object .\n\n"
-            "Expecting a array JSON object but found 4 JSON object.");
-}
-
-TEST(Structures, SymbolsNestChildrenLeniently) {
-  auto symbol = ReadJson<LSP::SymbolInformation>(
+TEST(Structures, AbsentMembersReadAsTheirDefaults) {
+  const auto diagnostic = ReadJson<LSP::Diagnostic>(R"({"severity":1,"code":"E1","message":"m"})");
+  const auto bare = ReadJson<LSP::Diagnostic>(R"({"message":"m"})");
+  const auto item = ReadJson<LSP::TextDocumentItem>(R"({"uri":"u","languageId":"c","text":"t"})");
+  const auto symbol = ReadJson<LSP::SymbolInformation>(
       R"({"name":"S","kind":5,"containerName":"ns","children":[1,{"name":"a","kind":12,)"
       R"("children":[{"name":"b","kind":13}]},"x"]})");
-  EXPECT_EQ(symbol.containerName, "ns");
-  ASSERT_EQ(symbol.children.size(), 1u);
-  EXPECT_EQ(symbol.children[0].name, "a");
-  ASSERT_EQ(symbol.children[0].children.size(), 1u);
-  EXPECT_EQ(symbol.children[0].children[0].kind, 13);
-  EXPECT_EQ(symbol.location.range.start.line, -1);
-  EXPECT_EQ(LSP::ToJsonText(symbol),
-            R"({"name":"S","kind":5,"deprecated":false,"location":{"range":{"start":{"line":-1,"character":-1},)"
-            R"("end":{"line":-1,"character":-1}}}})");
-  EXPECT_TRUE(ReadJson<LSP::SymbolInformation>(R"({"children":{}})").children.empty());
-}
-
-// The array of marked strings is read in the hover test.
-TEST(Structures, MarkupContentAsAnObjectOrAPlainString) {
-  auto markup = ReadJson<LSP::MarkupContent>(R"({"kind":"markdown","value":"**x**"})");
-  EXPECT_EQ(LSP::ToJsonText(markup), R"({"kind":"markdown","value":"**x**"})");
-
   LSP::xReader reader;
   ASSERT_TRUE(reader.Parse(R"({"s":"plain","n":null})"));
-  LSP::MarkupContent content;
-  content.kind = "stale";
-  content.Read(reader.Root().Object("s"));
-  EXPECT_EQ(content.kind, "");
-  EXPECT_EQ(content.value, "plain");
-  content.Read(reader.Root().Object("n"));
-  EXPECT_EQ(content.value, "");
+  LSP::MarkupContent markup;
+  markup.kind = "stale";
+  markup.Read(reader.Root().Object("s"));
+  const std::string plain = Fields(markup.kind, markup.value);
+  markup.Read(reader.Root().Object("n"));
+  CheckRows({
+      {"diagnostic", Fields(diagnostic.severity, diagnostic.code, diagnostic.codeText), "1|-1|E1"},
+      {"bare diagnostic", Fields(bare.severity, bare.code, bare.codeText), "-1|-1|"},
+      {"document", Fields(item.version, item.text), "-1|t"},
+      {"null version", Fields(ReadJson<LSP::VersionedTextDocumentIdentifier>(R"({"uri":"u","version":null})").version),
+       "-1"},
+      {"position", Fields(ReadJson<LSP::Position>("{}").line, ReadJson<LSP::Position>("{}").character), "-1|-1"},
+      // Children that are not objects are skipped.
+      {"nested symbols", Fields(symbol.containerName, Symbols({symbol})), "ns|S|5||" + kNoRange + "{a|12||" + kNoRange +
+                                                                              "{b|13||" + kNoRange + "}}"},
+      {"symbol children not an array", Symbols(ReadJson<LSP::SymbolInformation>(R"({"children":{}})").children), ""},
+      {"markup as a plain string", plain, "|plain"},
+      {"markup null", Fields(markup.kind, markup.value), "|"},
+  });
 }
+
+// Most servers answer a rename with the "changes" map: one unversioned edit per document,
+// in map order, written back as "documentChanges" as always.
+TEST(Structures, WorkspaceEditsReadFromEitherMember) {
+  const std::string edit = R"({"range":)" + kRange + R"(,"newText":"new"})";
+  LSP::WorkspaceEdit mapped;
+  ReadResult(R"({"changes":{"file:///z.c":[)" + edit + "," + edit + R"(],"file:///a.c":[)" + edit + R"(]}})", mapped);
+  CheckRows({
+      {"changes map",
+       ReadAs<LSP::WorkspaceEdit>(
+           R"({"changes":{"file:///z.c":[)" + edit + "," + edit + R"(],"file:///a.c":[)" + edit + R"(],"file:///m.c":[]}})",
+           Changes),
+       "file:///z.c|-1|1:0-1:4|new;1:0-1:4|new;file:///a.c|-1|1:0-1:4|new;file:///m.c|-1|"},
+      {"changes map written back", LSP::ToJsonText(mapped.documentChanges.at(1)),
+       R"({"textDocument":{"uri":"file:///a.c","version":-1},"edits":[{)" + kFlat + R"(,"newText":"new"}]})"},
+      {"document changes win",
+       ReadAs<LSP::WorkspaceEdit>(R"({"changes":{"file:///a.c":[)" + edit +
+                                      R"(]},"documentChanges":[{"textDocument":{"uri":"file:///b.c","version":4},"edits":[)" +
+                                      edit + "]}]}",
+                                  Changes),
+       "file:///b.c|4|1:0-1:4|new"},
+      {"changes null", ReadAs<LSP::WorkspaceEdit>(R"({"changes":null})", Changes), ""},
+      {"neither", ReadAs<LSP::WorkspaceEdit>("{}", Changes), ""},
+      {"document changes not an array", ReadAs<LSP::WorkspaceEdit>(R"({"documentChanges":{}})", Changes),
+       "threw: Expecting a array JSON object but found 3 JSON object ."},
+      {"document edits not an array", ReadAs<LSP::WorkspaceEdit>(R"({"documentChanges":[{"edits":"no"}]})", Changes),
+       "threw: Error:Expecting a array JSON object but found 5 JSON object .\n\n"
+       "Expecting a array JSON object but found 4 JSON object."},
+      {"changes not an object", ReadAs<LSP::WorkspaceEdit>(R"({"changes":[]})", Changes),
+       "threw: Expecting a object JSON object but found 4 JSON object ."},
+      {"changes of a document not an array", ReadAs<LSP::WorkspaceEdit>(R"({"changes":{"file:///a.c":{}}})", Changes),
+       "threw: Expecting a array JSON object but found 3 JSON object ."},
+  });
+}
+
+}  // namespace

@@ -11,19 +11,16 @@ using vexil::ExpandTags;
 using vexil::xFileTags;
 
 TEST(FileTags, SplitAReportedPath) {
-  const xFileTags tags("/work/src/shape.Test.CPP");
-  EXPECT_EQ(tags.FN, "/work/src/shape.Test.CPP");
-  EXPECT_EQ(tags.F, "shape.Test.CPP");
-  EXPECT_EQ(tags.FB, "shape.Test");
-  EXPECT_EQ(tags.EXT, ".CPP");
-  EXPECT_EQ(tags.FDD, "/work/src/");
-  EXPECT_TRUE(tags.isFile);
-  EXPECT_FALSE(tags.isDirectory);
-
-  const xFileTags bare("/work/Makefile");
-  EXPECT_EQ(bare.FB, "Makefile");
-  EXPECT_EQ(bare.EXT, "");
-  EXPECT_EQ(bare.FDD, "/work/");
+  const std::pair<const char*, const char*> rows[] = {
+      {"/work/src/shape.Test.CPP", "/work/src/shape.Test.CPP|shape.Test.CPP|shape.Test|.CPP|/work/src/|1|0"},
+      {"/work/Makefile", "/work/Makefile|Makefile|Makefile||/work/|1|0"},
+  };
+  for (const auto& [path, expected] : rows) {
+    const xFileTags t(path);
+    EXPECT_EQ(t.FN + "|" + t.F + "|" + t.FB + "|" + t.EXT + "|" + t.FDD + "|" + std::to_string(t.isFile) + "|" +
+                  std::to_string(t.isDirectory),
+              expected);
+  }
 }
 
 TEST(FileTags, ExpansionFollowsTheTableOrderInBothCases) {

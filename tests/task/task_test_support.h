@@ -33,6 +33,7 @@ inline TraceLine Notice(const std::string& title, const std::string& text) {
 inline TraceLine Message(const std::string& text) { return {TraceType::Line, "Message", text}; }
 using watchtest::Error;
 using watchtest::Verbose;
+using watchtest::WaitForTrace;
 
 // Call only with the recording's lock held (inside WaitUntil or Read).
 inline bool AnyTraced(const std::function<bool(const TraceLine&)>& match) {
@@ -46,9 +47,6 @@ inline bool Traced(const TraceLine& wanted) {
   return Recorded().shared.Read([&] { return AnyTraced([&](const TraceLine& line) { return line == wanted; }); });
 }
 
-inline bool WaitForLine(const TraceLine& wanted) {
-  return Recorded().shared.WaitUntil([&] { return AnyTraced([&](const TraceLine& line) { return line == wanted; }); });
-}
 
 // A text traced under `title` that contains `piece`.
 inline bool WaitForText(const std::string& title, const std::string& piece,

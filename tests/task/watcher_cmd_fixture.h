@@ -6,6 +6,7 @@
 
 #include <memory>
 #include <string>
+#include <vector>
 
 #include "task/watcher_event.h"
 #include "task_test_support.h"
@@ -23,6 +24,10 @@ inline const std::string kRefusal =
 inline const std::string kMissingAdvice =
     "Make sure the executable exists, the details are correctly configured and the executable is in the PATH.\n\n";
 
+// File names that would make the platform's interpreter do more than the command (each
+// tries to create "pwned" in the test's directory).
+extern const std::vector<std::string> kInterpretedNames;
+
 class WatcherCommand : public ::testing::Test {
  protected:
   void SetUp() override { watchtest::ResetRecording(); }
@@ -35,7 +40,7 @@ class WatcherCommand : public ::testing::Test {
   std::unique_ptr<xWatcherEvent> TimedOut(const xWatcherOptions& options) {
     auto event = Event("a.cpp", options);
     EXPECT_TRUE(event->Start());
-    EXPECT_TRUE(WaitForLine(Error(kTimedOut)));
+    EXPECT_TRUE(WaitForTrace(Error(kTimedOut)));
     return event;
   }
 

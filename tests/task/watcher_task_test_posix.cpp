@@ -99,7 +99,7 @@ TEST_F(WatcherTaskTest, ChangedFilesWithWatchedExtensionsRunTheCommand) {
   EXPECT_TRUE(WaitForText("Message", "ran saved.cpp .cpp"));
 
   watchtest::Touch(dir_ / "new.cpp");
-  EXPECT_TRUE(WaitForLine(Notice("cpp", "An onFileAdded event.\n")));
+  EXPECT_TRUE(WaitForTrace(Notice("cpp", "An onFileAdded event.\n")));
   EXPECT_TRUE(Traced(Verbose("      Path: " + DirSlash() + "new.cpp\n")));
 
   task->Release();
@@ -151,7 +151,7 @@ TEST_F(WatcherTaskTest, RegistryKnowsTasksByName) {
   // Its callback, on the watching thread, cannot release the task: that would wait for itself.
   releasing = missing;
   watchtest::Touch(dir_ / "new.cpp");
-  EXPECT_TRUE(WaitForLine(Error(
+  EXPECT_TRUE(WaitForTrace(Error(
       "Watcher Task: 'missing' => Release refused: called from the task's own callback, it would wait for itself.\n")));
   EXPECT_EQ(xWatcher_Have("missing"), missing);
   releasing = nullptr;

@@ -150,6 +150,24 @@ class WorkerGate {
   bool open_ = true;
 };
 
+// A monitor whose handlers `probe` records through `gate`, a root for it to watch and a
+// directory to fence with. Declared last, the monitor goes first.
+class ChangeMonitorTest : public ::testing::Test {
+ protected:
+  bool Watch(std::int64_t id, vexil::WatchOptions options = {}) {
+    return monitor.AddWatch(root.Path().string(), id, options);
+  }
+
+  TempDir root, fence;
+  Probe probe;
+  WorkerGate gate;
+  ChangeMonitor monitor{gate.Wrap(probe.Handlers())};
+};
+
+// Changes that overflow what the platform holds for one watch until it is read; 0 when
+// that is more than a test can make.
+std::size_t OverflowingBurst();
+
 // A change in another watch is queued behind everything before it, and a read's batches
 // go out in id order: once the fence (with the highest id) has arrived, anything the other
 // watches were going to report has been reported too.

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <functional>
 #include <map>
 #include <memory>
 #include <thread>
@@ -73,37 +74,27 @@ TEST_F(WatcherWorkspaceExTest, DeliversChangesAsEventsWithRenamesPaired) {
   auto workspace = Make(LSP::TraceLevel::Off);
   workspace->Start("proj", root.Path().string().c_str(), &userData);
 
-  Touch(root / "a.txt");
-  ASSERT_TRUE(WaitForEvent("a.txt"));
-  const Delivered added = Only("a.txt");
-  EXPECT_EQ(added.project, "proj");
-  EXPECT_EQ(added.root, root.Path().string());
-  EXPECT_EQ(added.userData, &userData);
-  EXPECT_EQ(added.type, 0);
-  EXPECT_EQ(added.action, 1u);
-  EXPECT_EQ(added.newName, "");
-
-  fs::create_directory(root / "sub");
+  // One change at a time; a rename's pair goes out once, with the action of whichever half
+  // sorts later. Each event as type|action|name|newName.
   const std::string sub = "sub" + std::string(1, static_cast<char>(fs::path::preferred_separator));
-  ASSERT_TRUE(WaitForEvent(sub));
-  EXPECT_EQ(Only(sub).type, 0);
-
-  // The pair goes out once, with the action of whichever half sorts later.
-  fs::rename(root / "a.txt", root / "b.txt");
-  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 3; }));
-  fs::rename(root / "b.txt", root / "a.txt");
-  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 4; }));
-  fs::remove(root / "a.txt");
-  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 5; }));
-
-  const std::vector<Delivered> events = Events();
-  ASSERT_EQ(events.size(), 5u);
-  EXPECT_EQ(std::make_tuple(events[2].type, events[2].action, events[2].name, events[2].newName),
-            std::make_tuple(2, 5u, std::string("a.txt"), std::string("b.txt")));
-  EXPECT_EQ(std::make_tuple(events[3].type, events[3].action, events[3].name, events[3].newName),
-            std::make_tuple(2, 4u, std::string("b.txt"), std::string("a.txt")));
-  EXPECT_EQ(std::make_tuple(events[4].type, events[4].action, events[4].name),
-            std::make_tuple(1, 2u, std::string("a.txt")));
+  const std::vector<std::pair<std::function<void()>, std::string>> steps = {
+      {[&] { Touch(root / "a.txt"); }, "0|1|a.txt|"},
+      {[&] { fs::create_directory(root / "sub"); }, "0|1|" + sub + "|"},
+      {[&] { fs::rename(root / "a.txt", root / "b.txt"); }, "2|5|a.txt|b.txt"},
+      {[&] { fs::rename(root / "b.txt", root / "a.txt"); }, "2|4|b.txt|a.txt"},
+      {[&] { fs::remove(root / "a.txt"); }, "1|2|a.txt|"},
+  };
+  for (std::size_t step = 0; step < steps.size(); ++step) {
+    steps[step].first();
+    ASSERT_TRUE(Recorded().shared.WaitUntil([&] { return Recorded().events.size() > step; })) << steps[step].second;
+    const Delivered event = Events().back();
+    EXPECT_EQ(std::to_string(event.type) + "|" + std::to_string(event.action) + "|" + event.name + "|" + event.newName,
+              steps[step].second);
+  }
+  const Delivered first = Events().front();
+  EXPECT_EQ(std::make_tuple(first.project, first.root, first.userData),
+            std::make_tuple(std::string("proj"), root.Path().string(), static_cast<const void*>(&userData)));
+  EXPECT_EQ(Events().size(), steps.size());
   EXPECT_TRUE(Traces().empty());
 
   // Renames at once, which one read may take together, each still reach the host right.
