@@ -22,13 +22,6 @@ struct Result {
   double seconds = 0;
 };
 
-std::string Slurp(const std::string& path) {
-  std::ifstream in(path);
-  std::stringstream text;
-  text << in.rdbuf();
-  return text.str();
-}
-
 // Runs a shell script in the C++ example directory; VEXIL names the program.
 Result Shell(const std::string& script) {
   const vexil_test::TempDirectory scratch;
@@ -40,8 +33,8 @@ Result Shell(const std::string& script) {
   int status = std::system(command.c_str());
   run.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
   run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  run.out = Slurp(scratch / "out");
-  run.err = Slurp(scratch / "err");
+  run.out = e2e::ReadFile(scratch / "out");
+  run.err = e2e::ReadFile(scratch / "err");
   return run;
 }
 
@@ -53,43 +46,33 @@ std::string Range(int line, int character, int endLine, int endCharacter) {
          R"(},"end":{"line":)" + std::to_string(endLine) + R"(,"character":)" + std::to_string(endCharacter) + "}}";
 }
 
-TEST(CommandLine, LspPrintsLocationsWithTheirSourceAndCompletionsOnePerLine) {
-  Result run = Vexil("lsp -- clangd --log=error --definition main.cpp:15:18 --completion main.cpp:13:13");
+// One clangd run for every action printed for people, in the order given: what the server
+// supports, a request of any method, the typed calls with their source lines and byte columns.
+TEST(CommandLine, LspPrintsEachAnswerInItsPlaceForPeople) {
+  Result run = Shell(R"("$VEXIL" lsp -- clangd --log=error --capabilities --open main.cpp --request )"
+                     R"(textDocument/documentHighlight "{\"textDocument\":{\"uri\":\"file://$PWD/main.cpp\"},)"
+                     R"(\"position\":{\"line\":14,\"character\":17}}" --definition main.cpp:15:18 )"
+                     R"(--completion main.cpp:13:13 --highlight main.cpp:11:22 --prepare-rename main.cpp:15:18 )"
+                     R"(--selection-range main.cpp:15:18 --semantic-tokens shapes.h --call-hierarchy shapes.cpp:17:5)");
   EXPECT_EQ(run.status, 0) << run.err;
-  EXPECT_NE(run.out.find("definition main.cpp:15:18\n  shapes.h:28:5: int Clamp(int value, int low, int high);\n"),
-            std::string::npos)
-      << run.out;
-  EXPECT_NE(run.out.find("\n  Scale(int factor)  : void\n"), std::string::npos) << run.out;
-  // Beyond the typed calls: what the server supports, and a request of any method.
-  Result beyond = Shell(R"("$VEXIL" lsp -- clangd --log=error --capabilities --open main.cpp --request )"
-                        R"(textDocument/documentHighlight "{\"textDocument\":{\"uri\":\"file://$PWD/main.cpp\"},)"
-                        R"(\"position\":{\"line\":14,\"character\":17}}")");
-  EXPECT_EQ(beyond.status, 0) << beyond.err;
-  EXPECT_EQ(beyond.out.rfind("capabilities\n", 0), 0u) << beyond.out;
-  EXPECT_NE(beyond.out.find("\n  documentHighlightProvider\n"), std::string::npos) << beyond.out;
-  EXPECT_NE(beyond.out.find("\n  textDocumentSync: incremental changes, open and close, save\n"), std::string::npos);
-  EXPECT_NE(beyond.out.find("request textDocument/documentHighlight\n  [{"), std::string::npos) << beyond.out;
-  EXPECT_NE(beyond.out.find(R"("start":{"character":17,"line":14}})"), std::string::npos) << beyond.out;
-  // The newer requests, each answer in its place with byte columns.
-  Result features = Vexil("lsp -- clangd --log=error --highlight main.cpp:11:22 --prepare-rename main.cpp:15:18 "
-                          "--selection-range main.cpp:15:18 --semantic-tokens shapes.h --call-hierarchy shapes.cpp:17:5");
-  EXPECT_EQ(features.status, 0) << features.err;
-  for (const char* answer :
-       {"highlight main.cpp:11:22\n  main.cpp:11:21: text: shapes::Rectangle rectangle(3, 4);\n  main.cpp:12:10: text: ",
-        "prepare-rename main.cpp:15:18\n  15:18-15:23: Clamp\n", "selection-range main.cpp:15:18\n  15:10-15:23: shapes::Clamp\n",
-        "\n  28:5 function [declaration, globalScope]: Clamp\n",
-        "call-hierarchy shapes.cpp:17:5\n  function Clamp  shapes.cpp:17:5\n    called from:\n"
-        "      method Scale  shapes.cpp:13:12  (2 calls)\n"}) {
-    EXPECT_NE(features.out.find(answer), std::string::npos) << answer << "\n" << features.out;
-  }
+  EXPECT_EQ(run.out.rfind("capabilities\n", 0), 0u) << run.out;
+  e2e::ExpectHas(run.out, {"\n  documentHighlightProvider\n", "\n  textDocumentSync: incremental changes, open and close, save\n",
+                      "request textDocument/documentHighlight\n  [{", R"("start":{"character":17,"line":14}})",
+                      "definition main.cpp:15:18\n  shapes.h:28:5: int Clamp(int value, int low, int high);\n",
+                      "\n  Scale(int factor)  : void\n",
+                      "highlight main.cpp:11:22\n  main.cpp:11:21: text: shapes::Rectangle rectangle(3, 4);\n  main.cpp:12:10: text: ",
+                      "prepare-rename main.cpp:15:18\n  15:18-15:23: Clamp\n",
+                      "selection-range main.cpp:15:18\n  15:10-15:23: shapes::Clamp\n",
+                      "\n  28:5 function [declaration, globalScope]: Clamp\n",
+                      "call-hierarchy shapes.cpp:17:5\n  function Clamp  shapes.cpp:17:5\n    called from:\n"
+                      "      method Scale  shapes.cpp:13:12  (2 calls)\n"});
   // Files are found below --root, whatever the current directory.
   Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22 --folding geometry.py --highlight main.py:12:7");
   EXPECT_EQ(python.status, 0) << python.err;
   EXPECT_EQ(python.out.rfind("hover main.py:2:22\n", 0), 0u) << python.out;
-  EXPECT_NE(python.out.find("folding geometry.py\n  4-6: def clamp(value, low, high):\n  9-23: class Rectangle:\n"),
-            std::string::npos) << python.out;
-  EXPECT_NE(python.out.find("/python/main.py:2:33: write: from geometry import Rectangle, clamp\n"), std::string::npos);
-  EXPECT_NE(python.out.find("/python/main.py:12:7: read: print(clamp("), std::string::npos) << python.out;
+  e2e::ExpectHas(python.out, {"folding geometry.py\n  4-6: def clamp(value, low, high):\n  9-23: class Rectangle:\n",
+                         "/python/main.py:2:33: write: from geometry import Rectangle, clamp\n",
+                         "/python/main.py:12:7: read: print(clamp("});
 }
 
 TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
@@ -97,36 +80,29 @@ TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
   EXPECT_EQ(json.status, 0);
   EXPECT_EQ(json.out.rfind(R"({"action":"references","file":"main.cpp","line":15,"column":18,"failed":false,"result":[)", 0), 0u)
       << json.out;
-  EXPECT_NE(json.out.find(R"("path":")" VEXIL_EXAMPLES R"(/cpp/main.cpp","line":15,"column":18,"endLine":15,"endColumn":23})"),
-            std::string::npos);
-  EXPECT_NE(json.out.find(R"({"name":"Clamp","kind":"function",)"), std::string::npos) << json.out;
+  e2e::ExpectHas(json.out, {R"("path":")" VEXIL_EXAMPLES R"(/cpp/main.cpp","line":15,"column":18,"endLine":15,"endColumn":23})",
+                       R"({"name":"Clamp","kind":"function",)"});
   EXPECT_EQ(std::count(json.out.begin(), json.out.end(), '\n'), 2);
 
-  Result rename = Vexil("lsp -- clangd --log=error --rename main.cpp:15:18:Limit");
-  EXPECT_EQ(rename.status, 0);
-  EXPECT_NE(rename.out.find("-  return shapes::Clamp(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n"
-                            "+  return shapes::Limit(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n"),
-            std::string::npos)
-      << rename.out;
-  EXPECT_NE(rename.err.find("vexil: note: clangd proposed edits only in files it has opened"), std::string::npos);
-  // --apply writes exactly the edits shown, and the server is told of the new text.
-  Result applied = Shell("cp main.cpp shapes.h compile_flags.txt \"$SCRATCH\"; cd \"$SCRATCH\"; \"$VEXIL\" lsp --apply "
-                         "-- clangd --log=error --rename main.cpp:15:18:Limit --diagnostics main.cpp && "
-                         "sed s/Limit/Clamp/ main.cpp | cmp - \"$OLDPWD/main.cpp\" && cmp shapes.h \"$OLDPWD/shapes.h\"");
-  EXPECT_EQ(applied.status, 0) << applied.out << applied.err;
-  EXPECT_NE(applied.out.find("+  return shapes::Limit(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n }\n  written: main.cpp\n"
-                             "diagnostics main.cpp\nmain.cpp:15:18: error: No member named 'Limit' in namespace 'shapes'"),
-            std::string::npos)
-      << applied.out;  // The preferred quick fix of a diagnostic, written; the server then finds nothing wrong.
-  Result fixed = Shell("sed s/Clamp/Clam/ main.cpp > \"$SCRATCH/main.cpp\"; cp shapes.h compile_flags.txt \"$SCRATCH\"; "
-                       "cd \"$SCRATCH\"; \"$VEXIL\" lsp --apply --json -- clangd --log=error --code-actions main.cpp:15:18 "
-                       "--diagnostics main.cpp && cmp main.cpp \"$OLDPWD/main.cpp\"");
-  EXPECT_EQ(fixed.status, 0) << fixed.out << fixed.err;
-  EXPECT_NE(fixed.out.find(R"({"title":"change 'Clam' to 'Clamp'","kind":"quickfix","preferred":true,"edits":[{"path":")"),
-            std::string::npos) << fixed.out;
-  EXPECT_NE(fixed.out.find(R"(main.cpp","line":15,"column":18,"endLine":15,"endColumn":22,"newText":"Clamp"}],"applied":true})"),
-            std::string::npos) << fixed.out;
-  EXPECT_NE(fixed.out.find(R"({"action":"diagnostics","file":"main.cpp","failed":false,"result":[]})"), std::string::npos);
+  // A rename is shown and, only with --apply, written exactly as shown, and the server is
+  // told of the new text; then the preferred quick fix of a diagnostic, after which the
+  // server finds nothing wrong.
+  Result edits = Shell("cp main.cpp shapes.h compile_flags.txt \"$SCRATCH\"; cd \"$SCRATCH\"; "
+                       "\"$VEXIL\" lsp -- clangd --log=error --rename main.cpp:15:18:Limit && cmp main.cpp \"$OLDPWD/main.cpp\" && "
+                       "echo unwritten && "
+                       "\"$VEXIL\" lsp --apply -- clangd --log=error --rename main.cpp:15:18:Limit --diagnostics main.cpp && "
+                       "sed s/Limit/Clamp/ main.cpp | cmp - \"$OLDPWD/main.cpp\" && cmp shapes.h \"$OLDPWD/shapes.h\" && "
+                       "sed s/Clamp/Clam/ \"$OLDPWD/main.cpp\" > main.cpp && \"$VEXIL\" lsp --apply --json -- clangd "
+                       "--log=error --code-actions main.cpp:15:18 --diagnostics main.cpp && cmp main.cpp \"$OLDPWD/main.cpp\"");
+  EXPECT_EQ(edits.status, 0) << edits.out << edits.err;
+  const std::string diff = "-  return shapes::Clamp(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n"
+                           "+  return shapes::Limit(rectangle.Area(), 0, 100) == 48 ? 0 : 1;\n }\n";
+  e2e::ExpectHas(edits.out, {diff + "unwritten\n", diff + "  written: main.cpp\n"
+                        "diagnostics main.cpp\nmain.cpp:15:18: error: No member named 'Limit' in namespace 'shapes'",
+                        R"({"title":"change 'Clam' to 'Clamp'","kind":"quickfix","preferred":true,"edits":[{"path":")",
+                        R"(main.cpp","line":15,"column":18,"endLine":15,"endColumn":22,"newText":"Clamp"}],"applied":true})",
+                        R"({"action":"diagnostics","file":"main.cpp","failed":false,"result":[]})"});
+  e2e::ExpectHas(edits.err, {"vexil: note: clangd proposed edits only in files it has opened"});
 
   // What a server asks to apply is shown, and written only with --apply; an edit that
   // cannot be made writes nothing and fails the action.
@@ -137,15 +113,11 @@ TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
                        "\"$VEXIL\" lsp --apply -- \"$FAKE\" --request fake/x " + ask + edit + "," + edit + "]}}}}]}'; "
                        "status=$?; cat \"$SCRATCH/a.cpp\"; exit $status");
   EXPECT_EQ(asked.status, 1);
-  EXPECT_NE(asked.out.find(R"("result":{"applied":false,"failureReason":"vexil lsp writes edits only with --apply"}}])"),
-            std::string::npos) << asked.out;
-  EXPECT_NE(asked.out.find("  the server asked for edits:\n--- "), std::string::npos) << asked.out;
-  EXPECT_NE(asked.out.find("-int x = 1;\n+int y = 1;\nint x = 1;\n"), std::string::npos) << asked.out;
-  EXPECT_NE(asked.out.find(R"("result":{"applied":true}}])"), std::string::npos) << asked.out;
-  EXPECT_NE(asked.out.find("  written: "), std::string::npos) << asked.out;
-  EXPECT_EQ(asked.out.substr(asked.out.size() - 22), "int y = 1;\nint y = 1;\n") << asked.out;
-  EXPECT_NE(asked.err.find("vexil: request fake/x: the server asked for edits: nothing written: Cannot edit "),
-            std::string::npos) << asked.err;
+  e2e::ExpectHas(asked.out, {R"("result":{"applied":false,"failureReason":"vexil lsp writes edits only with --apply"}}])",
+                        "  the server asked for edits:\n--- ", "-int x = 1;\n+int y = 1;\nint x = 1;\n",
+                        R"("result":{"applied":true}}])", "  written: "});
+  EXPECT_TRUE(e2e::EndsWith(asked.out, "int y = 1;\nint y = 1;\n")) << asked.out;
+  e2e::ExpectHas(asked.err, {"vexil: request fake/x: the server asked for edits: nothing written: Cannot edit "});
 
   // --apply=N takes the Nth code action, a number never a title; without a choice, two
   // actions none of which is preferred write nothing.
@@ -158,11 +130,10 @@ TEST(CommandLine, LspWritesJsonLinesWithNamedKindsAndDiffsForRenames) {
                         " --code-actions \"$SCRATCH/c.cpp:1:5\"; cat \"$SCRATCH/c.cpp\"; \"$VEXIL\" lsp --apply=2 -- \"$FAKE\" "
                         "diagnose " + actions + " --code-actions \"$SCRATCH/c.cpp:1:5\" && cat \"$SCRATCH/c.cpp\"");
   EXPECT_EQ(chosen.status, 0) << chosen.err;
-  EXPECT_NE(chosen.err.find(": none of the code actions is preferred; choose one with --apply=N: 1. Use 2; 2. second\n"),
-            std::string::npos) << chosen.err;
+  e2e::ExpectHas(chosen.err, {": none of the code actions is preferred; choose one with --apply=N: 1. Use 2; 2. second\n"});
   EXPECT_EQ(chosen.out.rfind("int a;\ncode-actions ", 0), 0u) << chosen.out;
-  EXPECT_NE(chosen.out.find("* 2. second\n"), std::string::npos) << chosen.out;
-  EXPECT_EQ(chosen.out.substr(chosen.out.size() - 7), "int c;\n") << chosen.out;
+  e2e::ExpectHas(chosen.out, {"* 2. second\n"});
+  EXPECT_TRUE(e2e::EndsWith(chosen.out, "int c;\n")) << chosen.out;
 }
 
 // Neither server offers pulled diagnostics, so the command waits for the publication; once
@@ -175,13 +146,11 @@ TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormatWithByteColumns) {
   { std::ofstream(cpp) << "int main() {\n  const char* s = \"\xC3\xA9t\xC3\xA9\"; return undefined_name; }\n"; }
   Result run = Vexil("lsp --timeout=60000 -- pylsp --hover " + python + ":3:1 --diagnostics " + python);
   EXPECT_EQ(run.status, 0) << run.err;
-  EXPECT_NE(run.out.find(python + ":3:7: error: undefined name 'undefined_name' [pyflakes]\n"), std::string::npos)
-      << run.out;
-  EXPECT_NE(run.out.find(python + ":1:1: warning: 'os' imported but unused [pyflakes]\n"), std::string::npos) << run.out;
+  e2e::ExpectHas(run.out, {python + ":3:7: error: undefined name 'undefined_name' [pyflakes]\n",
+                      python + ":1:1: warning: 'os' imported but unused [pyflakes]\n"});
   EXPECT_LT(run.seconds, 30) << "waited for a publication already stored";
   Result clangd = Vexil("lsp -- clangd --log=error --diagnostics " + cpp);
-  EXPECT_NE(clangd.out.find(cpp + ":2:35: error: Use of undeclared identifier 'undefined_name' [clang "), std::string::npos)
-      << clangd.out;
+  e2e::ExpectHas(clangd.out, {cpp + ":2:35: error: Use of undeclared identifier 'undefined_name' [clang "});
 
   // --watch: pylsp lints open files again when its configuration changes on disk, with no
   // didChange; SIGTERM then shuts it down.
@@ -196,10 +165,9 @@ TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormatWithByteColumns) {
                            "long.py:1:80: warning: E501 line too long (106 > 79 characters) [pycodestyle E501]\n"),
             0u)
       << watch.out;
-  EXPECT_NE(watch.out.find(R"("method":"workspace/didChangeWatchedFiles","params":{"changes":[{"uri":"file://)"),
-            std::string::npos);
+  e2e::ExpectHas(watch.out, {R"("method":"workspace/didChangeWatchedFiles","params":{"changes":[{"uri":"file://)",
+                        R"("method":"shutdown")"});
   EXPECT_EQ(watch.out.find("textDocument/didChange\""), std::string::npos);
-  EXPECT_NE(watch.out.find(R"("method":"shutdown")"), std::string::npos);
 }
 
 // Every failure is one line on stderr with its exit status; a program that is no server
@@ -246,7 +214,7 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
     EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << test.arguments << "\n" << run.err;
     EXPECT_LT(run.seconds, 30) << test.arguments;
   }
-  EXPECT_EQ(Slurp(fine), "int x = 1;\n");
+  EXPECT_EQ(e2e::ReadFile(fine), "int x = 1;\n");
   Result json = Vexil("lsp --json -- vexil-no-such-server --hover main.cpp:1:1");
   EXPECT_EQ(json.out.rfind(R"({"action":"start","failed":true,"error":"vexil-no-such-server did not start: )", 0), 0u)
       << json.out;
@@ -269,7 +237,7 @@ TEST(CommandLine, InterruptsEndTheCommandAndWhatItStarted) {
       "for i in $(seq 300); do kill -0 $child 2>/dev/null || { echo gone; break; }; sleep 0.1; done; ";
   Result lsp = Shell("\"$VEXIL\" lsp --timeout=60000 -- \"$FAKE\" late=textDocument/hover:60000 --hover main.cpp:1:1 & "
                   "pid=$!; " + awaitChild + "sleep 0.5; kill -TERM $pid; " + report);
-  EXPECT_NE(lsp.out.find("status=143\ngone\n"), std::string::npos) << lsp.out << lsp.err;
+  e2e::ExpectHas(lsp.out + lsp.err, {"status=143\ngone\n"});
 
   // The task's command outlives the edit that started it; Ctrl-C ends both.
   Result task = Shell("echo x > \"$SCRATCH/a.cpp\"; "
@@ -277,8 +245,7 @@ TEST(CommandLine, InterruptsEndTheCommandAndWhatItStarted) {
                    "for i in $(seq 300); do echo y >> \"$SCRATCH/a.cpp\"; "
                    "child=$(pgrep -P $pid | head -n1); [ -n \"$child\" ] && break; sleep 0.1; done; "
                    "kill -INT $pid; " + report);
-  EXPECT_NE(task.out.find("status=130\ngone\n"), std::string::npos) << task.out << task.err;
-  EXPECT_NE(task.err.find("vexil: task released\n"), std::string::npos) << task.err;
+  e2e::ExpectHas(task.out + task.err, {"status=130\ngone\n", "vexil: task released\n"});
 }
 
 // Without --shell the command line is split into words and run directly, in --dir; every
@@ -292,9 +259,7 @@ TEST(CommandLine, TaskRunsItsSplitCommandInItsDirectoryAndShowsTheExitStatus) {
       "grep -q 'exit status 3' \"$SCRATCH/log\" && break; sleep 0.2; done; "
       "kill -INT $pid; wait $pid; cat \"$SCRATCH/log\"";
   Result run = Shell(script);
-  EXPECT_NE(run.out.find("Message: hit a b.cpp\n"), std::string::npos) << run.out;
-  EXPECT_NE(run.out.find("/work\n"), std::string::npos) << run.out;
-  EXPECT_NE(run.out.find("Message: vexil: exit status 3\n"), std::string::npos) << run.out;
+  e2e::ExpectHas(run.out, {"Message: hit a b.cpp\n", "/work\n", "Message: vexil: exit status 3\n"});
 }
 
 }  // namespace

@@ -2,6 +2,7 @@
 // projects' files, positions found by the text at them, and an error-line recorder.
 #pragma once
 
+#include <gtest/gtest.h>
 #include <signal.h>
 #include <unistd.h>
 
@@ -9,6 +10,7 @@
 #include <atomic>
 #include <chrono>
 #include <fstream>
+#include <map>
 #include <regex>
 #include <sstream>
 #include <string>
@@ -93,14 +95,57 @@ inline int LineOf(const Project& project, const std::string& file, const std::st
   return Find(project, file, needle).line;
 }
 
-inline void Open(xLanguageServer& server, const Project& project, const std::string& file) {
+// Fails naming each of `pieces` that `text` lacks.
+inline void ExpectHas(const std::string& text, std::initializer_list<std::string> pieces) {
+  for (const std::string& piece : pieces) EXPECT_NE(text.find(piece), std::string::npos) << piece << "\n--- in:\n" << text;
+}
+
+// Opens `file` of `project` with `text`, by default what the file holds.
+inline void Open(xLanguageServer& server, const Project& project, const std::string& file, const std::string* text = nullptr) {
   static const xLanguages languages;
   LSP::DidOpenTextDocumentParams params;
   params.textDocument.uri = Uri(project, file);
   params.textDocument.languageId = languages.LanguageId(file.substr(file.rfind('.') + 1).c_str());
   params.textDocument.version = 1;
-  params.textDocument.text = ReadFile(Path(project, file));
+  params.textDocument.text = text ? *text : ReadFile(Path(project, file));
   server.TextDocument_DidOpen(&params);
+}
+
+// Replaces the whole text of an open document.
+inline void Change(xLanguageServer& server, const std::string& uri, int version, const std::string& text) {
+  LSP::DidChangeTextDocumentParams change;
+  change.textDocument = LSP::VersionedTextDocumentIdentifier(uri, version);
+  change.contentChanges.emplace_back();
+  change.contentChanges.back().text = text;
+  server.TextDocument_DidChange(&change);
+}
+
+// Polls `condition` until it holds or `seconds` pass (real servers on a loaded machine are
+// slow); says whether it held.
+template <typename Condition>
+bool Await(Condition condition, int seconds = 60) {
+  auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
+  while (!condition()) {
+    if (std::chrono::steady_clock::now() > deadline) return false;
+    std::this_thread::sleep_for(std::chrono::milliseconds(20));
+  }
+  return true;
+}
+
+// The diagnostics stored for `uri` once there are some (or, unless `any`, none), or the last seen.
+inline std::vector<LSP::Diagnostic> Diagnostics(xLanguageServer& server, const std::string& uri, bool any) {
+  std::vector<LSP::Diagnostic> stored;
+  Await([&] { return (stored = server.TextDocument_Diagnostics(uri.c_str())).empty() != any; });
+  return stored;
+}
+
+// The server publishes one error for `uri`, at `line` and with `message` in its text.
+inline void ExpectOneError(xLanguageServer& server, const std::string& uri, int line, const std::string& message) {
+  std::vector<LSP::Diagnostic> stored = Diagnostics(server, uri, true);
+  ASSERT_EQ(stored.size(), 1u);
+  EXPECT_EQ(stored[0].range.start.line, line);
+  EXPECT_EQ(stored[0].severity, 1);
+  ExpectHas(stored[0].message, {message});
 }
 
 template <typename P = LSP::TextDocumentPositionParams>
@@ -108,6 +153,14 @@ P At(const Project& project, const std::string& file, const LSP::Position& posit
   P params;
   params.textDocument.uri = Uri(project, file);
   params.position = position;
+  return params;
+}
+
+// Params of a call about the whole of `file`.
+template <typename P>
+P Document(const Project& project, const std::string& file) {
+  P params;
+  params.textDocument.uri = Uri(project, file);
   return params;
 }
 
@@ -121,6 +174,22 @@ inline std::vector<int> StartLines(const std::string& json) {
   return lines;
 }
 
+// How many of `locations` lie in each file.
+inline std::map<std::string, int> PerFile(const std::vector<LSP::Location>& locations) {
+  std::map<std::string, int> count;
+  for (const LSP::Location& location : locations) ++count[UriToFile(location.uri.c_str())];
+  return count;
+}
+
+// The start lines of the highlights the server gives at `at`, in its order.
+inline std::vector<int> HighlightLines(xLanguageServer& server, LSP::TextDocumentPositionParams at) {
+  std::vector<int> lines;
+  for (const LSP::DocumentHighlight& highlight : server.TextDocument_DocumentHighlight(&at)) {
+    lines.push_back(highlight.range.start.line);
+  }
+  return lines;
+}
+
 inline bool EndsWith(const std::string& text, const std::string& end) {
   return text.size() >= end.size() && text.compare(text.size() - end.size(), end.size(), end) == 0;
 }
@@ -128,22 +197,13 @@ inline bool EndsWith(const std::string& text, const std::string& end) {
 // Kills a server this test started, by its process id, and waits until it is gone.
 inline bool Kill(xLanguageServer& server) {
   if (server.Id() > 0) ::kill(server.Id(), SIGKILL);
-  auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(20);
-  while (server.IsRunning()) {
-    if (std::chrono::steady_clock::now() > deadline) return false;
-    std::this_thread::sleep_for(std::chrono::milliseconds(10));
-  }
-  return true;
+  return Await([&] { return !server.IsRunning(); });
 }
 
 // Exit gives a server about a second to end and, when it has not, returns false and leaves
 // the connection usable: on a loaded machine a host (and a test) asks again.
 inline bool Exits(xLanguageServer& server) {
-  auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(30);
-  while (!server.Exit()) {
-    if (std::chrono::steady_clock::now() > deadline) return false;
-  }
-  return true;
+  return Await([&] { return server.Exit(); }, 30);
 }
 
 }  // namespace e2e

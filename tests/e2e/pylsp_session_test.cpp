@@ -1,5 +1,5 @@
 // A pylsp session through the shared library over the Python example: the answers jedi
-// gives about the geometry module, then shutdown and exit.
+// gives about the geometry module, pyflakes' error and its fix, then shutdown and exit.
 #include <gtest/gtest.h>
 
 #include <map>
@@ -20,8 +20,7 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
 
   auto call = At(project, "main.py", Find(project, "main.py", "print(clamp(", 6));
   LSP::Hover hover = server->TextDocument_Hover(&call);
-  EXPECT_NE(hover.contents.value.find("clamp(value, low, high)"), std::string::npos) << hover.contents.value;
-  EXPECT_NE(hover.contents.value.find("Limit value to the range from low to high."), std::string::npos);
+  ExpectHas(hover.contents.value, {"clamp(value, low, high)", "Limit value to the range from low to high."});
 
   std::vector<LSP::Location> definition = server->TextDocument_Definition(&call);
   ASSERT_EQ(definition.size(), 1u);
@@ -29,9 +28,8 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   EXPECT_EQ(definition[0].range.start.line, LineOf(project, "geometry.py", "def clamp"));
 
   // The definition and two calls in geometry.py, the import and one call in main.py.
-  std::map<std::string, int> perFile;
-  for (const LSP::Location& location : server->TextDocument_References(&call)) ++perFile[UriToFile(location.uri.c_str())];
-  EXPECT_EQ(perFile, (std::map<std::string, int>{{Path(project, "geometry.py"), 3}, {Path(project, "main.py"), 2}}));
+  EXPECT_EQ(PerFile(server->TextDocument_References(&call)),
+            (std::map<std::string, int>{{Path(project, "geometry.py"), 3}, {Path(project, "main.py"), 2}}));
 
   // Beyond the typed calls: what pylsp announced, and a request the interface has no call for.
   EXPECT_TRUE(server->ServerCapabilities().documentHighlightProvider);
@@ -39,13 +37,8 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   std::string highlights = server->Request("textDocument/documentHighlight", LSP::ToJsonText(call).c_str());
   EXPECT_EQ(StartLines(highlights), (std::vector<int>{LineOf(project, "main.py", "import"), call.position.line}))
       << highlights;
-  std::vector<int> highlighted;
-  for (const LSP::DocumentHighlight& highlight : server->TextDocument_DocumentHighlight(&call)) {
-    highlighted.push_back(highlight.range.start.line);
-  }
-  EXPECT_EQ(highlighted, StartLines(highlights));
-  LSP::FoldingRangeParams folding;
-  folding.textDocument.uri = Uri(project, "geometry.py");
+  EXPECT_EQ(HighlightLines(*server, call), StartLines(highlights));
+  auto folding = Document<LSP::FoldingRangeParams>(project, "geometry.py");
   std::vector<LSP::FoldingRange> folds = server->TextDocument_FoldingRange(&folding);
   EXPECT_TRUE(std::any_of(folds.begin(), folds.end(), [&](const LSP::FoldingRange& fold) {
     return fold.startLine == LineOf(project, "geometry.py", "class Rectangle") && fold.endLine >= LineOf(project, "geometry.py", "self.height = clamp");
@@ -54,16 +47,14 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   auto member = At<LSP::CompletionParams>(project, "main.py", Find(project, "main.py", "rectangle.scale", 10));
   std::set<std::string> labels;
   for (const LSP::CompletionItem& item : server->TextDocument_Completion(&member).items) labels.insert(item.label);
-  EXPECT_EQ(labels.count("area()"), 1u);
-  EXPECT_EQ(labels.count("scale(factor)"), 1u);
+  for (const char* label : {"area()", "scale(factor)"}) EXPECT_EQ(labels.count(label), 1u) << label;
 
   auto inCall = At(project, "main.py", Find(project, "main.py", "print(clamp(", 12));
   LSP::SignatureHelp help = server->TextDocument_Signature(&inCall);
   ASSERT_EQ(help.signatures.size(), 1u);
   EXPECT_EQ(help.signatures[0].label, "clamp(value, low, high)");
 
-  LSP::DocumentSymbolParams module;
-  module.textDocument.uri = Uri(project, "geometry.py");
+  auto module = Document<LSP::DocumentSymbolParams>(project, "geometry.py");
   std::map<std::string, int> symbolLines;
   for (const LSP::SymbolInformation& symbol : server->TextDocument_DocumentSymbol(&module)) {
     symbolLines[symbol.name] = symbol.location.range.start.line;
@@ -80,8 +71,18 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
       renamedModule = document.edits[0].newText;
     }
   }
-  EXPECT_NE(renamedModule.find("def limit(value, low, high):"), std::string::npos) << renamedModule;
+  ExpectHas(renamedModule, {"def limit(value, low, high):"});
   EXPECT_FALSE(server->HaveErrors());
+
+  // A misspelt name, published at its line, and the list emptied once it is fixed.
+  const std::string broken = "def area(width):\n    return widht * 2\n";
+  Open(*server, project, "probe.py", &broken);
+  const std::string probe = Uri(project, "probe.py");
+  ExpectOneError(*server, probe, 1, "undefined name 'widht'");
+  int before = server->DiagnosticsVersion();
+  Change(*server, probe, 2, "def area(width):\n    return width * 2\n");
+  EXPECT_TRUE(Diagnostics(*server, probe, false).empty());
+  EXPECT_NE(server->DiagnosticsVersion(), before);
 
   EXPECT_TRUE(server->Shutdown());
   EXPECT_TRUE(Exits(*server));
