@@ -26,13 +26,6 @@ std::set<std::string> Names(const std::vector<LSP::SymbolInformation>& symbols) 
   return names;
 }
 
-// clangd builds and indexes opened files in the background; until then completion falls
-// back to plain words and renames see one file. All five uses of Clamp found means ready.
-bool AwaitIndexed(xLanguageServer& server, const Project& project, const LSP::Position& clampCall) {
-  auto at = At(project, "main.cpp", clampCall);
-  return Await([&] { return server.TextDocument_References(&at).size() >= 5; });
-}
-
 // The steps share one session, started once: clangd takes long to index on a loaded machine.
 TEST(ClangdSession, AnswersEveryFeatureThenDiagnosesChangesUntilShutdownAndExit) {
   Project project = Cpp();
@@ -42,10 +35,12 @@ TEST(ClangdSession, AnswersEveryFeatureThenDiagnosesChangesUntilShutdownAndExit)
   for (const char* file : {"shapes.h", "shapes.cpp", "main.cpp"}) Open(*server, project, file);
   // Clamp as main.cpp calls it.
   LSP::Position clampCall = Find(project, "main.cpp", "shapes::Clamp(", 8);
-  ASSERT_TRUE(AwaitIndexed(*server, project, clampCall));
+  // clangd builds and indexes opened files in the background; until then completion falls
+  // back to plain words and renames see one file. All five uses of Clamp found means ready.
+  auto at = At(project, "main.cpp", clampCall);
+  ASSERT_TRUE(Await([&] { return server->TextDocument_References(&at).size() >= 5; }));
 
   // Navigation: the declaration, definition and uses of the example.
-  auto at = At(project, "main.cpp", clampCall);
   LSP::Hover hover = server->TextDocument_Hover(&at);
   ExpectHas(hover.contents.value, {"function Clamp", "int Clamp(int value, int low, int high)"});
   EXPECT_EQ(hover.range.start.line, clampCall.line);

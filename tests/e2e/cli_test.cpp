@@ -177,11 +177,7 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
   { std::ofstream(directory / "latin.cpp") << "int caf\xE9 = 1;\n"; }
   const std::string fine = directory / "fine.cpp";
   { std::ofstream(fine) << "int x = 1;\n"; }
-  struct Case {
-    std::string arguments;
-    int status;
-    std::string line;  // the beginning of the one line on stderr
-  };
+  struct Case { std::string arguments; int status; std::string line; };  // line: how stderr begins
   const std::string details = " (rerun with --trace verbose for details)\n";
   const Case cases[] = {
       {"lsp -- clangd --hover nosuch.cpp:1:1", 1, "vexil: nosuch.cpp: No such file or directory\n"},

@@ -142,9 +142,9 @@ inline std::vector<LSP::Diagnostic> Diagnostics(xLanguageServer& server, const s
 // The server publishes one error for `uri`, at `line` and with `message` in its text.
 inline void ExpectOneError(xLanguageServer& server, const std::string& uri, int line, const std::string& message) {
   std::vector<LSP::Diagnostic> stored = Diagnostics(server, uri, true);
-  ASSERT_EQ(stored.size(), 1u);
-  EXPECT_EQ(stored[0].range.start.line, line);
-  EXPECT_EQ(stored[0].severity, 1);
+  ASSERT_EQ(stored.size(), 1u) << uri;
+  EXPECT_EQ(stored[0].range.start.line, line) << uri;
+  EXPECT_EQ(stored[0].severity, 1) << uri;
   ExpectHas(stored[0].message, {message});
 }
 

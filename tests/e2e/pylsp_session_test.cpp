@@ -65,13 +65,10 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   auto rename = At<LSP::RenameParams>(project, "main.py", call.position);
   rename.newName = "limit";
   LSP::WorkspaceEdit change = server->TextDocument_Rename(&rename);
-  std::string renamedModule;
-  for (const LSP::TextDocumentEdit& document : change.documentChanges) {
-    if (EndsWith(document.textDocument.uri, "/geometry.py") && !document.edits.empty()) {
-      renamedModule = document.edits[0].newText;
-    }
-  }
-  ExpectHas(renamedModule, {"def limit(value, low, high):"});
+  std::string renamed;  // pylsp replaces the whole text of each file
+  for (const LSP::TextDocumentEdit& document : change.documentChanges)
+    if (EndsWith(document.textDocument.uri, "/geometry.py") && !document.edits.empty()) renamed = document.edits[0].newText;
+  ExpectHas(renamed, {"def limit(value, low, high):"});
   EXPECT_FALSE(server->HaveErrors());
 
   // A misspelt name, published at its line, and the list emptied once it is fixed.
