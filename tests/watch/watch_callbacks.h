@@ -70,9 +70,14 @@ inline std::vector<Delivered> Events() {
 }
 
 inline bool WaitForTrace(const TraceLine& line) {
+  // Only the lines added since the last look are searched: a command's output of 200,000
+  // lines wakes the waiter at every line, and searching all of them each time is quadratic.
+  std::size_t searched = 0;
   return Recorded().shared.WaitUntil([&] {
     const auto& traces = Recorded().traces;
-    return std::find(traces.begin(), traces.end(), line) != traces.end();
+    const auto from = traces.begin() + static_cast<std::ptrdiff_t>(std::min(searched, traces.size()));
+    searched = traces.size();
+    return std::find(from, traces.end(), line) != traces.end();
   });
 }
 
