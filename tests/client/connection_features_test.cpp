@@ -33,23 +33,22 @@ class ConnectionFeatures : public ::testing::Test {
   }
 };
 
-// Every request answered with null: each comes back empty, under its own method.
+// Every request answered with null: each comes back empty, under its own method, in the
+// order of `methods`.
 TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
+  const std::vector<std::string> methods = {
+      "textDocument/completion", "textDocument/declaration", "textDocument/definition",
+      "textDocument/typeDefinition", "textDocument/implementation", "textDocument/references",
+      "textDocument/documentSymbol", "workspace/symbol", "textDocument/hover",
+      "textDocument/signatureHelp", "textDocument/formatting", "textDocument/rangeFormatting",
+      "textDocument/rename", "textDocument/codeAction", "workspace/executeCommand",
+      "textDocument/documentHighlight", "textDocument/foldingRange", "textDocument/selectionRange",
+      "textDocument/semanticTokens/full", "textDocument/inlayHint", "completionItem/resolve",
+      "textDocument/prepareRename", "textDocument/prepareCallHierarchy",
+      "callHierarchy/incomingCalls", "callHierarchy/outgoingCalls"};
   std::string nulls;
-  for (const char* method : {"completion", "declaration", "definition", "typeDefinition", "implementation",
-                             "references", "documentSymbol", "hover", "signatureHelp", "formatting",
-                             "rangeFormatting", "rename"}) {
-    nulls += std::string("result=textDocument/") + method + ":null;";
-  }
-  for (const char* method : {"codeAction", "documentHighlight", "foldingRange", "selectionRange",
-                             "semanticTokens/full", "inlayHint", "prepareRename", "prepareCallHierarchy"}) {
-    nulls += std::string("result=textDocument/") + method + ":null;";
-  }
-  for (const char* method : {"workspace/executeCommand", "completionItem/resolve", "callHierarchy/incomingCalls",
-                             "callHierarchy/outgoingCalls"}) {
-    nulls += std::string("result=") + method + ":null;";
-  }
-  xLanguageServer* server = Started({nulls + "result=workspace/symbol:null"});
+  for (const std::string& method : methods) nulls += "result=" + method + ":null;";
+  xLanguageServer* server = Started({nulls});
   auto position = At<LSP::TextDocumentPositionParams>(3, 4);
   auto completion = At<LSP::CompletionParams>(3, 4);
   auto rename = At<LSP::RenameParams>(3, 4);
@@ -58,6 +57,15 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   LSP::WorkspaceSymbolParams query;
   LSP::DocumentFormattingParams formatting;
   LSP::DocumentRangeFormattingParams rangeFormatting;
+  LSP::CodeActionParams actions;
+  LSP::ExecuteCommandParams command;
+  command.command = "fake.run";
+  LSP::FoldingRangeParams folding;
+  LSP::SelectionRangeParams selection;
+  LSP::SemanticTokensParams tokens;
+  LSP::InlayHintParams hints;
+  LSP::CompletionItem item;
+  LSP::CallHierarchyItem function;
 
   EXPECT_TRUE(server->TextDocument_Completion(&completion).items.empty());
   EXPECT_TRUE(server->TextDocument_Declaration(&position).empty());
@@ -72,15 +80,6 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   EXPECT_TRUE(server->TextDocument_Formatting(&formatting).empty());
   EXPECT_TRUE(server->TextDocument_RangeFormatting(&rangeFormatting).empty());
   EXPECT_TRUE(server->TextDocument_Rename(&rename).documentChanges.empty());
-  LSP::CodeActionParams actions;
-  LSP::ExecuteCommandParams command;
-  command.command = "fake.run";
-  LSP::FoldingRangeParams folding;
-  LSP::SelectionRangeParams selection;
-  LSP::SemanticTokensParams tokens;
-  LSP::InlayHintParams hints;
-  LSP::CompletionItem item;
-  LSP::CallHierarchyItem function;
   EXPECT_TRUE(server->TextDocument_CodeAction(&actions).empty());
   EXPECT_EQ(server->Workspace_ExecuteCommand(&command), "null");
   EXPECT_TRUE(server->TextDocument_DocumentHighlight(&position).empty());
@@ -95,35 +94,19 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   EXPECT_TRUE(server->CallHierarchy_OutgoingCalls(&function).empty());
   EXPECT_FALSE(server->HaveErrors());
 
-  std::vector<std::string> methods;
+  std::vector<std::string> sent;
   for (const std::string& body : SentBodies()) {
     std::size_t start = body.find("\"method\":\"") + 10;
-    methods.push_back(body.substr(start, body.find('"', start) - start));
+    sent.push_back(body.substr(start, body.find('"', start) - start));
   }
-  EXPECT_EQ(methods, (std::vector<std::string>{
-                         "textDocument/completion", "textDocument/declaration", "textDocument/definition",
-                         "textDocument/typeDefinition", "textDocument/implementation", "textDocument/references",
-                         "textDocument/documentSymbol", "workspace/symbol", "textDocument/hover",
-                         "textDocument/signatureHelp", "textDocument/formatting", "textDocument/rangeFormatting",
-                         "textDocument/rename", "textDocument/codeAction", "workspace/executeCommand",
-                         "textDocument/documentHighlight", "textDocument/foldingRange", "textDocument/selectionRange",
-                         "textDocument/semanticTokens/full", "textDocument/inlayHint", "completionItem/resolve",
-                         "textDocument/prepareRename", "textDocument/prepareCallHierarchy",
-                         "callHierarchy/incomingCalls", "callHierarchy/outgoingCalls"}));
+  EXPECT_EQ(sent, methods);
   EXPECT_FALSE(TraceLog::Contains("Timed out"));
 }
 
 TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
   xLanguageServer* server = Started();
-  LSP::DidOpenTextDocumentParams open;
-  open.textDocument.uri = kUri;
-  open.textDocument.languageId = "cpp";
-  open.textDocument.version = 1;
-  open.textDocument.text = "int x;\n";
-  LSP::DidChangeTextDocumentParams change;
-  change.textDocument = LSP::VersionedTextDocumentIdentifier(kUri, 2);
-  change.contentChanges.emplace_back();
-  change.contentChanges.back().text = "int y;\n";
+  auto open = Opened(kUri, "int x;\n");
+  auto change = Changed(kUri, "int y;\n");
   LSP::DidSaveTextDocumentParams save;
   save.textDocument.uri = kUri;
   LSP::DidCloseTextDocumentParams close;
@@ -179,9 +162,7 @@ TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
          R"(result=textDocument/completion:[{"label": "clamp","data":{"id":7}}])",
          R"x(result=completionItem/resolve:{"label": "clamp","detail":"int clamp(int)"})x",
          R"(result=textDocument/codeAction:[{"title": "Fix it","command":"fake.fix","arguments":[1,{"a":2}]}])"});
-    LSP::DidOpenTextDocumentParams open;
-    open.textDocument.uri = kUri;
-    open.textDocument.text = "ok\nerror here\nok\nerror again\n";
+    auto open = Opened(kUri, "ok\nerror here\nok\nerror again\n");
     server->TextDocument_DidOpen(&open);
     ASSERT_TRUE(transport_test::WaitFor([&] { return server->TextDocument_Diagnostics(kUri).size() == 2; }));
 
@@ -335,9 +316,7 @@ TEST_F(ConnectionFeatures, CancelEndsAWaitingCallAndNothingElse) {
 
 // The server runs in the host's environment plus what the host set, minus what it removed.
 TEST_F(ConnectionFeatures, ServersGetTheEnvironmentTheHostSet) {
-  xServerStart start = transport_test::FakeStart({}, 2000, LSP::TraceLevel::Messages);
-  start.name = kName;
-  xLanguageServer* server = Vexil_Start(start);
+  xLanguageServer* server = Fake(kName);
   const char* removed = std::getenv("HOME") ? "HOME" : "TEMP";
   EXPECT_TRUE(server->SetEnvironment("VEXIL_FIRST", "one"));
   EXPECT_TRUE(server->SetEnvironment("VEXIL_SECOND", "two words=2"));
