@@ -220,28 +220,9 @@ TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {
   EXPECT_EQ(symbols[0].location.range.start.line, 16);
 }
 
-TEST_F(ConnectionFeatures, ErrorRepliesAndDeadServersGiveEmptyResultsAndTheErrorState) {
-  xLanguageServer* server = Started({"error=textDocument/hover"});
-  auto position = At<LSP::TextDocumentPositionParams>(0, 0);
-  EXPECT_TRUE(server->TextDocument_Hover(&position).contents.value.empty());
-  EXPECT_TRUE(server->HaveErrors());
-  EXPECT_STREQ(server->ErrorMessage(), "refused textDocument/hover");
-  server->TextDocument_Definition(&position);
-  EXPECT_FALSE(server->HaveErrors()) << "every request starts with a clean error state";
-
-  vexil_test::KillProcess(server->Id());
-  ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
-  TraceLog::Clear();
-  LSP::DidCloseTextDocumentParams close;
-  server->TextDocument_DidClose(&close);
-  EXPECT_TRUE(TraceLog::Lines().empty());
-  EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
-  EXPECT_TRUE(server->HaveErrors());
-  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
-}
-
-// Requests and notifications of any method, with params as JSON text, and every way one fails.
-TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailure) {
+// Requests and notifications of any method, with params as JSON text, and every way one
+// fails; typed requests after them, refused and to a dead server.
+TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailureThenTypedFailures) {
   struct Row {
     const char* method;
     const char* params;
@@ -265,7 +246,7 @@ TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailure) {
       {"fake/note", "{", "", nullptr, "Invalid JSON for fake/note: Missing a name for object member.", true},
       {"fake/silent", "{}", "", R"(,"params":{}})", ""},
   };
-  xLanguageServer* server = Started({"result=fake/null:null;error=fake/refused"});
+  xLanguageServer* server = Started({"result=fake/null:null;error=fake/refused;error=textDocument/hover"});
   for (const Row& row : rows) {
     SCOPED_TRACE(row.method + std::string(" ") + (row.params ? row.params : "(null)"));
     TraceLog::Clear();
@@ -283,9 +264,20 @@ TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailure) {
   }
   EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), 1);
   EXPECT_NE(SentBody("$/cancelRequest"), "");
+  auto position = At<LSP::TextDocumentPositionParams>(0, 0);
+  EXPECT_TRUE(server->TextDocument_Hover(&position).contents.value.empty());
+  EXPECT_STREQ(server->ErrorMessage(), "refused textDocument/hover");
+  server->TextDocument_Definition(&position);
+  EXPECT_FALSE(server->HaveErrors()) << "every request starts with a clean error state";
 
   vexil_test::KillProcess(server->Id());
   ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
+  TraceLog::Clear();
+  LSP::DidCloseTextDocumentParams close;
+  server->TextDocument_DidClose(&close);
+  EXPECT_TRUE(TraceLog::Lines().empty()) << "nothing is written to a dead server";
+  EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
+  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
   EXPECT_EQ(server->Request("fake/echo", "{}"), "");
   EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
   EXPECT_FALSE(server->Notify("fake/note", "{}"));
