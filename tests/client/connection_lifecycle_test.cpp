@@ -7,13 +7,13 @@
 #include <filesystem>
 #include <fstream>
 #include <functional>
-#include <mutex>
 #include <set>
 #include <thread>
 #include <regex>
 #include <string>
 
 #include "../protocol/reply_helpers.h"
+#include "../watch/watch_fixture.h"
 #include "connection_test_support.h"
 #include "vexil/client/uri.h"
 
@@ -160,37 +160,24 @@ TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
 
 // A host's message handler: what it was handed, on which threads. It answers requests
 // with `reply` (a result, or "error" for an error) unless that is empty.
-class Handed {
- public:
+struct Handed {
   static void Handler(void* user, const char* method, const char* id, const char* params) {
     Handed& self = *static_cast<Handed*>(user);
-    std::lock_guard<std::mutex> lock(self.mutex_);
-    self.lines_.push_back(std::string(method) + " " + (id ? id : "-") + " " + params);
-    self.threads_.insert(std::this_thread::get_id());
-    if (!id || self.reply.empty()) return;
-    if (self.reply == "error") {
-      self.answered = self.server->ReplyError(id, -32001, "declined");
-    } else {
-      self.answered = self.server->Reply(id, self.reply.c_str());
-    }
-  }
-  std::vector<std::string> Lines() {
-    std::lock_guard<std::mutex> lock(mutex_);
-    return lines_;
-  }
-  std::set<std::thread::id> Threads() {
-    std::lock_guard<std::mutex> lock(mutex_);
-    return threads_;
+    self.shared.Update([&] {
+      self.lines.push_back(std::string(method) + " " + (id ? id : "-") + " " + params);
+      self.threads.insert(std::this_thread::get_id());
+      if (!id || self.reply.empty()) return;
+      self.answered = self.reply == "error" ? self.server->ReplyError(id, -32001, "declined")
+                                            : self.server->Reply(id, self.reply.c_str());
+    });
   }
 
+  watchtest::Shared shared;  // over the lines and threads
+  std::vector<std::string> lines;
+  std::set<std::thread::id> threads;
   xLanguageServer* server = nullptr;
   std::string reply;
   std::atomic<bool> answered{false};
-
- private:
-  std::mutex mutex_;
-  std::vector<std::string> lines_;
-  std::set<std::thread::id> threads_;
 };
 
 TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAnswered) {
@@ -241,12 +228,13 @@ TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAns
     ASSERT_TRUE(handed.server->Start(Init()));
     std::string returned = row.action(handed.server);
     EXPECT_NE(returned.find(row.answer), std::string::npos) << returned;
-    EXPECT_TRUE(transport_test::WaitFor([&] { return handed.Lines().size() >= row.handed.size(); }));
-    EXPECT_EQ(handed.Lines(), row.handed);
+    EXPECT_TRUE(handed.shared.WaitUntil([&] { return handed.lines.size() >= row.handed.size(); }));
+    EXPECT_EQ(handed.shared.Read([&] { return handed.lines; }), row.handed);
     EXPECT_EQ(handed.answered, !row.handed.empty() && std::string(row.reply).size() > 0);
+    const auto threads = handed.shared.Read([&] { return handed.threads; });
     if (!row.handed.empty()) {
-      EXPECT_EQ(handed.Threads().size(), 1u);
-      EXPECT_EQ(handed.Threads().count(std::this_thread::get_id()), 0u);
+      EXPECT_EQ(threads.size(), 1u);
+      EXPECT_EQ(threads.count(std::this_thread::get_id()), 0u);
     }
     // An answered request waits no more.
     EXPECT_FALSE(Vexil_Have(kName) && handed.server->Reply("0", "null"));
