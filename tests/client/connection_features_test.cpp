@@ -101,6 +101,17 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   }
   EXPECT_EQ(sent, methods);
   EXPECT_FALSE(TraceLog::Contains("Timed out"));
+
+  // Plain references include the declaration; reference params go as given.
+  const std::string params = R"("params":{"textDocument":{"uri":"file:///work/a.cpp"},"position":{"line":3,"character":4},)";
+  EXPECT_NE(SentBody("textDocument/references").find(params + R"("context":{"includeDeclaration":true}}})"),
+            std::string::npos);
+  auto explicitContext = At<LSP::ReferenceParams>(3, 4);
+  explicitContext.context.includeDeclaration = false;
+  TraceLog::Clear();
+  server->TextDocument_References(&explicitContext);
+  EXPECT_NE(SentBody("textDocument/references").find(params + R"("context":{"includeDeclaration":false}}})"),
+            std::string::npos);
 }
 
 TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
@@ -133,22 +144,6 @@ TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
       R"({"jsonrpc":"2.0","method":"workspace/didChangeWorkspaceFolders","params":{"event":{"added":[{"uri":"file:///work/b","name":"b"}],"removed":[]}}})",
       R"({"jsonrpc":"2.0","method":"textDocument/willSave","params":{"textDocument":{"uri":"file:///work/a.cpp"},"reason":1}})"}));
   EXPECT_TRUE(TraceLog::Texts("Error").empty());
-}
-
-TEST_F(ConnectionFeatures, PlainReferencesIncludeTheDeclarationAndReferenceParamsGoAsGiven) {
-  xLanguageServer* server = Started({"result=textDocument/references:null"});
-  auto plain = At<LSP::TextDocumentPositionParams>(1, 2);
-  auto explicitContext = At<LSP::ReferenceParams>(1, 2);
-  explicitContext.context.includeDeclaration = false;
-  server->TextDocument_References(&plain);
-  server->TextDocument_References(&explicitContext);
-  std::vector<std::string> bodies = SentBodies();
-  ASSERT_EQ(bodies.size(), 2u);
-  const char* params = R"("params":{"textDocument":{"uri":"file:///work/a.cpp"},"position":{"line":1,"character":2},)";
-  EXPECT_NE(bodies[0].find(std::string(params) + R"("context":{"includeDeclaration":true}}})"), std::string::npos)
-      << bodies[0];
-  EXPECT_NE(bodies[1].find(std::string(params) + R"("context":{"includeDeclaration":false}}})"), std::string::npos)
-      << bodies[1];
 }
 
 // Servers match quick fixes to the diagnostics they published, and resolve completion items
