@@ -366,18 +366,16 @@ TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyARelaunchWorksAndExitEmpties
   EXPECT_EQ(Vexil_Have(kName), nullptr);
 }
 
-TEST_F(ConnectionLifecycle, RefusedShutdownKeepsTheConnectionInitialized) {
-  xLanguageServer* server = Connection({"error=shutdown"});
+// A server that refuses shutdown stays initialized; one that ignores exit keeps its
+// connection, usable as before.
+TEST_F(ConnectionLifecycle, RefusedShutdownAndIgnoredExitKeepTheConnection) {
+  xLanguageServer* server = Connection({"error=shutdown", "ignore-exit"});
   ASSERT_TRUE(server->Start(Init()));
   EXPECT_FALSE(server->Shutdown());
   TraceLog::Clear();
   EXPECT_TRUE(server->Initialize(Init()));
   EXPECT_TRUE(SentBodies().empty());
-}
 
-TEST_F(ConnectionLifecycle, AServerThatIgnoresExitKeepsItsConnection) {
-  xLanguageServer* server = Connection({"ignore-exit"});
-  ASSERT_TRUE(server->Start(Init()));
   EXPECT_FALSE(server->Exit());
   EXPECT_EQ(Vexil_Have(kName), server);
   EXPECT_NE(SentBody("exit"), "");
