@@ -87,18 +87,4 @@ TEST_F(ConnectionDiagnostics, PullingStoresAFullReportAndSendsItsIdBack) {
   EXPECT_NE(SentBody("textDocument/diagnostic").find(R"("previousResultId":"r7")"), std::string::npos);
 }
 
-TEST_F(ConnectionDiagnostics, AnUnchangedReportReturnsTheStoredList) {
-  xLanguageServer* server =
-      Started({"diagnose", kProvider, R"(result=textDocument/diagnostic:{"kind": "unchanged","resultId":"r1"})"});
-  int before = server->DiagnosticsVersion();
-  auto open = Opened(kUri, "error\n");
-  server->TextDocument_DidOpen(&open);
-  ASSERT_TRUE(Moves(*server, before));
-  LSP::TextDocumentIdentifier document;
-  document.uri = kUri;
-  auto pulled = server->TextDocument_PullDiagnostics(&document);
-  ASSERT_EQ(pulled.size(), 1u);
-  EXPECT_EQ(pulled[0].message, "found error");
-}
-
 }  // namespace

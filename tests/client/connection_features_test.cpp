@@ -145,19 +145,26 @@ TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
 }
 
 // Servers match quick fixes to the diagnostics they published, and resolve completion items
-// by their "data": both go back as the server sent them.
+// by their "data": both go back as the server sent them. A pull the server answers with
+// "unchanged" gives the published list.
 TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
   for (bool resolves : {true, false}) {
     SCOPED_TRACE(resolves ? "resolve provider" : "no resolve provider");
+    const std::string capabilities = R"({"diagnosticProvider":{},"completionProvider":{"resolveProvider":)" +
+                                     std::string(resolves ? "true" : "false") + "}}";
     xLanguageServer* server = Started(
-        {"diagnose", std::string("result=initialize:{\"capabilities\": {\"completionProvider\":{\"resolveProvider\":") +
-                         (resolves ? "true" : "false") + "}}}",
+        {"diagnose", "result=initialize:{\"capabilities\": " + capabilities + "}",
+         R"(result=textDocument/diagnostic:{"kind": "unchanged","resultId":"r1"})",
          R"(result=textDocument/completion:[{"label": "clamp","data":{"id":7}}])",
          R"x(result=completionItem/resolve:{"label": "clamp","detail":"int clamp(int)"})x",
          R"(result=textDocument/codeAction:[{"title": "Fix it","command":"fake.fix","arguments":[1,{"a":2}]}])"});
     auto open = Opened(kUri, "ok\nerror here\nok\nerror again\n");
     server->TextDocument_DidOpen(&open);
     ASSERT_TRUE(transport_test::WaitFor([&] { return server->TextDocument_Diagnostics(kUri).size() == 2; }));
+    LSP::TextDocumentIdentifier document;
+    document.uri = kUri;
+    EXPECT_EQ(server->TextDocument_PullDiagnostics(&document).size(), 2u);
+    EXPECT_NE(SentBody("textDocument/diagnostic"), "");
 
     LSP::CodeActionParams actions;
     actions.textDocument.uri = kUri;
