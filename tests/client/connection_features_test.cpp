@@ -5,6 +5,8 @@
 #include <chrono>
 #include <cstdlib>
 #include <cstring>
+#include <functional>
+#include <iterator>
 #include <thread>
 #include <string>
 
@@ -33,23 +35,10 @@ class ConnectionFeatures : public ::testing::Test {
   }
 };
 
-// Every request answered with null: each comes back empty, under its own method.
+// Every request answered with null: each comes back empty, under its own method, in the
+// order of the rows.
 TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
-  std::string nulls;
-  for (const char* method : {"completion", "declaration", "definition", "typeDefinition", "implementation",
-                             "references", "documentSymbol", "hover", "signatureHelp", "formatting",
-                             "rangeFormatting", "rename"}) {
-    nulls += std::string("result=textDocument/") + method + ":null;";
-  }
-  for (const char* method : {"codeAction", "documentHighlight", "foldingRange", "selectionRange",
-                             "semanticTokens/full", "inlayHint", "prepareRename", "prepareCallHierarchy"}) {
-    nulls += std::string("result=textDocument/") + method + ":null;";
-  }
-  for (const char* method : {"workspace/executeCommand", "completionItem/resolve", "callHierarchy/incomingCalls",
-                             "callHierarchy/outgoingCalls"}) {
-    nulls += std::string("result=") + method + ":null;";
-  }
-  xLanguageServer* server = Started({nulls + "result=workspace/symbol:null"});
+  xLanguageServer* server = nullptr;  // started below, with the rows' methods scripted
   auto position = At<LSP::TextDocumentPositionParams>(3, 4);
   auto completion = At<LSP::CompletionParams>(3, 4);
   auto rename = At<LSP::RenameParams>(3, 4);
@@ -58,20 +47,6 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   LSP::WorkspaceSymbolParams query;
   LSP::DocumentFormattingParams formatting;
   LSP::DocumentRangeFormattingParams rangeFormatting;
-
-  EXPECT_TRUE(server->TextDocument_Completion(&completion).items.empty());
-  EXPECT_TRUE(server->TextDocument_Declaration(&position).empty());
-  EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
-  EXPECT_TRUE(server->TextDocument_TypeDefinition(&position).empty());
-  EXPECT_TRUE(server->TextDocument_Implementation(&position).empty());
-  EXPECT_TRUE(server->TextDocument_References(&position).empty());
-  EXPECT_TRUE(server->TextDocument_DocumentSymbol(&symbols).empty());
-  EXPECT_TRUE(server->TextDocument_WorkspaceSymbol(&query).empty());
-  EXPECT_TRUE(server->TextDocument_Hover(&position).contents.value.empty());
-  EXPECT_TRUE(server->TextDocument_Signature(&position).signatures.empty());
-  EXPECT_TRUE(server->TextDocument_Formatting(&formatting).empty());
-  EXPECT_TRUE(server->TextDocument_RangeFormatting(&rangeFormatting).empty());
-  EXPECT_TRUE(server->TextDocument_Rename(&rename).documentChanges.empty());
   LSP::CodeActionParams actions;
   LSP::ExecuteCommandParams command;
   command.command = "fake.run";
@@ -81,49 +56,66 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   LSP::InlayHintParams hints;
   LSP::CompletionItem item;
   LSP::CallHierarchyItem function;
-  EXPECT_TRUE(server->TextDocument_CodeAction(&actions).empty());
-  EXPECT_EQ(server->Workspace_ExecuteCommand(&command), "null");
-  EXPECT_TRUE(server->TextDocument_DocumentHighlight(&position).empty());
-  EXPECT_TRUE(server->TextDocument_FoldingRange(&folding).empty());
-  EXPECT_TRUE(server->TextDocument_SelectionRange(&selection).empty());
-  EXPECT_TRUE(server->TextDocument_SemanticTokensFull(&tokens).data.empty());
-  EXPECT_TRUE(server->TextDocument_InlayHint(&hints).empty());
-  EXPECT_EQ(server->CompletionItem_Resolve(&item).label, "");
-  EXPECT_FALSE(server->TextDocument_PrepareRename(&position).CanRename());
-  EXPECT_TRUE(server->TextDocument_PrepareCallHierarchy(&position).empty());
-  EXPECT_TRUE(server->CallHierarchy_IncomingCalls(&function).empty());
-  EXPECT_TRUE(server->CallHierarchy_OutgoingCalls(&function).empty());
+  const std::pair<const char*, std::function<bool()>> rows[] = {
+      {"textDocument/completion", [&] { return server->TextDocument_Completion(&completion).items.empty(); }},
+      {"textDocument/declaration", [&] { return server->TextDocument_Declaration(&position).empty(); }},
+      {"textDocument/definition", [&] { return server->TextDocument_Definition(&position).empty(); }},
+      {"textDocument/typeDefinition", [&] { return server->TextDocument_TypeDefinition(&position).empty(); }},
+      {"textDocument/implementation", [&] { return server->TextDocument_Implementation(&position).empty(); }},
+      {"textDocument/references", [&] { return server->TextDocument_References(&position).empty(); }},
+      {"textDocument/documentSymbol", [&] { return server->TextDocument_DocumentSymbol(&symbols).empty(); }},
+      {"workspace/symbol", [&] { return server->TextDocument_WorkspaceSymbol(&query).empty(); }},
+      {"textDocument/hover", [&] { return server->TextDocument_Hover(&position).contents.value.empty(); }},
+      {"textDocument/signatureHelp", [&] { return server->TextDocument_Signature(&position).signatures.empty(); }},
+      {"textDocument/formatting", [&] { return server->TextDocument_Formatting(&formatting).empty(); }},
+      {"textDocument/rangeFormatting", [&] { return server->TextDocument_RangeFormatting(&rangeFormatting).empty(); }},
+      {"textDocument/rename", [&] { return server->TextDocument_Rename(&rename).documentChanges.empty(); }},
+      {"textDocument/codeAction", [&] { return server->TextDocument_CodeAction(&actions).empty(); }},
+      {"workspace/executeCommand", [&] { return server->Workspace_ExecuteCommand(&command) == "null"; }},
+      {"textDocument/documentHighlight", [&] { return server->TextDocument_DocumentHighlight(&position).empty(); }},
+      {"textDocument/foldingRange", [&] { return server->TextDocument_FoldingRange(&folding).empty(); }},
+      {"textDocument/selectionRange", [&] { return server->TextDocument_SelectionRange(&selection).empty(); }},
+      {"textDocument/semanticTokens/full",
+       [&] { return server->TextDocument_SemanticTokensFull(&tokens).data.empty(); }},
+      {"textDocument/inlayHint", [&] { return server->TextDocument_InlayHint(&hints).empty(); }},
+      {"completionItem/resolve", [&] { return server->CompletionItem_Resolve(&item).label == ""; }},
+      {"textDocument/prepareRename", [&] { return !server->TextDocument_PrepareRename(&position).CanRename(); }},
+      {"textDocument/prepareCallHierarchy",
+       [&] { return server->TextDocument_PrepareCallHierarchy(&position).empty(); }},
+      {"callHierarchy/incomingCalls", [&] { return server->CallHierarchy_IncomingCalls(&function).empty(); }},
+      {"callHierarchy/outgoingCalls", [&] { return server->CallHierarchy_OutgoingCalls(&function).empty(); }},
+  };
+  std::string nulls;
+  for (const auto& row : rows) nulls += std::string("result=") + row.first + ":null;";
+  server = Started({nulls});
+  for (const auto& row : rows) EXPECT_TRUE(row.second()) << row.first << " gave a result";
   EXPECT_FALSE(server->HaveErrors());
 
-  std::vector<std::string> methods;
+  std::vector<std::string> sent;
   for (const std::string& body : SentBodies()) {
     std::size_t start = body.find("\"method\":\"") + 10;
-    methods.push_back(body.substr(start, body.find('"', start) - start));
+    sent.push_back(body.substr(start, body.find('"', start) - start));
   }
-  EXPECT_EQ(methods, (std::vector<std::string>{
-                         "textDocument/completion", "textDocument/declaration", "textDocument/definition",
-                         "textDocument/typeDefinition", "textDocument/implementation", "textDocument/references",
-                         "textDocument/documentSymbol", "workspace/symbol", "textDocument/hover",
-                         "textDocument/signatureHelp", "textDocument/formatting", "textDocument/rangeFormatting",
-                         "textDocument/rename", "textDocument/codeAction", "workspace/executeCommand",
-                         "textDocument/documentHighlight", "textDocument/foldingRange", "textDocument/selectionRange",
-                         "textDocument/semanticTokens/full", "textDocument/inlayHint", "completionItem/resolve",
-                         "textDocument/prepareRename", "textDocument/prepareCallHierarchy",
-                         "callHierarchy/incomingCalls", "callHierarchy/outgoingCalls"}));
+  ASSERT_EQ(sent.size(), std::size(rows));
+  for (std::size_t at = 0; at < sent.size(); ++at) EXPECT_EQ(sent[at], rows[at].first);
   EXPECT_FALSE(TraceLog::Contains("Timed out"));
+
+  // Plain references include the declaration; reference params go as given.
+  const std::string params = R"("params":{"textDocument":{"uri":"file:///work/a.cpp"},"position":{"line":3,"character":4},)";
+  EXPECT_NE(SentBody("textDocument/references").find(params + R"("context":{"includeDeclaration":true}}})"),
+            std::string::npos);
+  auto explicitContext = At<LSP::ReferenceParams>(3, 4);
+  explicitContext.context.includeDeclaration = false;
+  TraceLog::Clear();
+  server->TextDocument_References(&explicitContext);
+  EXPECT_NE(SentBody("textDocument/references").find(params + R"("context":{"includeDeclaration":false}}})"),
+            std::string::npos);
 }
 
 TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
   xLanguageServer* server = Started();
-  LSP::DidOpenTextDocumentParams open;
-  open.textDocument.uri = kUri;
-  open.textDocument.languageId = "cpp";
-  open.textDocument.version = 1;
-  open.textDocument.text = "int x;\n";
-  LSP::DidChangeTextDocumentParams change;
-  change.textDocument = LSP::VersionedTextDocumentIdentifier(kUri, 2);
-  change.contentChanges.emplace_back();
-  change.contentChanges.back().text = "int y;\n";
+  auto open = Opened(kUri, "int x;\n");
+  auto change = Changed(kUri, "int y;\n");
   LSP::DidSaveTextDocumentParams save;
   save.textDocument.uri = kUri;
   LSP::DidCloseTextDocumentParams close;
@@ -152,38 +144,27 @@ TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
   EXPECT_TRUE(TraceLog::Texts("Error").empty());
 }
 
-TEST_F(ConnectionFeatures, PlainReferencesIncludeTheDeclarationAndReferenceParamsGoAsGiven) {
-  xLanguageServer* server = Started({"result=textDocument/references:null"});
-  auto plain = At<LSP::TextDocumentPositionParams>(1, 2);
-  auto explicitContext = At<LSP::ReferenceParams>(1, 2);
-  explicitContext.context.includeDeclaration = false;
-  server->TextDocument_References(&plain);
-  server->TextDocument_References(&explicitContext);
-  std::vector<std::string> bodies = SentBodies();
-  ASSERT_EQ(bodies.size(), 2u);
-  const char* params = R"("params":{"textDocument":{"uri":"file:///work/a.cpp"},"position":{"line":1,"character":2},)";
-  EXPECT_NE(bodies[0].find(std::string(params) + R"("context":{"includeDeclaration":true}}})"), std::string::npos)
-      << bodies[0];
-  EXPECT_NE(bodies[1].find(std::string(params) + R"("context":{"includeDeclaration":false}}})"), std::string::npos)
-      << bodies[1];
-}
-
 // Servers match quick fixes to the diagnostics they published, and resolve completion items
-// by their "data": both go back as the server sent them.
+// by their "data": both go back as the server sent them. A pull the server answers with
+// "unchanged" gives the published list.
 TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
   for (bool resolves : {true, false}) {
     SCOPED_TRACE(resolves ? "resolve provider" : "no resolve provider");
+    const std::string capabilities = R"({"diagnosticProvider":{},"completionProvider":{"resolveProvider":)" +
+                                     std::string(resolves ? "true" : "false") + "}}";
     xLanguageServer* server = Started(
-        {"diagnose", std::string("result=initialize:{\"capabilities\": {\"completionProvider\":{\"resolveProvider\":") +
-                         (resolves ? "true" : "false") + "}}}",
+        {"diagnose", "result=initialize:{\"capabilities\": " + capabilities + "}",
+         R"(result=textDocument/diagnostic:{"kind": "unchanged","resultId":"r1"})",
          R"(result=textDocument/completion:[{"label": "clamp","data":{"id":7}}])",
          R"x(result=completionItem/resolve:{"label": "clamp","detail":"int clamp(int)"})x",
          R"(result=textDocument/codeAction:[{"title": "Fix it","command":"fake.fix","arguments":[1,{"a":2}]}])"});
-    LSP::DidOpenTextDocumentParams open;
-    open.textDocument.uri = kUri;
-    open.textDocument.text = "ok\nerror here\nok\nerror again\n";
+    auto open = Opened(kUri, "ok\nerror here\nok\nerror again\n");
     server->TextDocument_DidOpen(&open);
     ASSERT_TRUE(transport_test::WaitFor([&] { return server->TextDocument_Diagnostics(kUri).size() == 2; }));
+    LSP::TextDocumentIdentifier document;
+    document.uri = kUri;
+    EXPECT_EQ(server->TextDocument_PullDiagnostics(&document).size(), 2u);
+    EXPECT_NE(SentBody("textDocument/diagnostic"), "");
 
     LSP::CodeActionParams actions;
     actions.textDocument.uri = kUri;
@@ -239,28 +220,9 @@ TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {
   EXPECT_EQ(symbols[0].location.range.start.line, 16);
 }
 
-TEST_F(ConnectionFeatures, ErrorRepliesAndDeadServersGiveEmptyResultsAndTheErrorState) {
-  xLanguageServer* server = Started({"error=textDocument/hover"});
-  auto position = At<LSP::TextDocumentPositionParams>(0, 0);
-  EXPECT_TRUE(server->TextDocument_Hover(&position).contents.value.empty());
-  EXPECT_TRUE(server->HaveErrors());
-  EXPECT_STREQ(server->ErrorMessage(), "refused textDocument/hover");
-  server->TextDocument_Definition(&position);
-  EXPECT_FALSE(server->HaveErrors()) << "every request starts with a clean error state";
-
-  vexil_test::KillProcess(server->Id());
-  ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
-  TraceLog::Clear();
-  LSP::DidCloseTextDocumentParams close;
-  server->TextDocument_DidClose(&close);
-  EXPECT_TRUE(TraceLog::Lines().empty());
-  EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
-  EXPECT_TRUE(server->HaveErrors());
-  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
-}
-
-// Requests and notifications of any method, with params as JSON text, and every way one fails.
-TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailure) {
+// Requests and notifications of any method, with params as JSON text, and every way one
+// fails; typed requests after them, refused and to a dead server.
+TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailureThenTypedFailures) {
   struct Row {
     const char* method;
     const char* params;
@@ -284,7 +246,7 @@ TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailure) {
       {"fake/note", "{", "", nullptr, "Invalid JSON for fake/note: Missing a name for object member.", true},
       {"fake/silent", "{}", "", R"(,"params":{}})", ""},
   };
-  xLanguageServer* server = Started({"result=fake/null:null;error=fake/refused"});
+  xLanguageServer* server = Started({"result=fake/null:null;error=fake/refused;error=textDocument/hover"});
   for (const Row& row : rows) {
     SCOPED_TRACE(row.method + std::string(" ") + (row.params ? row.params : "(null)"));
     TraceLog::Clear();
@@ -302,9 +264,20 @@ TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailure) {
   }
   EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), 1);
   EXPECT_NE(SentBody("$/cancelRequest"), "");
+  auto position = At<LSP::TextDocumentPositionParams>(0, 0);
+  EXPECT_TRUE(server->TextDocument_Hover(&position).contents.value.empty());
+  EXPECT_STREQ(server->ErrorMessage(), "refused textDocument/hover");
+  server->TextDocument_Definition(&position);
+  EXPECT_FALSE(server->HaveErrors()) << "every request starts with a clean error state";
 
   vexil_test::KillProcess(server->Id());
   ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
+  TraceLog::Clear();
+  LSP::DidCloseTextDocumentParams close;
+  server->TextDocument_DidClose(&close);
+  EXPECT_TRUE(TraceLog::Lines().empty()) << "nothing is written to a dead server";
+  EXPECT_TRUE(server->TextDocument_Definition(&position).empty());
+  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
   EXPECT_EQ(server->Request("fake/echo", "{}"), "");
   EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
   EXPECT_FALSE(server->Notify("fake/note", "{}"));
@@ -335,9 +308,7 @@ TEST_F(ConnectionFeatures, CancelEndsAWaitingCallAndNothingElse) {
 
 // The server runs in the host's environment plus what the host set, minus what it removed.
 TEST_F(ConnectionFeatures, ServersGetTheEnvironmentTheHostSet) {
-  xServerStart start = transport_test::FakeStart({}, 2000, LSP::TraceLevel::Messages);
-  start.name = kName;
-  xLanguageServer* server = Vexil_Start(start);
+  xLanguageServer* server = Fake(kName);
   const char* removed = std::getenv("HOME") ? "HOME" : "TEMP";
   EXPECT_TRUE(server->SetEnvironment("VEXIL_FIRST", "one"));
   EXPECT_TRUE(server->SetEnvironment("VEXIL_SECOND", "two words=2"));

@@ -5,6 +5,7 @@
 
 #include <cstddef>
 #include <cstring>
+#include <iterator>
 
 #include "vexil/host/language_server.h"
 
@@ -20,61 +21,30 @@ std::ptrdiff_t Slot(Member member) {
   return (words[0] - 1) / static_cast<std::ptrdiff_t>(sizeof(void*));
 }
 
+// Each operation's slot is its place in this list, the order hosts were built against.
 TEST(ConnectionSlots, OperationsSitInTheHostsSlotOrder) {
   using S = xLanguageServer;
-  EXPECT_EQ(Slot(&S::Exit), 0);
-  EXPECT_EQ(Slot(&S::ErrorMessage), 1);
-  EXPECT_EQ(Slot(&S::HaveErrors), 2);
-  EXPECT_EQ(Slot(&S::Id), 3);
-  EXPECT_EQ(Slot(&S::Initialize), 4);
-  EXPECT_EQ(Slot(&S::IsRunning), 5);
-  EXPECT_EQ(Slot(&S::Start), 6);
-  EXPECT_EQ(Slot(&S::Shutdown), 7);
-  EXPECT_EQ(Slot(&S::TextDocument_Completion), 8);
-  EXPECT_EQ(Slot(&S::TextDocument_Declaration), 9);
-  EXPECT_EQ(Slot(&S::TextDocument_Definition), 10);
-  EXPECT_EQ(Slot(&S::TextDocument_TypeDefinition), 11);
-  EXPECT_EQ(Slot(&S::TextDocument_Implementation), 12);
-  EXPECT_EQ(Slot(&S::TextDocument_References), 13);
-  EXPECT_EQ(Slot(&S::TextDocument_DocumentSymbol), 14);
-  EXPECT_EQ(Slot(&S::TextDocument_WorkspaceSymbol), 15);
-  EXPECT_EQ(Slot(&S::TextDocument_Hover), 16);
-  EXPECT_EQ(Slot(&S::TextDocument_Signature), 17);
-  EXPECT_EQ(Slot(&S::TextDocument_Formatting), 18);
-  EXPECT_EQ(Slot(&S::TextDocument_RangeFormatting), 19);
-  EXPECT_EQ(Slot(&S::TextDocument_Rename), 20);
-  EXPECT_EQ(Slot(&S::TextDocument_DidChange), 21);
-  EXPECT_EQ(Slot(&S::TextDocument_DidClose), 22);
-  EXPECT_EQ(Slot(&S::TextDocument_DidOpen), 23);
-  EXPECT_EQ(Slot(&S::TextDocument_DidSave), 24);
-  EXPECT_EQ(Slot(&S::TextDocument_Diagnostics), 25);
-  EXPECT_EQ(Slot(&S::DiagnosticsVersion), 26);
-  EXPECT_EQ(Slot(&S::TextDocument_PullDiagnostics), 27);
-  EXPECT_EQ(Slot(&S::Enable), 28);
-  EXPECT_EQ(Slot(&S::ServerCapabilities), 29);
-  EXPECT_EQ(Slot(&S::ServerCapabilitiesJson), 30);
-  EXPECT_EQ(Slot(&S::Request), 31);
-  EXPECT_EQ(Slot(&S::Notify), 32);
-  EXPECT_EQ(Slot(&S::SetMessageHandler), 33);
-  EXPECT_EQ(Slot(&S::Reply), 34);
-  EXPECT_EQ(Slot(&S::ReplyError), 35);
-  EXPECT_EQ(Slot(&S::Cancel), 36);
-  EXPECT_EQ(Slot(&S::SetEnvironment), 37);
-  EXPECT_EQ(Slot(&S::TextDocument_CodeAction), 38);
-  EXPECT_EQ(Slot(&S::Workspace_ExecuteCommand), 39);
-  EXPECT_EQ(Slot(&S::TextDocument_DocumentHighlight), 40);
-  EXPECT_EQ(Slot(&S::TextDocument_FoldingRange), 41);
-  EXPECT_EQ(Slot(&S::TextDocument_SelectionRange), 42);
-  EXPECT_EQ(Slot(&S::TextDocument_SemanticTokensFull), 43);
-  EXPECT_EQ(Slot(&S::TextDocument_InlayHint), 44);
-  EXPECT_EQ(Slot(&S::CompletionItem_Resolve), 45);
-  EXPECT_EQ(Slot(&S::TextDocument_PrepareRename), 46);
-  EXPECT_EQ(Slot(&S::TextDocument_PrepareCallHierarchy), 47);
-  EXPECT_EQ(Slot(&S::CallHierarchy_IncomingCalls), 48);
-  EXPECT_EQ(Slot(&S::CallHierarchy_OutgoingCalls), 49);
-  EXPECT_EQ(Slot(&S::Workspace_DidChangeConfiguration), 50);
-  EXPECT_EQ(Slot(&S::Workspace_DidChangeWorkspaceFolders), 51);
-  EXPECT_EQ(Slot(&S::TextDocument_WillSave), 52);
+  const std::ptrdiff_t slots[] = {
+      Slot(&S::Exit), Slot(&S::ErrorMessage), Slot(&S::HaveErrors), Slot(&S::Id), Slot(&S::Initialize),
+      Slot(&S::IsRunning), Slot(&S::Start), Slot(&S::Shutdown), Slot(&S::TextDocument_Completion),
+      Slot(&S::TextDocument_Declaration), Slot(&S::TextDocument_Definition), Slot(&S::TextDocument_TypeDefinition),
+      Slot(&S::TextDocument_Implementation), Slot(&S::TextDocument_References),
+      Slot(&S::TextDocument_DocumentSymbol), Slot(&S::TextDocument_WorkspaceSymbol), Slot(&S::TextDocument_Hover),
+      Slot(&S::TextDocument_Signature), Slot(&S::TextDocument_Formatting), Slot(&S::TextDocument_RangeFormatting),
+      Slot(&S::TextDocument_Rename), Slot(&S::TextDocument_DidChange), Slot(&S::TextDocument_DidClose),
+      Slot(&S::TextDocument_DidOpen), Slot(&S::TextDocument_DidSave), Slot(&S::TextDocument_Diagnostics),
+      Slot(&S::DiagnosticsVersion), Slot(&S::TextDocument_PullDiagnostics), Slot(&S::Enable),
+      Slot(&S::ServerCapabilities), Slot(&S::ServerCapabilitiesJson), Slot(&S::Request), Slot(&S::Notify),
+      Slot(&S::SetMessageHandler), Slot(&S::Reply), Slot(&S::ReplyError), Slot(&S::Cancel), Slot(&S::SetEnvironment),
+      Slot(&S::TextDocument_CodeAction), Slot(&S::Workspace_ExecuteCommand),
+      Slot(&S::TextDocument_DocumentHighlight), Slot(&S::TextDocument_FoldingRange),
+      Slot(&S::TextDocument_SelectionRange), Slot(&S::TextDocument_SemanticTokensFull),
+      Slot(&S::TextDocument_InlayHint), Slot(&S::CompletionItem_Resolve), Slot(&S::TextDocument_PrepareRename),
+      Slot(&S::TextDocument_PrepareCallHierarchy), Slot(&S::CallHierarchy_IncomingCalls),
+      Slot(&S::CallHierarchy_OutgoingCalls), Slot(&S::Workspace_DidChangeConfiguration),
+      Slot(&S::Workspace_DidChangeWorkspaceFolders), Slot(&S::TextDocument_WillSave)};
+  for (std::ptrdiff_t at = 0; at < static_cast<std::ptrdiff_t>(std::size(slots)); ++at)
+    EXPECT_EQ(slots[at], at) << "operation number " << at << " of the list";
 }
 
 }  // namespace

@@ -43,15 +43,38 @@ inline void Dispose(const std::string& name) {
   server->Exit();
 }
 
+// The fake server registered under `name` with these directives, not started yet.
+inline xLanguageServer* Fake(const char* name, std::vector<std::string> directives = {}, int timeout = 2000,
+                             LSP::TraceLevel level = LSP::TraceLevel::Messages) {
+  xServerStart start = transport_test::FakeStart(std::move(directives), timeout, level);
+  start.name = name;
+  return Vexil_Start(start);
+}
+
 // Registers the fake server under `name` with these directives and starts it, at the
 // messages level with a 2 s time-out; the trace starts empty after the start.
 inline xLanguageServer* StartedFake(const char* name, std::vector<std::string> directives) {
-  xServerStart start = transport_test::FakeStart(std::move(directives), 2000, LSP::TraceLevel::Messages);
-  start.name = name;
-  xLanguageServer* server = Vexil_Start(start);
+  xLanguageServer* server = Fake(name, std::move(directives));
   EXPECT_TRUE(server->Start(xServerInitialise()));
   TraceLog::Clear();
   return server;
+}
+
+// The didOpen of `uri` at version 1 and the whole-text didChange to version 2.
+inline LSP::DidOpenTextDocumentParams Opened(const char* uri, const std::string& text) {
+  LSP::DidOpenTextDocumentParams params;
+  params.textDocument.uri = uri;
+  params.textDocument.languageId = "cpp";
+  params.textDocument.version = 1;
+  params.textDocument.text = text;
+  return params;
+}
+inline LSP::DidChangeTextDocumentParams Changed(const char* uri, const std::string& text) {
+  LSP::DidChangeTextDocumentParams params;
+  params.textDocument = LSP::VersionedTextDocumentIdentifier(uri, 2);
+  params.contentChanges.emplace_back();
+  params.contentChanges.back().text = text;
+  return params;
 }
 
 }  // namespace connection_test

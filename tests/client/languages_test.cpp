@@ -34,31 +34,29 @@ class CustomLanguages : public xLanguages {
   using xLanguages::AddLanguage;
 };
 
-TEST(Languages, ExtensionListsSkipEmptyPiecesAndKeepTheFirstRow) {
-  CustomLanguages languages;
-  languages.AddLanguage("Mine", "mine", ";;m1;;m2;");
-  languages.AddLanguage("Other C", "other-c", "c;m3");
-  EXPECT_STREQ(languages.LanguageId("m1"), "mine");
-  EXPECT_STREQ(languages.LanguageId("m2"), "mine");
-  EXPECT_STREQ(languages.LanguageId("m3"), "other-c");
-  EXPECT_STREQ(languages.LanguageId("c"), "c");
-  EXPECT_STREQ(languages.LanguageId(""), "");
-}
-
-TEST(Languages, CopiesOwnTheirRows) {
+// Added rows: lists split on ";" skipping empty pieces, the first row of an extension kept,
+// and copies that own their rows.
+TEST(Languages, AddedRowsSplitTheirListsAndCopiesOwnThem) {
   auto original = std::make_unique<CustomLanguages>();
-  original->AddLanguage("Mine", "mine", "m");
+  original->AddLanguage("Mine", "mine", ";;m1;;m2;");
+  original->AddLanguage("Other C", "other-c", "c;m3");
+  EXPECT_STREQ(original->LanguageId("m1"), "mine");
+  EXPECT_STREQ(original->LanguageId("m2"), "mine");
+  EXPECT_STREQ(original->LanguageId("m3"), "other-c");
+  EXPECT_STREQ(original->LanguageId("c"), "c");
+  EXPECT_STREQ(original->LanguageId(""), "");
+
   xLanguages copied(*original);
   xLanguages assigned;
   assigned = *original;
-  const char* id = copied.LanguageId("m");
+  const char* id = copied.LanguageId("m1");
   original.reset();
   EXPECT_STREQ(id, "mine");
-  EXPECT_STREQ(assigned.LanguageId("m"), "mine");
+  EXPECT_STREQ(assigned.LanguageId("m1"), "mine");
   EXPECT_STREQ(assigned.LanguageId("cpp"), "cpp");
   xLanguages& self = assigned;
   assigned = self;
-  EXPECT_STREQ(assigned.LanguageId("m"), "mine");
+  EXPECT_STREQ(assigned.LanguageId("m3"), "other-c");
 }
 
 }  // namespace

@@ -55,23 +55,20 @@ TEST(ApplyTextEdits, RangesReferToTheOriginalTextAndOverlapsAreRefused) {
     std::vector<LSP::TextEdit> edits;
     std::string expected;  // the edited text, or the error
     bool applied;
-    PositionEncoding encoding;
+    PositionEncoding encoding = PositionEncoding::Utf16;
   } rows[] = {
       {"int \xC3\xA9 = 1;\nint \xF0\x9F\x98\x80x = 2;\nend\n",
        {Edit(1, 6, 1, 7, "y"), Edit(0, 4, 0, 5, "e"), Edit(2, 0, 3, 0, "")},
-       "int e = 1;\nint \xF0\x9F\x98\x80y = 2;\n", true, PositionEncoding::Utf16},
+       "int e = 1;\nint \xF0\x9F\x98\x80y = 2;\n", true},
       // Inserts at one place keep their order, before a replacement there.
-      {"abc", {Edit(0, 1, 0, 2, "X"), Edit(0, 1, 0, 1, "1"), Edit(0, 1, 0, 1, "2")}, "a12Xc", true,
-       PositionEncoding::Utf16},
+      {"abc", {Edit(0, 1, 0, 2, "X"), Edit(0, 1, 0, 1, "1"), Edit(0, 1, 0, 1, "2")}, "a12Xc", true},
       // Past the last line and past the line's end both mean the end.
-      {"ab", {Edit(5, 0, 5, 0, "!"), Edit(0, 2, 0, 9, "?")}, "ab!?", true, PositionEncoding::Utf16},
-      {"a\r\nb\r\n", {Edit(0, 1, 1, 0, "\n"), Edit(1, 7, 1, 7, "X")}, "a\nbX\r\n", true, PositionEncoding::Utf16},
+      {"ab", {Edit(5, 0, 5, 0, "!"), Edit(0, 2, 0, 9, "?")}, "ab!?", true},
+      {"a\r\nb\r\n", {Edit(0, 1, 1, 0, "\n"), Edit(1, 7, 1, 7, "X")}, "a\nbX\r\n", true},
       {"\xC3\xA9!", {Edit(0, 2, 0, 3, "?")}, "\xC3\xA9?", true, PositionEncoding::Utf8},
-      {"abcdef", {Edit(0, 3, 0, 5, "y"), Edit(0, 1, 0, 4, "x")}, "Overlapping edits at 0:1-0:4 and 0:3-0:5", false,
-       PositionEncoding::Utf16},
-      {"abcdef", {Edit(0, 1, 0, 4, "x"), Edit(0, 2, 0, 2, "in")}, "Overlapping edits at 0:1-0:4 and 0:2-0:2", false,
-       PositionEncoding::Utf16},
-      {"abcdef", {Edit(0, 4, 0, 1, "x")}, "Edit range ends before it starts: 0:4-0:1", false, PositionEncoding::Utf16},
+      {"abcdef", {Edit(0, 3, 0, 5, "y"), Edit(0, 1, 0, 4, "x")}, "Overlapping edits at 0:1-0:4 and 0:3-0:5", false},
+      {"abcdef", {Edit(0, 1, 0, 4, "x"), Edit(0, 2, 0, 2, "in")}, "Overlapping edits at 0:1-0:4 and 0:2-0:2", false},
+      {"abcdef", {Edit(0, 4, 0, 1, "x")}, "Edit range ends before it starts: 0:4-0:1", false},
   };
   for (const Row& row : rows) {
     std::string text = row.text;

@@ -2,12 +2,11 @@
 // server is initialized, renames and directories, registrations, kinds and unregistration.
 #include <gtest/gtest.h>
 
+#include <algorithm>
 #include <chrono>
 #include <filesystem>
 #include <fstream>
-#include <map>
 #include <memory>
-#include <set>
 #include <string>
 #include <utility>
 #include <vector>
@@ -25,36 +24,39 @@ using watchtest::TempDir;
 using watchtest::Touch;
 using Change = std::pair<std::string, int>;  // URI, type
 
-// Everything a notifier handed over, each send as its list of changes.
+// Everything a notifier handed over: the changes in order, and how many sends they came in.
 class Heard {
  public:
   vexil::WatchedFilesNotifier::Callbacks Callbacks() {
-    return {[this](const std::string& params) { shared_.Update([&] { sends_.push_back(Parse(params)); }); },
+    return {[this](const std::string& params) {
+              std::vector<Change> sent = Parse(params);
+              shared_.Update([&] {
+                changes_.insert(changes_.end(), sent.begin(), sent.end());
+                ++sends_;
+              });
+            },
             [this](const std::string& text) { shared_.Update([&] { errors_.push_back(text); }); }};
   }
   // Until every change of `expected` was sent, in whatever batches.
   bool WaitFor(const std::vector<Change>& expected) {
     return shared_.WaitUntil([&] {
-      for (const Change& change : expected)
-        if (!SentLocked(change)) return false;
-      return true;
+      return std::all_of(expected.begin(), expected.end(), [&](const Change& change) { return Has(change); });
     });
   }
   bool WaitForSend(std::chrono::milliseconds deadline) {
-    return shared_.WaitUntil([&] { return !sends_.empty(); }, deadline);
+    return shared_.WaitUntil([&] { return sends_ > 0; }, deadline);
   }
   bool Sent(const Change& change) {
-    return shared_.Read([&] { return SentLocked(change); });
+    return shared_.Read([&] { return Has(change); });
   }
   std::size_t Sends() {
-    return shared_.Read([&] { return sends_.size(); });
+    return shared_.Read([&] { return sends_; });
   }
-  // The first type each URI was sent with.
+  // The first type `uri` was sent with.
   int FirstType(const std::string& uri) {
     return shared_.Read([&] {
-      for (const auto& send : sends_)
-        for (const Change& change : send)
-          if (change.first == uri) return change.second;
+      for (const Change& change : changes_)
+        if (change.first == uri) return change.second;
       return 0;
     });
   }
@@ -71,15 +73,11 @@ class Heard {
       changes.emplace_back(change["uri"].GetString(), change["type"].GetInt());
     return changes;
   }
-  bool SentLocked(const Change& change) const {
-    for (const auto& send : sends_)
-      for (const Change& sent : send)
-        if (sent == change) return true;
-    return false;
-  }
+  bool Has(const Change& change) const { return std::find(changes_.begin(), changes_.end(), change) != changes_.end(); }
 
   Shared shared_;
-  std::vector<std::vector<Change>> sends_;
+  std::vector<Change> changes_;
+  std::size_t sends_ = 0;
   std::vector<std::string> errors_;
 };
 
