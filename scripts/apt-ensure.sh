@@ -29,5 +29,7 @@ fi
 
 echo "$label: installing ${missing[*]}"
 export DEBIAN_FRONTEND=noninteractive
-"${as_root[@]}" apt-get update -q
+# A mirror caught mid-sync fails one index of the update; the lists at hand usually still
+# name what is missing, so the install is tried anyway and its own failure is the one reported.
+"${as_root[@]}" apt-get update -q || echo "$label: apt-get update failed; installing from the package lists at hand" >&2
 "${as_root[@]}" apt-get install -y -q --no-install-recommends "${missing[@]}"
