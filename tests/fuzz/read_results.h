@@ -5,6 +5,7 @@
 
 #include <exception>
 #include <initializer_list>
+#include <memory>
 
 #include "vexil/protocol/call_hierarchy.h"
 #include "vexil/protocol/code_actions.h"
@@ -25,15 +26,10 @@ inline void ReadInto(LSP::xReader& reader, LSP::Result& result) {
   }
 }
 
-template <typename Result>
-void ReadIntoNew(LSP::xReader& reader) {
-  Result result;
-  ReadInto(reader, result);
-}
-
+// A fresh result of each type, as each reply gets its own.
 template <typename... Results>
 void ReadIntoEach(LSP::xReader& reader) {
-  (ReadIntoNew<Results>(reader), ...);
+  (ReadInto(reader, *std::make_unique<Results>()), ...);
 }
 
 inline void ReadIntoEveryResult(LSP::xReader& reader) {

@@ -244,16 +244,13 @@ TEST(xWriter, EscapesControlCharactersAndKeepsUtf8Bytes) {
   std::string text = "tab\there \"quoted\" back\\slash\nline\x01\x1f caf\xc3\xa9 \xe2\x82\xac";
   std::string json = Written([&](LSP::xWriter& w) { w.String("s", text); });
   EXPECT_EQ(json, "{\"s\":\"tab\\there \\\"quoted\\\" back\\\\slash\\nline\\u0001\\u001F caf\xc3\xa9 \xe2\x82\xac\"}");
-  LSP::xReader reader;
-  ASSERT_TRUE(reader.Parse(json));
-  EXPECT_EQ(reader.Root().String("s"), text);
+  EXPECT_EQ(Parsed(json).Root().String("s"), text);
   std::string withNul("a\0b", 3);
   EXPECT_EQ(Written([&](LSP::xWriter& w) { w.String("s", withNul); }), "{\"s\":\"a\\u0000b\"}");
 }
 
 TEST(xWriter, RawValuesAreCopiedVerbatim) {
-  LSP::xReader options;
-  ASSERT_TRUE(options.Parse(R"({"opts":{"b":[1,"two",null],"a":{"x":1.5}}})"));
+  Parsed options(R"({"opts":{"b":[1,"two",null],"a":{"x":1.5}}})");
   const LSP::JsonValue& value = options.Root().Object("opts").Value();
   EXPECT_EQ(Written([&](LSP::xWriter& w) {
               w.Raw("initializationOptions", value);

@@ -46,9 +46,10 @@ struct RunningReader {
   vexil::ReaderThread thread;
 };
 
-std::string Pop(vexil::xPipeReader& reader) {
+// The next item, or nothing once the reader has finished when `expected` says so.
+std::string Pop(vexil::xPipeReader& reader, MessageQueue::Wait expected = MessageQueue::Wait::Taken) {
   std::string item;
-  EXPECT_EQ(reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Taken);
+  EXPECT_EQ(reader.Messages().WaitPop(item, 10s), expected);
   return item;
 }
 
@@ -72,8 +73,7 @@ TEST(PipeReader, QueuesBodiesInOrderWhateverTheirSizeAndFinishesAtEndOfFile) {
   const std::string first = Pop(running.reader);
   EXPECT_TRUE(first == big) << "got " << first.size() << " bytes";
   EXPECT_EQ(Pop(running.reader), "{}");
-  std::string item;
-  EXPECT_EQ(running.reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);
+  Pop(running.reader, MessageQueue::Wait::Finished);
   writer.join();
   EXPECT_EQ(running.reader.TakeOutput(), "stray Content-Length: ");
   EXPECT_EQ(running.reader.Errors(), "");
@@ -87,8 +87,7 @@ TEST(PipeReader, StopEndsAReaderWhoseWriterStaysOpenAndSilent) {
   running.reader.Stop();
   running.thread.Join();  // a blocking read would hang here for good
   EXPECT_LT(std::chrono::steady_clock::now() - stopped, 2s);
-  std::string item;
-  EXPECT_EQ(running.reader.Messages().WaitPop(item, 10s), MessageQueue::Wait::Finished);
+  Pop(running.reader, MessageQueue::Wait::Finished);
 }
 
 TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {

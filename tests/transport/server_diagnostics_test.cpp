@@ -15,11 +15,7 @@ using namespace transport_test;
 std::string Doc(int n) { return "file:///fake/doc" + std::to_string(n) + ".cpp"; }
 
 // Makes the fake server publish at once; the host then waits for no reply.
-void Publish(vexil::xServer& server, const std::string& params) {
-  FakeParams scripted(params);
-  LSP::NotificationMessage publish("fake/publish", &scripted);
-  server.Write(publish);
-}
+void Publish(vexil::xServer& server, const std::string& params) { Notify(server, "fake/publish", params); }
 
 bool ReachesVersion(vexil::xServer& server, int version) {
   return WaitFor([&] { return server.Diagnostics().Version() == version; }, 60s);

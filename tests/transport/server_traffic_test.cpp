@@ -23,7 +23,7 @@ using Texts = std::vector<std::string>;
 using ServerTraffic = FakeServerTest;
 
 std::string Sent(const std::string& body) {
-  return "\nSent: Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body + "\n";
+  return "\nSent: " + vexil_test::Frame(body) + "\n";
 }
 
 // A notification is what Read(-1) waits for; numbered replies are passed over.
@@ -147,10 +147,7 @@ TEST_F(ServerTraffic, RepliesTimeOutsErrorsAndServerRequests) {
     } else {
       for (const std::string& line : expected) EXPECT_EQ(TraceLog::Count(line), 1) << line;
     }
-    // Every write starts with a clean error state.
-    FakeParams none("");
-    LSP::NotificationMessage note("fake/note", &none);
-    server->Write(note);
+    Notify(*server, "fake/note");  // every write starts with a clean error state
     EXPECT_STREQ(server->ErrorMessage(), "");
   }
 }
@@ -173,11 +170,19 @@ std::function<void(vexil::xServer&)> KilledWhileAwaited(const char* method, cons
   };
 }
 
+// Waits for the server to be gone (killed first when `kill`), then launches it again.
+std::function<void(vexil::xServer&)> Relaunched(bool kill) {
+  return [kill](vexil::xServer& server) {
+    if (kill) vexil_test::KillProcess(server.Id());
+    // A slow machine may see a failed launch end only after the start's grace time.
+    EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
+    EXPECT_TRUE(server.Start());
+  };
+}
+
 // A didOpen whose text is more than any pipe holds.
 void WriteBigText(vexil::xServer& server) {
-  FakeParams text(R"({"textDocument":{"text":")" + std::string(std::size_t{1} << 20, 'x') + R"("}})");
-  LSP::NotificationMessage open("textDocument/didOpen", &text);
-  server.Write(open);
+  Notify(server, "textDocument/didOpen", R"({"textDocument":{"text":")" + std::string(std::size_t{1} << 20, 'x') + R"("}})");
 }
 
 enum class Next { Works, TimesOut, FailsFast };
@@ -229,10 +234,8 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
       {"nests a reply 300,000 deep", {}, Answered(deep + R"(result"}})", false), {}, Next::Works, 2000},
       {"closed its input, then asks", {"close-stdin", "send=window/workDoneProgress/create:1", "hang"},
        [](vexil::xServer& server) {
-         FakeParams none("");
-         LSP::NotificationMessage note("fake/note", &none);
          EXPECT_TRUE(WaitFor([&] {
-           server.Write(note);  // the failed answer is traced by the host's next exchange
+           Notify(server, "fake/note");  // the failed answer is traced by the host's next exchange
            return TraceLog::Contains("Answer Failed");
          }));
        },
@@ -254,20 +257,8 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
       // What it had sent of the header is the stray output.
       {"dies in the middle of a frame", {}, KilledWhileAwaited("fake/stall", ""), {"Output: Content-Length: \n"},
        Next::FailsFast, 30000},
-      {"died: Start launches it again", {},
-       [](vexil::xServer& server) {
-         vexil_test::KillProcess(server.Id());
-         EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
-         EXPECT_TRUE(server.Start());
-       },
-       {}, Next::Works},
-      {"failed to start: Start launches it again", {"fail-once=" + scratch / "failed"},
-       [](vexil::xServer& server) {
-         // A slow machine may see the first launch end only after the start's grace time.
-         EXPECT_TRUE(WaitFor([&] { return !server.IsRunning(); }));
-         EXPECT_TRUE(server.Start());
-       },
-       {}, Next::Works},
+      {"died: Start launches it again", {}, Relaunched(true), {}, Next::Works},
+      {"failed to start: Start launches it again", {"fail-once=" + scratch / "failed"}, Relaunched(false), {}, Next::Works},
   };
   for (const Misbehaviour& row : rows) {
     SCOPED_TRACE(row.name);
@@ -335,9 +326,7 @@ TEST_F(ServerTraffic, ACallbackThatWaitsForAnotherThreadHoldsUpNothingElse) {
     WaitFor([&] { return std::filesystem::exists(answered); }, 30s);
     HandedOverLines::Open(true);
   });
-  FakeParams none("");
-  LSP::NotificationMessage note("fake/note", &none);
-  server.Write(note);  // its "Sent" line blocks until the server has been answered
+  Notify(server, "fake/note");  // its "Sent" line blocks until the server has been answered
   uiThread.join();
   EXPECT_TRUE(std::filesystem::exists(answered));
 }

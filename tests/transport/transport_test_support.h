@@ -141,6 +141,13 @@ inline TextResult Ask(vexil::xServer& server, const char* method, const std::str
   return result;
 }
 
+// Sends a notification scripted by `params`: no reply is awaited.
+inline void Notify(vexil::xServer& server, const char* method, const std::string& params = "") {
+  FakeParams scripted(params);
+  LSP::NotificationMessage note(method, &scripted);
+  server.Write(note);
+}
+
 // Polls `condition` until it holds or `limit` has passed.
 inline bool WaitFor(const std::function<bool()>& condition, std::chrono::milliseconds limit = std::chrono::seconds(10)) {
   auto deadline = std::chrono::steady_clock::now() + limit;
