@@ -53,12 +53,15 @@ std::string Pop(vexil::xPipeReader& reader, MessageQueue::Wait expected = Messag
   return item;
 }
 
-// The last item in the queue, which must be the newest one sent.
-std::string Newest(MessageQueue& queue) {
+// A queue that nobody took from holds more than half its bound and no more, and its last
+// item is the newest one sent.
+void ExpectNewestWithin(MessageQueue& queue, std::size_t limit, const std::string& newest) {
+  EXPECT_LE(queue.Bytes(), limit);
+  EXPECT_GT(queue.Bytes(), limit / 2);
   std::string item;
   while (queue.TryPop(item) && queue.Size() > 0) {
   }
-  return item;
+  EXPECT_EQ(item, newest);
 }
 
 TEST(PipeReader, QueuesBodiesInOrderWhateverTheirSizeAndFinishesAtEndOfFile) {
@@ -137,9 +140,7 @@ TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
   std::string lines;
   for (int i = 0; lines.size() < 40u << 20; ++i) lines += "I[10:00:00.000] log line " + std::to_string(i) + std::string(60, '.') + "\n";
   err.SendAndClose(lines + "last line\n");
-  EXPECT_LE(err.reader.Messages().Bytes(), vexil::xPipeErrReader::kQueueLimit);
-  EXPECT_GT(err.reader.Messages().Bytes(), vexil::xPipeErrReader::kQueueLimit / 2);
-  EXPECT_EQ(Newest(err.reader.Messages()), "last line");
+  ExpectNewestWithin(err.reader.Messages(), vexil::xPipeErrReader::kQueueLimit, "last line");
 
   RunningReader<vexil::xPipeReader> out("stdout");
   const std::string notification = Frame(R"({"jsonrpc":"2.0","method":"$/progress","params":{"value":")" +
@@ -147,9 +148,7 @@ TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
   std::string frames;
   while (frames.size() < 100u << 20) frames += notification;
   out.SendAndClose(frames + Frame(R"({"id":1})"));
-  EXPECT_LE(out.reader.Messages().Bytes(), vexil::xPipeReader::kQueueLimit);
-  EXPECT_GT(out.reader.Messages().Bytes(), vexil::xPipeReader::kQueueLimit / 2);
-  EXPECT_EQ(Newest(out.reader.Messages()), R"({"id":1})");
+  ExpectNewestWithin(out.reader.Messages(), vexil::xPipeReader::kQueueLimit, R"({"id":1})");
 }
 
 // The oldest items give way to the newest, the count stays right as items are taken, and
