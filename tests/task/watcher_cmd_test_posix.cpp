@@ -30,9 +30,8 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   // Traced line by line, each cut like any trace line: the rest of the long line is dropped,
   // and the last line counts without a line end.
   for (const std::string& text : std::vector<std::string>{"Content-Length: 900000000\n", "\n", std::string(4095, 'x'),
-                                                          "1\n", "200000\n", "built a.cpp\n", "unended\n"}) {
+                                                          "1\n", "200000\n", "built a.cpp\n", "unended\n"})
     EXPECT_TRUE(Traced(Message(text))) << text.substr(0, 30);
-  }
   EXPECT_EQ(Recorded().shared.Read([] {
               return std::count_if(Recorded().traces.begin(), Recorded().traces.end(),
                                    [](const TraceLine& line) { return line.text.find("xx") != std::string::npos; });
@@ -43,9 +42,8 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));  // the notice comes just before the thread's end
   for (const std::string& text : std::vector<std::string>{
            "Watcher Event starting....\n\n", " Executable: /bin/sh\n", "  Arguments: -c " + output + "echo built a.cpp; sleep 1; printf unended \n",
-           "Use Command: Yes\n", "     Timout: 60000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"}) {
+           "Use Command: Yes\n", "     Timout: 60000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"})
     EXPECT_TRUE(Traced(Verbose(text))) << text;
-  }
   EXPECT_FALSE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));
   EXPECT_TRUE(WaitUntilGone(pid));  // reaped, no zombie
 }
