@@ -42,12 +42,9 @@ TEST(InitializeParams, SparseRecordWritesProcessOptionsCapabilitiesTraceInOrder)
 }
 
 TEST(InitializationOptions, OnlyTheWrappedMemberOfValidJsonReachesTheServer) {
-  EXPECT_EQ(OptionsWritten(""), "");
-  EXPECT_EQ(OptionsWritten(R"({"other":1})"), "");
-  EXPECT_EQ(OptionsWritten("not json"), "");
-  EXPECT_EQ(OptionsWritten(R"({"initializationOptions":)"), "");
-  EXPECT_EQ(OptionsWritten(R"([{"initializationOptions":1}])"), "");
-  EXPECT_EQ(OptionsWritten(R"("initializationOptions")"), "");
+  for (const char* ignored : {"", R"({"other":1})", "not json", R"({"initializationOptions":)",
+                              R"([{"initializationOptions":1}])", R"("initializationOptions")"})
+    EXPECT_EQ(OptionsWritten(ignored), "") << ignored;
   EXPECT_EQ(OptionsWritten(R"({"other":1,"initializationOptions":{"a":[1,"x",null]}})"),
             R"("initializationOptions":{"a":[1,"x",null]},)");
   EXPECT_EQ(OptionsWritten(R"({"initializationOptions":"text"})"), R"("initializationOptions":"text",)");

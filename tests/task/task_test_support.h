@@ -27,6 +27,13 @@ inline xWatcherOptions Options(const std::string& arguments, int timeout = 10000
   return options;
 }
 
+// `executable` run with `arguments` as its one argument, without the interpreter.
+inline xWatcherOptions Direct(const std::string& executable, const std::string& arguments, int timeout = 2000) {
+  xWatcherOptions options = Options(arguments, timeout, false);
+  options.executable = executable;
+  return options;
+}
+
 inline TraceLine Notice(const std::string& title, const std::string& text) {
   return {TraceType::Notice, title, text};
 }

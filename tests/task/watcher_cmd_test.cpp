@@ -12,9 +12,7 @@ namespace {
 using namespace tasktest;
 
 TEST_F(WatcherCommand, MissingProgramIsALaunchFailure) {
-  xWatcherOptions options = Options("$FN", 2000, false);
-  options.executable = "vexil-no-such-program";
-  auto event = Event("a.cpp", options);
+  auto event = Event("a.cpp", Direct("vexil-no-such-program", "$FN"));
   EXPECT_FALSE(event->Start());
   EXPECT_TRUE(WaitForText("Error", "\nWatcher Command: build => " + kMissingAdvice));
   EXPECT_TRUE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));

@@ -16,13 +16,6 @@ namespace {
 
 using namespace tasktest;
 
-// `sleep 30` given `timeout` ms.
-xWatcherOptions Sleep30(int timeout) {
-  xWatcherOptions options = Options("30", timeout, false);
-  options.executable = "sleep";
-  return options;
-}
-
 TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   // Still running at the 100 ms look, ended long before its 60 s. On the way it writes a
   // frame header that promises 900 MB, a 1 MiB line, and more lines than are held at once.
@@ -37,9 +30,8 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   // Traced line by line, each cut like any trace line: the rest of the long line is dropped,
   // and the last line counts without a line end.
   for (const std::string& text : std::vector<std::string>{"Content-Length: 900000000\n", "\n", std::string(4095, 'x'),
-                                                          "1\n", "200000\n", "built a.cpp\n", "unended\n"}) {
+                                                          "1\n", "200000\n", "built a.cpp\n", "unended\n"})
     EXPECT_TRUE(Traced(Message(text))) << text.substr(0, 30);
-  }
   EXPECT_EQ(Recorded().shared.Read([] {
               return std::count_if(Recorded().traces.begin(), Recorded().traces.end(),
                                    [](const TraceLine& line) { return line.text.find("xx") != std::string::npos; });
@@ -50,9 +42,8 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));  // the notice comes just before the thread's end
   for (const std::string& text : std::vector<std::string>{
            "Watcher Event starting....\n\n", " Executable: /bin/sh\n", "  Arguments: -c " + output + "echo built a.cpp; sleep 1; printf unended \n",
-           "Use Command: Yes\n", "     Timout: 60000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"}) {
+           "Use Command: Yes\n", "     Timout: 60000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"})
     EXPECT_TRUE(Traced(Verbose(text))) << text;
-  }
   EXPECT_FALSE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));
   EXPECT_TRUE(WaitUntilGone(pid));  // reaped, no zombie
 }
@@ -68,18 +59,14 @@ TEST_F(WatcherCommand, CommandsThatEndAtOnceGetNoWaitingThread) {
     }
     return std::unique_ptr<xWatcherEvent>();
   };
-  xWatcherOptions trueOptions = Options("", 0, false);
-  trueOptions.executable = "true";
-  auto quiet = endedAtOnce(trueOptions);
+  auto quiet = endedAtOnce(Direct("true", "", 0));
   ASSERT_TRUE(quiet);
   EXPECT_TRUE(quiet->Finished());
   EXPECT_TRUE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));
   EXPECT_TRUE(Traced(Verbose("     Timout: 5000 (milliseconds)\n\n")));  // 0 means 5000
   EXPECT_TRUE(Traced(Verbose("  Arguments: \n")));                      // an empty argument is left out
 
-  xWatcherOptions echoOptions = Options("quick $FB", 2000, false);
-  echoOptions.executable = "echo";
-  auto talking = endedAtOnce(echoOptions);
+  auto talking = endedAtOnce(Direct("echo", "quick $FB"));
   ASSERT_TRUE(talking);
   EXPECT_TRUE(Traced(Message("quick a\n")));  // one argument, blanks and all
   EXPECT_FALSE(Traced(Verbose("Watcher Event starting ")));
@@ -87,7 +74,7 @@ TEST_F(WatcherCommand, CommandsThatEndAtOnceGetNoWaitingThread) {
 }
 
 TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceItEnds) {
-  auto event = TimedOut(Sleep30(500));
+  auto event = TimedOut(Direct("sleep", "30", 500));
   const int pid = event->Command().Id();
   ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
   EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
@@ -105,20 +92,18 @@ TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceIt
 
   kill(pid, SIGKILL);
   EXPECT_TRUE(WaitUntilGone(pid)) << "a child given up on is still collected once it ends";
-}
 
-TEST_F(WatcherCommand, ChildGivenUpOnIsCollectedWhileItsCommandIsStillKept) {
-  // A task keeps a timed-out command until the next change, which may never come.
-  auto event = TimedOut(Sleep30(300));
-  const int pid = event->Command().Id();
-  ASSERT_GT(pid, 0);
-  kill(pid, SIGKILL);
-  EXPECT_TRUE(WaitUntilGone(pid));
+  // Also while its command is still kept, as a task keeps it until the next change.
+  watchtest::ResetRecording();
+  auto kept = TimedOut(Direct("sleep", "30", 300));
+  const int keptPid = kept->Command().Id();
+  ASSERT_GT(keptPid, 0);
+  kill(keptPid, SIGKILL);
+  EXPECT_TRUE(WaitUntilGone(keptPid));
 }
 
 TEST_F(WatcherCommand, WithoutTheShellAFileNameIsOneArgumentThatNothingReadsAsSyntax) {
-  xWatcherOptions direct = Options("$F", 2000, false);
-  direct.executable = "echo";
+  xWatcherOptions direct = Direct("echo", "$F");
   direct.directory = dir_.Path().string();
   auto plain = Event("x;touch pwned;.cpp", direct);
   plain->Start();

@@ -46,9 +46,7 @@ class Probe {
   }
   bool WaitForAll(std::int64_t id, const std::vector<Change>& changes) {
     return shared_.WaitUntil([&] {
-      for (const Change& change : changes)
-        if (!SawLocked(id, change)) return false;
-      return true;
+      return std::all_of(changes.begin(), changes.end(), [&](const Change& change) { return SawLocked(id, change); });
     });
   }
   bool WaitForWatchError(std::int64_t id) {
@@ -64,12 +62,10 @@ class Probe {
   // Did one batch carry all of `changes`?
   bool SawInOneBatch(std::int64_t id, const std::vector<Change>& changes) {
     return shared_.Read([&] {
-      for (const auto& [batchId, batch] : batches_) {
-        bool all = batchId == id;
-        for (const Change& change : changes) all = all && batch.count(change);
-        if (all) return true;
-      }
-      return false;
+      return std::any_of(batches_.begin(), batches_.end(), [&](const auto& entry) {
+        return entry.first == id && std::all_of(changes.begin(), changes.end(),
+                                                [&](const Change& change) { return entry.second.count(change) > 0; });
+      });
     });
   }
   // Did one batch carry exactly `expected`?
