@@ -58,13 +58,8 @@ inline bool Traced(const TraceLine& wanted) {
 // A text traced under `title` that contains `piece`.
 inline bool WaitForText(const std::string& title, const std::string& piece,
                         std::chrono::milliseconds deadline = kDeadline) {
-  return Recorded().shared.WaitUntil(
-      [&] {
-        return AnyTraced([&](const TraceLine& line) {
-          return line.title == title && line.text.find(piece) != std::string::npos;
-        });
-      },
-      deadline);
+  return watchtest::WaitForTraceWhere(
+      [&](const TraceLine& line) { return line.title == title && line.text.find(piece) != std::string::npos; }, deadline);
 }
 
 // Appends to `path` until `piece` is traced under `title`: a directory watcher that has

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <algorithm>
+#include <chrono>
 #include <string>
 #include <vector>
 
@@ -69,16 +70,24 @@ inline std::vector<Delivered> Events() {
   return Recorded().shared.Read([] { return Recorded().events; });
 }
 
-inline bool WaitForTrace(const TraceLine& line) {
-  // Only the lines added since the last look are searched: a command's output of 200,000
-  // lines wakes the waiter at every line, and searching all of them each time is quadratic.
+// Waits until a traced line matches. Only the lines added since the last look are
+// searched: a command's output of 200,000 lines wakes the waiter at every line, and
+// searching all of them each time is quadratic.
+template <typename Match>
+bool WaitForTraceWhere(Match match, std::chrono::milliseconds deadline = kDeadline) {
   std::size_t searched = 0;
-  return Recorded().shared.WaitUntil([&] {
-    const auto& traces = Recorded().traces;
-    const auto from = traces.begin() + static_cast<std::ptrdiff_t>(std::min(searched, traces.size()));
-    searched = traces.size();
-    return std::find(from, traces.end(), line) != traces.end();
-  });
+  return Recorded().shared.WaitUntil(
+      [&] {
+        const auto& traces = Recorded().traces;
+        const auto from = traces.begin() + static_cast<std::ptrdiff_t>(std::min(searched, traces.size()));
+        searched = traces.size();
+        return std::find_if(from, traces.end(), match) != traces.end();
+      },
+      deadline);
+}
+
+inline bool WaitForTrace(const TraceLine& line) {
+  return WaitForTraceWhere([&](const TraceLine& traced) { return traced == line; });
 }
 
 inline TraceLine Verbose(const std::string& text) { return {TraceType::Line, "Verbose", text}; }
