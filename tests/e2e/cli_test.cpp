@@ -69,6 +69,7 @@ TEST(CommandLine, LspPrintsEachAnswerInItsPlaceForPeople) {
   // Files are found below --root, whatever the current directory.
   Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22 --folding geometry.py --highlight main.py:12:7");
   EXPECT_EQ(python.status, 0) << python.err;
+  EXPECT_EQ(python.err, "") << "pylsp reports progress unasked: shown only with --progress";
   EXPECT_EQ(python.out.rfind("hover main.py:2:22\n", 0), 0u) << python.out;
   e2e::ExpectHas(python.out, {"folding geometry.py\n  4-6: def clamp(value, low, high):\n  9-23: class Rectangle:\n",
                          "/python/main.py:2:33: write: from geometry import Rectangle, clamp\n",

@@ -95,7 +95,8 @@ void ShowServerMessage(void* user, const char* method, const char* idJson, const
   LSP::xReader reader;
   if (!reader.Parse(paramsJson) || !reader.Root().IsObject()) return;
   try {
-    if (name == "$/progress") ShowProgress(session.Program(), reader.Root());
+    // Some servers (pylsp) report progress nobody asked for: shown only with --progress.
+    if (name == "$/progress" && session.ShowsProgress()) ShowProgress(session.Program(), reader.Root());
     if (name == "window/showMessage" || name == "window/logMessage") ShowMessage(session.Program(), reader.Root());
   } catch (const std::exception&) {
     // A malformed message of the server is not worth a line.

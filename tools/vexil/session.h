@@ -45,6 +45,8 @@ class Session {
   bool Applies() const { return options_.apply; }
   // Which code action --apply takes; "" for the preferred or only one.
   const std::string& Choice() const { return options_.choice; }
+  // Whether the server's work-done progress is shown (--progress).
+  bool ShowsProgress() const { return options_.progress; }
 
   // The URI of the absolute `path`, opened first (didOpen with its text) unless it is open.
   std::string Document(const std::string& path);
