@@ -154,18 +154,21 @@ TEST(CommandLine, LspPrintsDiagnosticsInTheCompilersFormatWithByteColumns) {
   e2e::ExpectHas(clangd.out, {cpp + ":2:35: error: Use of undeclared identifier 'undefined_name' [clang "});
 
   // --watch: pylsp lints open files again when its configuration changes on disk, with no
-  // didChange; SIGTERM then shuts it down.
+  // didChange; only the file whose diagnostics changed is printed again; SIGTERM then shuts
+  // it down.
   const std::string waitFor = "for i in $(seq 300); do grep -q \"$1\" \"$2\" && break; sleep 0.1; done";
   Result watch = Shell(
       "until_in() { " + waitFor + "; }; cd \"$SCRATCH\"; printf '[pycodestyle]\\nmax-line-length = 120\\n' > setup.cfg; "
-      "echo \"x = '$(printf '%0100d' 0)'\" > long.py; "
-      "\"$VEXIL\" lsp --watch --trace=messages --timeout=60000 -- pylsp --diagnostics long.py >w.out 2>w.err & pid=$!; "
+      "echo \"x = '$(printf '%0100d' 0)'\" > long.py; echo 'x = 1' > short.py; \"$VEXIL\" lsp --watch "
+      "--trace=messages --timeout=60000 -- pylsp --diagnostics long.py --diagnostics short.py >w.out 2>w.err & pid=$!; "
       "until_in 'Ctrl-C ends' w.err; printf '[pycodestyle]\\nmax-line-length = 79\\n' > setup.cfg; "
       "until_in E501 w.out; kill -TERM $pid; wait $pid; echo \"status=$?\"; cat w.out w.err");
-  EXPECT_EQ(watch.out.find("status=143\ndiagnostics long.py\n  (none)\ndiagnostics long.py\n"
-                           "long.py:1:80: warning: E501 line too long (106 > 79 characters) [pycodestyle E501]\n"),
+  EXPECT_EQ(watch.out.find("status=143\ndiagnostics long.py\n  (none)\ndiagnostics short.py\n  (none)\n"
+                           "diagnostics long.py\nlong.py:1:80: warning: E501 line too long (106 > 79 characters) "
+                           "[pycodestyle E501]\n"),
             0u)
       << watch.out;
+  EXPECT_EQ(watch.out.find("diagnostics short.py", watch.out.find("E501")), std::string::npos) << watch.out;
   e2e::ExpectHas(watch.out, {R"("method":"workspace/didChangeWatchedFiles","params":{"changes":[{"uri":"file://)",
                         R"("method":"shutdown")"});
   EXPECT_EQ(watch.out.find("textDocument/didChange\""), std::string::npos);

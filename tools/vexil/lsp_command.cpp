@@ -3,6 +3,8 @@
 // ends the server with it.
 #include <chrono>
 #include <iostream>
+#include <map>
+#include <sstream>
 #include <thread>
 
 #include "commands.h"
@@ -34,10 +36,20 @@ void NoteOpenOnly(Session& session, const Outcome& outcome) {
             << "files it has not indexed are not included (open them first with --open)\n";
 }
 
+// The file's diagnostics as --diagnostics prints them.
+std::string DiagnosticsText(xLanguageServer& server, const LspOptions& options, const Action& action) {
+  Outcome outcome;
+  outcome.diagnostics = server.TextDocument_Diagnostics(FileToUri(action.path.c_str()).c_str());
+  std::ostringstream text;
+  if (options.json) PrintJson(text, action, outcome);
+  else PrintReadable(text, action, outcome);
+  return text.str();
+}
+
 // --watch: the session stays open while the library tells the server about files changed
-// on disk; the diagnostics asked for are printed again whenever the server publishes new
-// ones. An interrupt ends it, the server shut down first.
-int WatchUntilInterrupted(Session& session, const LspOptions& options) {
+// on disk; a file's diagnostics asked for are printed again whenever they differ from
+// `printed`, what was printed of them last. An interrupt ends it, the server shut down first.
+int WatchUntilInterrupted(Session& session, const LspOptions& options, std::map<const Action*, std::string>& printed) {
   constexpr std::chrono::milliseconds kTick{200};
   WindUpChildren();
   std::cerr << "vexil: telling " << session.Program() << " about changes under " << options.session.root
@@ -49,13 +61,11 @@ int WatchUntilInterrupted(Session& session, const LspOptions& options) {
     const int now = server.DiagnosticsVersion();
     if (now == version) continue;
     version = now;
-    for (const Action& action : options.actions) {
-      if (action.kind != ActionKind::Diagnostics) continue;
-      Outcome outcome;
-      outcome.diagnostics = server.TextDocument_Diagnostics(FileToUri(action.path.c_str()).c_str());
-      if (options.json) PrintJson(std::cout, action, outcome);
-      else PrintReadable(std::cout, action, outcome);
-      std::cout.flush();
+    for (auto& [action, last] : printed) {
+      std::string text = DiagnosticsText(server, options, *action);
+      if (text == last) continue;
+      std::cout << text << std::flush;
+      last = std::move(text);
     }
   }
   if (!Interrupted()) return Fail(options, "watch", session.Program() + " exited" + (LastExit().empty() ? "" : " with " + LastExit()));
@@ -121,14 +131,17 @@ int RunLsp(const Arguments& arguments) {
     return Fail(options, "start", why);
   }
   int status = 0;
+  std::map<const Action*, std::string> printed;  // of the --diagnostics actions, for --watch
   for (const Action& action : options.actions) {
     if (Interrupted()) break;
     Outcome outcome = Perform(session, action);
     if (Interrupted()) break;
     EndProgressLine();  // an answer on the same terminal starts at the margin
-    if (options.json) PrintJson(std::cout, action, outcome);
-    else if (!outcome.failed) PrintReadable(std::cout, action, outcome);
-    std::cout.flush();
+    std::ostringstream text;
+    if (options.json) PrintJson(text, action, outcome);
+    else if (!outcome.failed) PrintReadable(text, action, outcome);
+    std::cout << text.str() << std::flush;
+    if (action.kind == ActionKind::Diagnostics) printed[&action] = text.str();
     if (outcome.failed) {
       status = 1;
       std::cerr << "vexil: " << Describe(action) << ": " << outcome.why << "\n";
@@ -141,7 +154,7 @@ int RunLsp(const Arguments& arguments) {
     }
   }
   if (Interrupted()) return 128 + Interrupted();
-  if (options.session.watch) return WatchUntilInterrupted(session, options);
+  if (options.session.watch) return WatchUntilInterrupted(session, options, printed);
   // The library waits about a second for the server to end; the answers are in, and a
   // slower server is ended rather than left running.
   if (!session.Stop()) EndChildren();
