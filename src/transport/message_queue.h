@@ -3,6 +3,7 @@
 // bound on the memory it holds.
 #pragma once
 
+#include <atomic>
 #include <chrono>
 #include <condition_variable>
 #include <deque>
@@ -32,13 +33,19 @@ class MessageQueue {
   std::size_t Bytes() const;
   bool TryPop(std::string& item);
   // Takes the front item, waiting up to `limit` for one. Finished means the queue is
-  // empty and its producer has ended, so waiting longer cannot help.
+  // empty and its producer has ended, so waiting longer cannot help. The first moments of
+  // the wait are spent watching rather than sleeping: a quick server's reply then costs no
+  // wake-up of the waiting thread.
   Wait WaitPop(std::string& item, std::chrono::milliseconds limit);
   // Ends the wait in progress, or else the next one, with Interrupted. Any thread.
   void Interrupt();
 
  private:
   bool TakeFront(std::string& item);
+  // Under the lock: something a waiter looks for happened.
+  void Signal();
+  // Returns once something may have happened since `seen`, or after a short while.
+  void Watch(unsigned seen, std::chrono::milliseconds limit) const;
 
   const std::size_t byteLimit_;
   mutable std::mutex mutex_;
@@ -47,6 +54,7 @@ class MessageQueue {
   std::size_t bytes_ = 0;
   bool finished_ = false;
   bool interrupted_ = false;
+  std::atomic<unsigned> signals_{0};  // pushes, the finish and interruptions so far
 };
 
 }  // namespace vexil
