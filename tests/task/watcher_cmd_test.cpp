@@ -5,7 +5,7 @@
 #include <filesystem>
 #include <string>
 
-#include "watcher_cmd_fixture.h"
+#include "task_test_support.h"
 
 namespace {
 

@@ -10,7 +10,7 @@
 #include <string>
 #include <vector>
 
-#include "watcher_cmd_fixture.h"
+#include "task_test_support.h"
 
 namespace {
 
@@ -39,7 +39,7 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
             1);
   EXPECT_TRUE(event->Command().Completed());
   EXPECT_FALSE(event->Command().HaveErrors());
-  EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));  // the notice comes just before the thread's end
+  EXPECT_TRUE(vexil_test::WaitFor([&] { return event->Finished(); }));  // the notice comes just before the thread's end
   for (const std::string& text : std::vector<std::string>{
            "Watcher Event starting....\n\n", " Executable: /bin/sh\n", "  Arguments: -c " + output + "echo built a.cpp; sleep 1; printf unended \n",
            "Use Command: Yes\n", "     Timout: 60000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"})
@@ -80,7 +80,7 @@ TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceIt
   EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
   EXPECT_TRUE(event->Command().HaveErrors());
   EXPECT_FALSE(event->Command().Completed());
-  EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));
+  EXPECT_TRUE(vexil_test::WaitFor([&] { return event->Finished(); }));
   ASSERT_EQ(kill(pid, 0), 0) << "the child is never killed by the library";
 
   // The reader was stopped although the child holds the pipe open: a reader that
