@@ -13,12 +13,16 @@ using namespace std::chrono_literals;
 using namespace transport_test;
 using Texts = std::vector<std::string>;
 
+// What it wrote is traced first at the messages level; below it, only the failure is.
 TEST_F(ServerStart, ProcessThatExitsAtOnceIsAFailedStartWithItsOutput) {
-  xServerStart start = FakeStart({"stdout=banner\\n;exit=0"}, 200, LSP::TraceLevel::Messages);
-  auto server = FailedStart(start);
-  ASSERT_TRUE(server);
-  EXPECT_EQ(TraceLog::Texts(), (Texts{"banner\n", kFailedStart, kCheckDetails, kHint}));
-  EXPECT_FALSE(server->HaveErrors());
+  for (LSP::TraceLevel level : {LSP::TraceLevel::Messages, LSP::TraceLevel::Off}) {
+    auto server = FailedStart(FakeStart({"stdout=banner\\n;exit=0"}, 200, level));
+    ASSERT_TRUE(server);
+    Texts expected = {kFailedStart, kCheckDetails, kHint};
+    if (level == LSP::TraceLevel::Messages) expected.insert(expected.begin(), "banner\n");
+    EXPECT_EQ(TraceLog::Texts(), expected);
+    EXPECT_FALSE(server->HaveErrors());
+  }
 }
 
 TEST_F(ServerStart, DestructorReturnsPromptlyWhileServerAndGrandchildHoldThePipes) {
