@@ -88,6 +88,8 @@ inline const std::string kMissingAdvice =
 // File names that would make the platform's interpreter do more than the command (each
 // tries to create "pwned" in the test's directory).
 extern const std::vector<std::string> kInterpretedNames;
+// A command of the platform's that runs for seconds, with this time-out.
+xWatcherOptions LongCommand(int timeout);
 
 // Events for files of a temporary directory, the recording reset before each test.
 class WatcherCommand : public ::testing::Test {

@@ -1,10 +1,8 @@
-// Watcher commands through /bin/sh: one that runs on and ends, ones that end at once, one
-// that outlives its time-out, and the names the shell would interpret.
+// Watcher commands through /bin/sh: one that runs on and ends, ones that end at once, and
+// the names the shell would interpret.
 #include <gtest/gtest.h>
-#include <signal.h>
 
 #include <algorithm>
-#include <chrono>
 #include <filesystem>
 #include <memory>
 #include <string>
@@ -77,38 +75,11 @@ TEST_F(WatcherCommand, CommandsThatEndAtOnceGetNoWaitingThread) {
   EXPECT_FALSE(Traced(Notice(kTask, "Watcher Command Run event complete.")));
 }
 
-TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceItEnds) {
-  auto event = TimedOut(Direct("sleep", "30", 500));
-  const int pid = event->Command().Id();
-  ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
-  EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
-  EXPECT_TRUE(event->Command().HaveErrors());
-  EXPECT_FALSE(event->Command().Completed());
-  EXPECT_TRUE(vexil_test::WaitFor([&] { return event->Finished(); }));
-  ASSERT_EQ(kill(pid, 0), 0) << "the child is never killed by the library";
-
-  // The reader was stopped although the child holds the pipe open: a reader that
-  // waited for the end of the output would hold this up for the child's 30 s.
-  const auto begin = std::chrono::steady_clock::now();
-  event.reset();
-  EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(10));
-  EXPECT_TRUE(Traced(Verbose("Watcher command close complete.\n\n")));
-
-  kill(pid, SIGKILL);
-  EXPECT_TRUE(WaitUntilGone(pid)) << "a child given up on is still collected once it ends";
-
-  // Also while its command is still kept, as a task keeps it until the next change.
-  watchtest::ResetRecording();
-  auto kept = TimedOut(Direct("sleep", "30", 300));
-  const int keptPid = kept->Command().Id();
-  ASSERT_GT(keptPid, 0);
-  kill(keptPid, SIGKILL);
-  EXPECT_TRUE(WaitUntilGone(keptPid));
-}
-
 }  // namespace
 
 namespace tasktest {
+
+xWatcherOptions LongCommand(int timeout) { return Direct("sleep", "30", timeout); }
 
 const std::vector<std::string> kInterpretedNames = {
     "x;touch pwned;.cpp", "x$(touch pwned).cpp", "x`touch pwned`.cpp", "x|touch pwned.cpp", "x&&touch pwned&&.cpp",
