@@ -1,5 +1,6 @@
 // Launching and closing the server against the fake through /bin/sh: the launch details,
-// every launch failure with its trace order, early exits, working directory, and the close.
+// what fails a launch here, a missing program through the shell, the working directory,
+// and the close.
 #include <gtest/gtest.h>
 #include <sys/wait.h>
 #include <unistd.h>
@@ -70,28 +71,6 @@ TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
   EXPECT_TRUE(ended == -1 || (WIFEXITED(status) && WEXITSTATUS(status) == 0));
 }
 
-TEST_F(ServerStart, MissingExecutableOrDirectoryReportsInOrderWithTheHintOnce) {
-  struct Case {
-    std::string executable, directory, error;
-  } cases[] = {
-      {"/nonexistent/server", "", "Error: Cannot find executable: /nonexistent/server\n\n"},
-      {"no-such-language-server-here", "", "Error: Cannot find executable: no-such-language-server-here\n\n"},
-      {VEXIL_FAKE_SERVER, "/nonexistent/dir", "Error: Cannot change to directory: /nonexistent/dir\n\n"},
-  };
-  for (const Case& c : cases) {
-    TraceLog::Clear();
-    xServerStart start = FakeStart({}, 200, LSP::TraceLevel::Messages);
-    start.executable = c.executable;
-    start.directory = c.directory;
-    vexil::xServer server(start);
-    EXPECT_FALSE(server.Start());
-    EXPECT_EQ(TraceLog::Texts(), (Texts{c.error, kHint, "\nError Reason: No such file or directory\n", kFailedStart,
-                                        kCheckDetails}));
-    EXPECT_TRUE(server.HaveErrors());
-    EXPECT_EQ(server.ErrorMessage(), c.error.substr(7, c.error.size() - 9));
-  }
-}
-
 // Through the interpreter a missing program is the interpreter's to report.
 TEST_F(ServerStart, AProgramMissingThroughTheInterpreterIsAFailedStart) {
   xServerStart command = FakeStart({}, 200, LSP::TraceLevel::Messages);
@@ -106,3 +85,14 @@ TEST_F(ServerStart, AProgramMissingThroughTheInterpreterIsAFailedStart) {
 }
 
 }  // namespace
+
+namespace transport_test {
+
+std::vector<LaunchFailure> LaunchFailures() {
+  const std::string missing = "No such file or directory";
+  return {{"/nonexistent/server", "", "Cannot find executable: /nonexistent/server", missing},
+          {"no-such-language-server-here", "", "Cannot find executable: no-such-language-server-here", missing},
+          {VEXIL_FAKE_SERVER, "/nonexistent/dir", "Cannot change to directory: /nonexistent/dir", missing}};
+}
+
+}  // namespace transport_test

@@ -168,6 +168,14 @@ inline std::unique_ptr<vexil::xServer> FailedStart(const xServerStart& start) {
   return nullptr;
 }
 
+// A launch that fails for a missing executable or directory: the error it records, and the
+// reason the system gives, as the trace quotes it.
+struct LaunchFailure {
+  std::string executable, directory, error, reason;
+};
+// This platform's launch failures (each platform's start test has them).
+std::vector<LaunchFailure> LaunchFailures();
+
 // Each test of the fake server reads only its own trace lines.
 class FakeServerTest : public ::testing::Test {
  protected:
