@@ -3,8 +3,8 @@
 // and the close.
 #include <gtest/gtest.h>
 #include <sys/wait.h>
-#include <unistd.h>
 
+#include <filesystem>
 #include <memory>
 #include <string>
 
@@ -14,11 +14,6 @@ namespace {
 
 using namespace transport_test;
 using Texts = std::vector<std::string>;
-
-std::string CurrentDirectory() {
-  char buffer[4096];
-  return getcwd(buffer, sizeof buffer) ? buffer : "";
-}
 
 TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheTimeout) {
   xServerStart start = FakeStart({"", "ignored-by-sh"}, 0);
@@ -44,7 +39,7 @@ TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheT
 // A direct launch's details with the defaults, the server's own working directory, and a
 // close that leaves a well-behaved server to end by itself.
 TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
-  const std::string before = CurrentDirectory();
+  const std::string before = std::filesystem::current_path().string();
   xServerStart start = FakeStart();
   start.timeout = -5;
   start.directory = "/tmp";
@@ -55,12 +50,12 @@ TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
     EXPECT_EQ(TraceLog::Texts("Verbose"), (Texts{" Executable: " VEXIL_FAKE_SERVER "\n", "  Directory: /tmp\n",
                                                  "  Arguments: \n", "Use Command: No\n",
                                                  "     Timout: 200 (milliseconds)\n\n"}));
-    EXPECT_EQ(CurrentDirectory(), before);
+    EXPECT_EQ(std::filesystem::current_path().string(), before);
     EXPECT_EQ(Ask(server, "fake/cwd").cwd, "/tmp");
     id = server.Id();
     TraceLog::Clear();
   }
-  EXPECT_EQ(CurrentDirectory(), before);
+  EXPECT_EQ(std::filesystem::current_path().string(), before);
   EXPECT_EQ(TraceLog::Texts(), (Texts{"Closing language server.....\n", "Closing pipes.....\n",
                                       "Waiting for threads to end....\n", "Language server close complete.\n\n"}));
   // Its input closed, the fake ends by itself: nobody killed it. If it ended before the

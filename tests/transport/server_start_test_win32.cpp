@@ -3,6 +3,7 @@
 #include <gtest/gtest.h>
 #include <windows.h>
 
+#include <filesystem>
 #include <string>
 
 #include "transport_test_support.h"
@@ -20,24 +21,18 @@ std::string FakeServerPath() {
   return size > 0 && size < sizeof buffer ? std::string(buffer, size) : VEXIL_FAKE_SERVER;
 }
 
-std::string CurrentDirectory() {
-  char buffer[MAX_PATH];
-  const DWORD size = GetCurrentDirectoryA(sizeof buffer, buffer);
-  return std::string(buffer, size);
-}
-
 std::string WorkingDirectoryOf(vexil::xServer& server) { return Ask(server, "fake/cwd").cwd; }
 
 TEST_F(ServerStart, LaunchesDirectlyAndThroughCmdExeInItsOwnDirectory) {
   vexil_test::TempDirectory directory;
-  const std::string before = CurrentDirectory();
+  const std::string before = std::filesystem::current_path().string();
   xServerStart direct = FakeStart({"stderr=direct\\n"});
   direct.executable = FakeServerPath();
   direct.directory = directory.Path().string();
   vexil::xServer server(direct);
   ASSERT_TRUE(server.Start());
   EXPECT_EQ(TraceLog::Texts("Verbose")[0], " Executable: " + direct.executable + "\n");
-  EXPECT_EQ(CurrentDirectory(), before);
+  EXPECT_EQ(std::filesystem::current_path().string(), before);
   EXPECT_EQ(WorkingDirectoryOf(server), direct.directory);
   EXPECT_TRUE(ErrorLineArrives(server, "direct"));
 
