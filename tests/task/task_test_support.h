@@ -1,21 +1,31 @@
-// Helpers for the task tests: options that trace into the shared recording, and waits
-// for trace lines and for processes to be gone, on conditions with generous deadlines.
+// Helpers for the task tests: options that trace into the shared recording, waits for trace
+// lines and for processes to be gone, and the fixture of the watcher-command tests.
 #pragma once
 
+#include <gtest/gtest.h>
+
+#include <algorithm>
 #include <chrono>
 #include <fstream>
-#include <functional>
+#include <memory>
 #include <string>
-#include <thread>
+#include <vector>
 
 #include "../watch/watch_callbacks.h"
+#include "task/watcher_event.h"
 #include "vexil/task/watcher_options.h"
+#include "vexil_test/support.h"
 
 namespace tasktest {
 
+using vexil::xFileTags;
+using vexil::xWatcherEvent;
+using watchtest::Error;
 using watchtest::kDeadline;
 using watchtest::Recorded;
 using watchtest::TraceLine;
+using watchtest::Verbose;
+using watchtest::WaitForTrace;
 
 inline xWatcherOptions Options(const std::string& arguments, int timeout = 10000, bool useCommand = true) {
   xWatcherOptions options;
@@ -38,22 +48,11 @@ inline TraceLine Notice(const std::string& title, const std::string& text) {
   return {TraceType::Notice, title, text};
 }
 inline TraceLine Message(const std::string& text) { return {TraceType::Line, "Message", text}; }
-using watchtest::Error;
-using watchtest::Verbose;
-using watchtest::WaitForTrace;
-
-// Call only with the recording's lock held (inside WaitUntil or Read).
-inline bool AnyTraced(const std::function<bool(const TraceLine&)>& match) {
-  for (const TraceLine& line : Recorded().traces) {
-    if (match(line)) return true;
-  }
-  return false;
-}
 
 inline bool Traced(const TraceLine& wanted) {
-  return Recorded().shared.Read([&] { return AnyTraced([&](const TraceLine& line) { return line == wanted; }); });
+  return Recorded().shared.Read(
+      [&] { return std::find(Recorded().traces.begin(), Recorded().traces.end(), wanted) != Recorded().traces.end(); });
 }
-
 
 // A text traced under `title` that contains `piece`.
 inline bool WaitForText(const std::string& title, const std::string& piece,
@@ -73,19 +72,43 @@ inline bool ModifyUntilTraced(const std::string& path, const std::string& title,
   return false;
 }
 
-// For a state nothing signals, such as a thread's end or a process's.
-inline bool PollUntil(const std::function<bool()>& condition) {
-  const auto end = std::chrono::steady_clock::now() + kDeadline;
-  while (std::chrono::steady_clock::now() < end) {
-    if (condition()) return true;
-    std::this_thread::sleep_for(std::chrono::milliseconds(20));
-  }
-  return false;
-}
-
 // Gone means ended and collected: a zombie still counts as existing.
 inline bool WaitUntilGone(int pid) {
-  return PollUntil([pid] { return !vexil_test::ProcessExists(pid); });
+  return vexil_test::WaitFor([pid] { return !vexil_test::ProcessExists(pid); });
 }
+
+inline const char* const kTask = "build";
+inline const std::string kTimedOut = "\nWatcher Command: 'build' => Timed out waiting for watcher task to complete.\n";
+inline const std::string kRefusal =
+    "\nWatcher Command: 'build' => Refused to run: the file name contains characters the command interpreter "
+    "would interpret.\n";
+inline const std::string kMissingAdvice =
+    "Make sure the executable exists, the details are correctly configured and the executable is in the PATH.\n\n";
+
+// File names that would make the platform's interpreter do more than the command (each
+// tries to create "pwned" in the test's directory).
+extern const std::vector<std::string> kInterpretedNames;
+// A command of the platform's that runs for seconds, with this time-out.
+xWatcherOptions LongCommand(int timeout);
+
+// Events for files of a temporary directory, the recording reset before each test.
+class WatcherCommand : public ::testing::Test {
+ protected:
+  void SetUp() override { watchtest::ResetRecording(); }
+
+  std::unique_ptr<xWatcherEvent> Event(const std::string& file, const xWatcherOptions& options) {
+    return std::make_unique<xWatcherEvent>(kTask, xFileTags(dir_ / file), options);
+  }
+
+  // Starts a command that outlives its time-out; returns once the time-out is reported.
+  std::unique_ptr<xWatcherEvent> TimedOut(const xWatcherOptions& options) {
+    auto event = Event("a.cpp", options);
+    EXPECT_TRUE(event->Start());
+    EXPECT_TRUE(WaitForTrace(Error(kTimedOut)));
+    return event;
+  }
+
+  watchtest::TempDir dir_;
+};
 
 }  // namespace tasktest

@@ -1,11 +1,13 @@
-// Watcher commands on every platform: a missing program is a launch failure, and a file
-// name the command interpreter would read as syntax is never run.
+// Watcher commands on every platform: a missing program is a launch failure, a file name
+// the command interpreter would read as syntax is never run, and a command that outlives
+// its time-out is left running.
 #include <gtest/gtest.h>
 
+#include <chrono>
 #include <filesystem>
 #include <string>
 
-#include "watcher_cmd_fixture.h"
+#include "task_test_support.h"
 
 namespace {
 
@@ -38,6 +40,35 @@ TEST_F(WatcherCommand, FileNamesTheInterpreterWouldReadAsSyntaxAreNeverRun) {
   own->Start();
   EXPECT_TRUE(WaitForText("Message", "done"));
   EXPECT_FALSE(Traced(Error(kRefusal)));
+}
+
+TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndCollectedOnceItEnds) {
+  auto event = TimedOut(LongCommand(500));
+  const int pid = event->Command().Id();
+  ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
+  EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
+  EXPECT_TRUE(event->Command().HaveErrors());
+  EXPECT_FALSE(event->Command().Completed());
+  EXPECT_TRUE(vexil_test::WaitFor([&] { return event->Finished(); }));
+  ASSERT_TRUE(vexil_test::ProcessExists(pid)) << "the child is never killed by the library";
+
+  // The reader was stopped although the child holds the pipe open: a reader that waited
+  // for the end of the output would hold this up for the rest of the child's run.
+  const auto begin = std::chrono::steady_clock::now();
+  event.reset();
+  EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(10));
+  EXPECT_TRUE(Traced(Verbose("Watcher command close complete.\n\n")));
+
+  vexil_test::KillProcess(pid);
+  EXPECT_TRUE(WaitUntilGone(pid)) << "a child given up on is still collected once it ends";
+
+  // Also while its command is still kept, as a task keeps it until the next change.
+  watchtest::ResetRecording();
+  auto kept = TimedOut(LongCommand(300));
+  const int keptPid = kept->Command().Id();
+  ASSERT_GT(keptPid, 0);
+  vexil_test::KillProcess(keptPid);
+  EXPECT_TRUE(WaitUntilGone(keptPid));
 }
 
 }  // namespace

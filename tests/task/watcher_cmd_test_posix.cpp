@@ -1,16 +1,14 @@
-// Watcher commands through /bin/sh: one that runs on and ends, ones that end at once, one
-// that outlives its time-out, and the names the shell would interpret.
+// Watcher commands through /bin/sh: one that runs on and ends, ones that end at once, and
+// the names the shell would interpret.
 #include <gtest/gtest.h>
-#include <signal.h>
 
 #include <algorithm>
-#include <chrono>
 #include <filesystem>
 #include <memory>
 #include <string>
 #include <vector>
 
-#include "watcher_cmd_fixture.h"
+#include "task_test_support.h"
 
 namespace {
 
@@ -39,7 +37,7 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
             1);
   EXPECT_TRUE(event->Command().Completed());
   EXPECT_FALSE(event->Command().HaveErrors());
-  EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));  // the notice comes just before the thread's end
+  EXPECT_TRUE(vexil_test::WaitFor([&] { return event->Finished(); }));  // the notice comes just before the thread's end
   for (const std::string& text : std::vector<std::string>{
            "Watcher Event starting....\n\n", " Executable: /bin/sh\n", "  Arguments: -c " + output + "echo built a.cpp; sleep 1; printf unended \n",
            "Use Command: Yes\n", "     Timout: 60000 (milliseconds)\n\n", "Watcher Event starting ", "complete.\n\n"})
@@ -51,69 +49,37 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
 TEST_F(WatcherCommand, CommandsThatEndAtOnceGetNoWaitingThread) {
   // The end is looked for 100 ms after the launch, which a busy machine may not give even
   // `true`: the command is launched again until one ended by then.
-  auto endedAtOnce = [this](const xWatcherOptions& options) {
+  auto endedAtOnce = [this](const std::string& file, const xWatcherOptions& options) {
     for (int attempt = 0; attempt < 10; ++attempt) {
       watchtest::ResetRecording();
-      auto event = Event("a.cpp", options);
+      auto event = Event(file, options);
       if (!event->Start()) return event;
     }
     return std::unique_ptr<xWatcherEvent>();
   };
-  auto quiet = endedAtOnce(Direct("true", "", 0));
+  auto quiet = endedAtOnce("a.cpp", Direct("true", "", 0));
   ASSERT_TRUE(quiet);
   EXPECT_TRUE(quiet->Finished());
   EXPECT_TRUE(Traced(Notice(kTask, "Watcher Event Command Run complete.")));
   EXPECT_TRUE(Traced(Verbose("     Timout: 5000 (milliseconds)\n\n")));  // 0 means 5000
   EXPECT_TRUE(Traced(Verbose("  Arguments: \n")));                      // an empty argument is left out
 
-  auto talking = endedAtOnce(Direct("echo", "quick $FB"));
+  // Without the shell the file name is one argument that nothing reads as syntax.
+  xWatcherOptions echo = Direct("echo", "quick $F");
+  echo.directory = dir_.Path().string();
+  auto talking = endedAtOnce("x;touch pwned;.cpp", echo);
   ASSERT_TRUE(talking);
-  EXPECT_TRUE(Traced(Message("quick a\n")));  // one argument, blanks and all
+  EXPECT_TRUE(Traced(Message("quick x;touch pwned;.cpp\n")));  // one argument, blanks and all
+  EXPECT_FALSE(std::filesystem::exists(dir_ / "pwned"));
   EXPECT_FALSE(Traced(Verbose("Watcher Event starting ")));
   EXPECT_FALSE(Traced(Notice(kTask, "Watcher Command Run event complete.")));
-}
-
-TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsLeftRunningAndReapedOnceItEnds) {
-  auto event = TimedOut(Direct("sleep", "30", 500));
-  const int pid = event->Command().Id();
-  ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
-  EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
-  EXPECT_TRUE(event->Command().HaveErrors());
-  EXPECT_FALSE(event->Command().Completed());
-  EXPECT_TRUE(PollUntil([&] { return event->Finished(); }));
-  ASSERT_EQ(kill(pid, 0), 0) << "the child is never killed by the library";
-
-  // The reader was stopped although the child holds the pipe open: a reader that
-  // waited for the end of the output would hold this up for the child's 30 s.
-  const auto begin = std::chrono::steady_clock::now();
-  event.reset();
-  EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(10));
-  EXPECT_TRUE(Traced(Verbose("Watcher command close complete.\n\n")));
-
-  kill(pid, SIGKILL);
-  EXPECT_TRUE(WaitUntilGone(pid)) << "a child given up on is still collected once it ends";
-
-  // Also while its command is still kept, as a task keeps it until the next change.
-  watchtest::ResetRecording();
-  auto kept = TimedOut(Direct("sleep", "30", 300));
-  const int keptPid = kept->Command().Id();
-  ASSERT_GT(keptPid, 0);
-  kill(keptPid, SIGKILL);
-  EXPECT_TRUE(WaitUntilGone(keptPid));
-}
-
-TEST_F(WatcherCommand, WithoutTheShellAFileNameIsOneArgumentThatNothingReadsAsSyntax) {
-  xWatcherOptions direct = Direct("echo", "$F");
-  direct.directory = dir_.Path().string();
-  auto plain = Event("x;touch pwned;.cpp", direct);
-  plain->Start();
-  EXPECT_TRUE(WaitForText("Message", "x;touch pwned;.cpp\n"));
-  EXPECT_FALSE(std::filesystem::exists(dir_ / "pwned"));
 }
 
 }  // namespace
 
 namespace tasktest {
+
+xWatcherOptions LongCommand(int timeout) { return Direct("sleep", "30", timeout); }
 
 const std::vector<std::string> kInterpretedNames = {
     "x;touch pwned;.cpp", "x$(touch pwned).cpp", "x`touch pwned`.cpp", "x|touch pwned.cpp", "x&&touch pwned&&.cpp",

@@ -1,12 +1,11 @@
-// Watcher commands through cmd.exe: one that writes and ends, one that outlives its
-// time-out, and the file names cmd.exe would read as syntax.
+// Watcher commands through cmd.exe: one that writes and ends, and the file names cmd.exe
+// would read as syntax.
 #include <gtest/gtest.h>
 
-#include <chrono>
-#include <filesystem>
 #include <string>
+#include <vector>
 
-#include "watcher_cmd_fixture.h"
+#include "task_test_support.h"
 
 namespace {
 
@@ -24,24 +23,12 @@ TEST_F(WatcherCommand, CmdExeRunsTheTextTracesItsOutputAndReportsTheEnd) {
   EXPECT_TRUE(Traced(Verbose("  Arguments: /C echo built a.cpp & ping -n 2 127.0.0.1 >nul \n")));
 }
 
-TEST_F(WatcherCommand, CommandThatOutlivesItsTimeOutIsReportedAndLeftRunning) {
-  // About nine seconds of pinging against half a second allowed.
-  auto event = Event("a.cpp", Options("ping -n 10 127.0.0.1 >nul", 500));
-  ASSERT_TRUE(event->Start());
-  const int pid = event->Command().Id();
-  ASSERT_TRUE(WaitForTrace(Error(kTimedOut)));
-  EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
-  EXPECT_TRUE(event->Command().HaveErrors());
-  EXPECT_FALSE(event->Command().Completed());
-  EXPECT_TRUE(vexil_test::ProcessExists(pid)) << "the library never ends a command";
-  event.reset();
-  EXPECT_TRUE(Traced(Verbose("Watcher command close complete.\n\n")));
-  vexil_test::KillProcess(pid);
-}
-
 }  // namespace
 
 namespace tasktest {
+
+// About nine seconds of pinging.
+xWatcherOptions LongCommand(int timeout) { return Options("ping -n 10 127.0.0.1 >nul", timeout); }
 
 const std::vector<std::string> kInterpretedNames = {"x&echo pwned>pwned&.cpp", "x|echo.cpp", "x<in.cpp", "x^.cpp",
                                                     "x%PATH%.cpp", "x\".cpp"};

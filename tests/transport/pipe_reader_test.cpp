@@ -1,6 +1,6 @@
 // The readers over real pipes and the queue behind them: queueing, end of file, stopping
-// while the writer stays silent, the dispatch hook, the error reader's lines, one big
-// body, bounded writes, and the bounds on what the queues hold while nobody takes.
+// while the writer stays silent, the dispatch hook, one big body, bounded writes, and the
+// bounds on what the queues hold (of bodies or of error lines) while nobody takes.
 #include <gtest/gtest.h>
 
 #include <atomic>
@@ -126,21 +126,15 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
   EXPECT_EQ(errors.substr(errors.size() - 6), "e1002\n");
 }
 
-TEST(PipeReader, ErrorReaderQueuesLinesAndKeepsNoOutput) {
-  RunningReader<vexil::xPipeErrReader> running;
-  EXPECT_EQ(running.reader.Name(), "strderr");
-  running.SendAndClose("w\r\nx\ny\rz\nlast");
-  for (const char* line : {"w", "x", "y", "z"}) EXPECT_EQ(Pop(running.reader), line);
-  EXPECT_EQ(running.reader.Messages().Size(), 0u);  // the unfinished line is dropped
-  EXPECT_EQ(running.reader.TakeOutput(), "");
-}
-
 TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
+  // The error reader queues lines as the splitter cuts them, drops an unfinished last one
+  // at the end and keeps no stray output.
   RunningReader<vexil::xPipeErrReader> err;
   std::string lines;
   for (int i = 0; lines.size() < 40u << 20; ++i) lines += "I[10:00:00.000] log line " + std::to_string(i) + std::string(60, '.') + "\n";
-  err.SendAndClose(lines + "last line\n");
+  err.SendAndClose(lines + "last line\r\nunfinished");
   ExpectNewestWithin(err.reader.Messages(), vexil::xPipeErrReader::kQueueLimit, "last line");
+  EXPECT_EQ(err.reader.TakeOutput(), "");
 
   RunningReader<vexil::xPipeReader> out("stdout");
   const std::string notification = Frame(R"({"jsonrpc":"2.0","method":"$/progress","params":{"value":")" +

@@ -1,5 +1,6 @@
-// Starting and closing the fake server on every platform: a server that ends at once is a
-// failed start, and the destructor never waits for what the server left holding its pipes.
+// Starting and closing the fake server on every platform: a missing executable or directory
+// and a server that ends at once are failed starts, and the destructor never waits for what
+// the server left holding its pipes.
 #include <gtest/gtest.h>
 
 #include <chrono>
@@ -13,12 +14,16 @@ using namespace std::chrono_literals;
 using namespace transport_test;
 using Texts = std::vector<std::string>;
 
+// What it wrote is traced first at the messages level; below it, only the failure is.
 TEST_F(ServerStart, ProcessThatExitsAtOnceIsAFailedStartWithItsOutput) {
-  xServerStart start = FakeStart({"stdout=banner\\n;exit=0"}, 200, LSP::TraceLevel::Messages);
-  auto server = FailedStart(start);
-  ASSERT_TRUE(server);
-  EXPECT_EQ(TraceLog::Texts(), (Texts{"banner\n", kFailedStart, kCheckDetails, kHint}));
-  EXPECT_FALSE(server->HaveErrors());
+  for (LSP::TraceLevel level : {LSP::TraceLevel::Messages, LSP::TraceLevel::Off}) {
+    auto server = FailedStart(FakeStart({"stdout=banner\\n;exit=0"}, 200, level));
+    ASSERT_TRUE(server);
+    Texts expected = {kFailedStart, kCheckDetails, kHint};
+    if (level == LSP::TraceLevel::Messages) expected.insert(expected.begin(), "banner\n");
+    EXPECT_EQ(TraceLog::Texts(), expected);
+    EXPECT_FALSE(server->HaveErrors());
+  }
 }
 
 TEST_F(ServerStart, DestructorReturnsPromptlyWhileServerAndGrandchildHoldThePipes) {
@@ -39,6 +44,24 @@ TEST_F(ServerStart, DestructorReturnsPromptlyWhileServerAndGrandchildHoldThePipe
   orphaned->Start();
   orphaned.reset();
   EXPECT_LT(std::chrono::steady_clock::now() - closing, 2s);
+}
+
+// A missing executable or directory: the error, the hint once, the system's reason, and
+// the advice to check the details.
+TEST_F(ServerStart, MissingExecutableOrDirectoryReportsInOrderWithTheHintOnce) {
+  for (const LaunchFailure& failure : LaunchFailures()) {
+    SCOPED_TRACE(failure.executable + " in " + failure.directory);
+    TraceLog::Clear();
+    xServerStart start = FakeStart({}, 200, LSP::TraceLevel::Messages);
+    start.executable = failure.executable;
+    start.directory = failure.directory;
+    vexil::xServer server(start);
+    EXPECT_FALSE(server.Start());
+    EXPECT_TRUE(server.HaveErrors());
+    EXPECT_EQ(server.ErrorMessage(), failure.error);
+    EXPECT_EQ(TraceLog::Texts(), (Texts{"Error: " + failure.error + "\n\n", kHint,
+                                        "\nError Reason: " + failure.reason + "\n", kFailedStart, kCheckDetails}));
+  }
 }
 
 }  // namespace

@@ -1,9 +1,10 @@
 // Launching and closing the server against the fake through /bin/sh: the launch details,
-// every launch failure with its trace order, early exits, working directory, and the close.
+// what fails a launch here, a missing program through the shell, the working directory,
+// and the close.
 #include <gtest/gtest.h>
 #include <sys/wait.h>
-#include <unistd.h>
 
+#include <filesystem>
 #include <memory>
 #include <string>
 
@@ -13,11 +14,6 @@ namespace {
 
 using namespace transport_test;
 using Texts = std::vector<std::string>;
-
-std::string CurrentDirectory() {
-  char buffer[4096];
-  return getcwd(buffer, sizeof buffer) ? buffer : "";
-}
 
 TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheTimeout) {
   xServerStart start = FakeStart({"", "ignored-by-sh"}, 0);
@@ -43,7 +39,7 @@ TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheT
 // A direct launch's details with the defaults, the server's own working directory, and a
 // close that leaves a well-behaved server to end by itself.
 TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
-  const std::string before = CurrentDirectory();
+  const std::string before = std::filesystem::current_path().string();
   xServerStart start = FakeStart();
   start.timeout = -5;
   start.directory = "/tmp";
@@ -54,12 +50,12 @@ TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
     EXPECT_EQ(TraceLog::Texts("Verbose"), (Texts{" Executable: " VEXIL_FAKE_SERVER "\n", "  Directory: /tmp\n",
                                                  "  Arguments: \n", "Use Command: No\n",
                                                  "     Timout: 200 (milliseconds)\n\n"}));
-    EXPECT_EQ(CurrentDirectory(), before);
+    EXPECT_EQ(std::filesystem::current_path().string(), before);
     EXPECT_EQ(Ask(server, "fake/cwd").cwd, "/tmp");
     id = server.Id();
     TraceLog::Clear();
   }
-  EXPECT_EQ(CurrentDirectory(), before);
+  EXPECT_EQ(std::filesystem::current_path().string(), before);
   EXPECT_EQ(TraceLog::Texts(), (Texts{"Closing language server.....\n", "Closing pipes.....\n",
                                       "Waiting for threads to end....\n", "Language server close complete.\n\n"}));
   // Its input closed, the fake ends by itself: nobody killed it. If it ended before the
@@ -70,36 +66,8 @@ TEST_F(ServerStart, DirectLaunchInItsOwnDirectoryAndTheClose) {
   EXPECT_TRUE(ended == -1 || (WIFEXITED(status) && WEXITSTATUS(status) == 0));
 }
 
-TEST_F(ServerStart, MissingExecutableOrDirectoryReportsInOrderWithTheHintOnce) {
-  struct Case {
-    std::string executable, directory, error;
-  } cases[] = {
-      {"/nonexistent/server", "", "Error: Cannot find executable: /nonexistent/server\n\n"},
-      {"no-such-language-server-here", "", "Error: Cannot find executable: no-such-language-server-here\n\n"},
-      {VEXIL_FAKE_SERVER, "/nonexistent/dir", "Error: Cannot change to directory: /nonexistent/dir\n\n"},
-  };
-  for (const Case& c : cases) {
-    TraceLog::Clear();
-    xServerStart start = FakeStart({}, 200, LSP::TraceLevel::Messages);
-    start.executable = c.executable;
-    start.directory = c.directory;
-    vexil::xServer server(start);
-    EXPECT_FALSE(server.Start());
-    EXPECT_EQ(TraceLog::Texts(), (Texts{c.error, kHint, "\nError Reason: No such file or directory\n", kFailedStart,
-                                        kCheckDetails}));
-    EXPECT_TRUE(server.HaveErrors());
-    EXPECT_EQ(server.ErrorMessage(), c.error.substr(7, c.error.size() - 9));
-  }
-}
-
-TEST_F(ServerStart, ProgramsThatEndAtOnceThroughTheInterpreterOrNotAreFailedStarts) {
-  xServerStart truth = FakeStart({}, 200, LSP::TraceLevel::Off);
-  truth.executable = "true";
-  auto exitsAtOnce = FailedStart(truth);
-  ASSERT_TRUE(exitsAtOnce);
-  EXPECT_EQ(TraceLog::Texts(), (Texts{kFailedStart, kCheckDetails, kHint}));
-
-  // Through the interpreter a missing program is the interpreter's to report.
+// Through the interpreter a missing program is the interpreter's to report.
+TEST_F(ServerStart, AProgramMissingThroughTheInterpreterIsAFailedStart) {
   xServerStart command = FakeStart({}, 200, LSP::TraceLevel::Messages);
   command.useCommand = true;
   command.executable = "no-such-language-server-here --stdio";
@@ -112,3 +80,14 @@ TEST_F(ServerStart, ProgramsThatEndAtOnceThroughTheInterpreterOrNotAreFailedStar
 }
 
 }  // namespace
+
+namespace transport_test {
+
+std::vector<LaunchFailure> LaunchFailures() {
+  const std::string missing = "No such file or directory";
+  return {{"/nonexistent/server", "", "Cannot find executable: /nonexistent/server", missing},
+          {"no-such-language-server-here", "", "Cannot find executable: no-such-language-server-here", missing},
+          {VEXIL_FAKE_SERVER, "/nonexistent/dir", "Cannot change to directory: /nonexistent/dir", missing}};
+}
+
+}  // namespace transport_test

@@ -1,8 +1,9 @@
-// Launching and closing the server on Windows: directly and through cmd.exe, launch
-// failures with the system's own reason text and its working directory.
+// Launching the server on Windows: directly and through cmd.exe in its working directory,
+// and what fails a launch here, with the system's own reason text.
 #include <gtest/gtest.h>
 #include <windows.h>
 
+#include <filesystem>
 #include <string>
 
 #include "transport_test_support.h"
@@ -20,35 +21,18 @@ std::string FakeServerPath() {
   return size > 0 && size < sizeof buffer ? std::string(buffer, size) : VEXIL_FAKE_SERVER;
 }
 
-std::string CurrentDirectory() {
-  char buffer[MAX_PATH];
-  const DWORD size = GetCurrentDirectoryA(sizeof buffer, buffer);
-  return std::string(buffer, size);
-}
-
-// What the system's message table says about `code`, as the failed start quotes it.
-std::string ReasonLine(DWORD code) {
-  char* text = nullptr;
-  FormatMessageA(FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS,
-                 nullptr, code, MAKELANGID(LANG_NEUTRAL, SUBLANG_DEFAULT), reinterpret_cast<char*>(&text), 0,
-                 nullptr);
-  std::string reason = text ? text : "";
-  LocalFree(text);
-  return "\nError Reason: " + reason + "\n";
-}
-
 std::string WorkingDirectoryOf(vexil::xServer& server) { return Ask(server, "fake/cwd").cwd; }
 
 TEST_F(ServerStart, LaunchesDirectlyAndThroughCmdExeInItsOwnDirectory) {
   vexil_test::TempDirectory directory;
-  const std::string before = CurrentDirectory();
+  const std::string before = std::filesystem::current_path().string();
   xServerStart direct = FakeStart({"stderr=direct\\n"});
   direct.executable = FakeServerPath();
   direct.directory = directory.Path().string();
   vexil::xServer server(direct);
   ASSERT_TRUE(server.Start());
   EXPECT_EQ(TraceLog::Texts("Verbose")[0], " Executable: " + direct.executable + "\n");
-  EXPECT_EQ(CurrentDirectory(), before);
+  EXPECT_EQ(std::filesystem::current_path().string(), before);
   EXPECT_EQ(WorkingDirectoryOf(server), direct.directory);
   EXPECT_TRUE(ErrorLineArrives(server, "direct"));
 
@@ -68,27 +52,26 @@ TEST_F(ServerStart, LaunchesDirectlyAndThroughCmdExeInItsOwnDirectory) {
   EXPECT_TRUE(ErrorLineArrives(interpreted, "through"));
 }
 
-TEST_F(ServerStart, LaunchFailuresQuoteTheSystemsReasonAndGiveTheHintOnce) {
-  struct Case {
-    std::string executable, directory;
-    DWORD code;
-  } cases[] = {
-      {"C:\\nonexistent\\server.exe", "", ERROR_FILE_NOT_FOUND},
-      {"no-such-language-server-here", "", ERROR_FILE_NOT_FOUND},
-      {FakeServerPath(), "C:\\nonexistent\\dir", ERROR_DIRECTORY},
+}  // namespace
+
+namespace transport_test {
+
+// The reasons are the system's message table's texts.
+std::vector<LaunchFailure> LaunchFailures() {
+  auto reason = [](DWORD code) {
+    char* text = nullptr;
+    FormatMessageA(FORMAT_MESSAGE_ALLOCATE_BUFFER | FORMAT_MESSAGE_FROM_SYSTEM | FORMAT_MESSAGE_IGNORE_INSERTS, nullptr,
+                   code, MAKELANGID(LANG_NEUTRAL, SUBLANG_DEFAULT), reinterpret_cast<char*>(&text), 0, nullptr);
+    std::string reason = text ? text : "";
+    LocalFree(text);
+    return reason;
   };
-  for (const Case& c : cases) {
-    TraceLog::Clear();
-    xServerStart start = FakeStart({}, 200, LSP::TraceLevel::Messages);
-    start.executable = c.executable;
-    start.directory = c.directory;
-    vexil::xServer server(start);
-    EXPECT_FALSE(server.Start()) << c.executable;
-    EXPECT_TRUE(server.HaveErrors());
-    const std::string error = "Error: " + std::string(server.ErrorMessage()) + "\n\n";
-    EXPECT_EQ(TraceLog::Texts(), (Texts{error, kHint, ReasonLine(c.code), kFailedStart, kCheckDetails}))
-        << c.executable;
-  }
+  auto failure = [&](const std::string& executable, const std::string& directory, DWORD code) {
+    return LaunchFailure{executable, directory, "Cannot launch process: " + executable, reason(code)};
+  };
+  return {failure("C:\\nonexistent\\server.exe", "", ERROR_FILE_NOT_FOUND),
+          failure("no-such-language-server-here", "", ERROR_FILE_NOT_FOUND),
+          failure(FakeServerPath(), "C:\\nonexistent\\dir", ERROR_DIRECTORY)};
 }
 
-}  // namespace
+}  // namespace transport_test

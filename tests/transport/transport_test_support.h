@@ -5,12 +5,9 @@
 #include <gtest/gtest.h>
 
 #include <algorithm>
-#include <chrono>
-#include <functional>
 #include <memory>
 #include <mutex>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "json/rapidjson.h"
@@ -148,15 +145,7 @@ inline void Notify(vexil::xServer& server, const char* method, const std::string
   server.Write(note);
 }
 
-// Polls `condition` until it holds or `limit` has passed.
-inline bool WaitFor(const std::function<bool()>& condition, std::chrono::milliseconds limit = std::chrono::seconds(10)) {
-  auto deadline = std::chrono::steady_clock::now() + limit;
-  while (!condition()) {
-    if (std::chrono::steady_clock::now() > deadline) return false;
-    std::this_thread::sleep_for(std::chrono::milliseconds(5));
-  }
-  return true;
-}
+using vexil_test::WaitFor;
 
 // Standard error is traced while a reply is awaited, and the two pipes keep no common
 // order: ask until `line` has come through, once.
@@ -178,6 +167,14 @@ inline std::unique_ptr<vexil::xServer> FailedStart(const xServerStart& start) {
   }
   return nullptr;
 }
+
+// A launch that fails for a missing executable or directory: the error it records, and the
+// reason the system gives, as the trace quotes it.
+struct LaunchFailure {
+  std::string executable, directory, error, reason;
+};
+// This platform's launch failures (each platform's start test has them).
+std::vector<LaunchFailure> LaunchFailures();
 
 // Each test of the fake server reads only its own trace lines.
 class FakeServerTest : public ::testing::Test {

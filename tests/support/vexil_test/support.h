@@ -1,9 +1,12 @@
 // Portable helpers for tests: a temporary directory removed with its contents, control
-// over processes a test started (the library itself never kills a child), and framing.
+// over processes a test started (the library itself never kills a child), polling, framing.
 #pragma once
 
+#include <chrono>
 #include <filesystem>
+#include <functional>
 #include <string>
+#include <thread>
 
 namespace vexil_test {
 
@@ -30,6 +33,18 @@ std::filesystem::path MemoryBackedBase();
 void KillProcess(int id);
 // Whether the process `id` still exists (an exited but unreaped child counts as existing).
 bool ProcessExists(int id);
+
+// Polls `condition` until it holds or `limit` has passed; says whether it held. For states
+// nothing signals, such as a thread's end or a process's.
+inline bool WaitFor(const std::function<bool()>& condition,
+                    std::chrono::milliseconds limit = std::chrono::seconds(30)) {
+  const auto deadline = std::chrono::steady_clock::now() + limit;
+  while (!condition()) {
+    if (std::chrono::steady_clock::now() > deadline) return false;
+    std::this_thread::sleep_for(std::chrono::milliseconds(5));
+  }
+  return true;
+}
 
 // `body` as a server frames it on the wire.
 inline std::string Frame(const std::string& body) {
