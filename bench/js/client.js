@@ -18,7 +18,11 @@ const WARM_UP_MS = 500;
 // Far beyond any round trip here: only tells a stuck server from a slow one.
 const REPLY_TIMEOUT_MS = 60000;
 
+// The fake server, ended with the client whatever the failure.
+let server = null;
+
 function fail(message) {
+  if (server) server.kill();
   process.stderr.write(`${message}\n`);
   process.exit(1);
 }
@@ -31,10 +35,10 @@ function loadJsonRpc() {
   }
 }
 
-function withTimeout(promise, what) {
+function withTimeout(promise, failure) {
   let timer;
   const timeout = new Promise((_, reject) => {
-    timer = setTimeout(() => reject(new Error(`no reply to ${what} in ${REPLY_TIMEOUT_MS} ms`)), REPLY_TIMEOUT_MS);
+    timer = setTimeout(() => reject(new Error(`${failure} in ${REPLY_TIMEOUT_MS} ms`)), REPLY_TIMEOUT_MS);
   });
   return Promise.race([promise, timeout]).finally(() => clearTimeout(timer));
 }
@@ -52,7 +56,7 @@ async function main([serverPath, resultFile, requestText, roundTripsText]) {
   const { method, params } = JSON.parse(requestText);
   const { rpc, version } = loadJsonRpc();
 
-  const server = spawn(serverPath, [`result-file=${resultFile}`], { stdio: ['pipe', 'pipe', 'ignore'] });
+  server = spawn(serverPath, [`result-file=${resultFile}`], { stdio: ['pipe', 'pipe', 'ignore'] });
   const exited = new Promise((resolve) => server.on('exit', resolve));
   server.on('error', (error) => fail(`the fake server did not start: ${error.message}`));
   const connection = rpc.createMessageConnection(
@@ -63,7 +67,7 @@ async function main([serverPath, resultFile, requestText, roundTripsText]) {
   const check = (result) => {
     if (result === null || typeof result !== 'object') fail(`${method} answered ${JSON.stringify(result)}`);
   };
-  const roundTrip = () => withTimeout(connection.sendRequest(method, params), method);
+  const roundTrip = () => withTimeout(connection.sendRequest(method, params), `no reply to ${method}`);
   for (const warmUpEnd = Date.now() + WARM_UP_MS; Date.now() < warmUpEnd;) check(await roundTrip());
   const micros = [];
   while (micros.length < roundTrips) {
@@ -78,7 +82,7 @@ async function main([serverPath, resultFile, requestText, roundTripsText]) {
   await connection.sendNotification('exit');
   connection.dispose();
   server.stdin.end();
-  await exited;
+  await withTimeout(exited, 'the fake server did not end after "exit"');
 
   micros.sort((a, b) => a - b);
   process.stdout.write(JSON.stringify({
@@ -87,4 +91,8 @@ async function main([serverPath, resultFile, requestText, roundTripsText]) {
   }) + '\n');
 }
 
-main(process.argv.slice(2)).catch((error) => fail(error.message));
+// A server that ended early shows first as a failed write or read: say that it ended.
+main(process.argv.slice(2)).catch((error) => {
+  const ended = server && (server.exitCode !== null || server.signalCode !== null);
+  fail(ended ? `the fake server ended (${server.signalCode || `exit code ${server.exitCode}`}): ${error.message}` : error.message);
+});
