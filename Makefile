@@ -49,9 +49,13 @@ package: build
 
 # The memory check runs first, in a process of its own, so that no other benchmark's freed
 # memory hides its growth. The other repetitions are interleaved at random, so a load that
-# comes and goes on a shared machine weighs on a figure and its floor alike.
+# comes and goes on a shared machine weighs on a figure and its floor alike. Among them runs
+# the JavaScript client compared with vexil; when it cannot be installed (no node or npm, no
+# registry) the install says why, and the report names the comparison skipped beside every
+# other figure.
 bench: build
 	cmake --build $(BUILD) --target vexil_bench
+	scripts/install-bench-js.sh || true
 	$(BUILD)/bench/vexil_bench --benchmark_filter=Memory \
 	  --benchmark_out=$(BUILD)/bench/memory.json --benchmark_out_format=json
 	$(BUILD)/bench/vexil_bench --benchmark_filter=-Memory --benchmark_enable_random_interleaving=true \

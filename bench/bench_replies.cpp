@@ -76,4 +76,14 @@ std::string TemporaryFile(const std::string& name, const std::string& text) {
   return path;
 }
 
+const std::string& HoverFile() {
+  static const std::string path = TemporaryFile("hover.json", HoverResult());
+  return path;
+}
+
+const std::string& CompletionFile() {
+  static const std::string path = TemporaryFile("completion.json", CompletionResult(1u << 20));
+  return path;
+}
+
 }  // namespace bench

@@ -16,4 +16,9 @@ std::string Reply(int id, const std::string& result);
 // Writes `text` to a file that lives as long as the process; returns its path.
 std::string TemporaryFile(const std::string& name, const std::string& text);
 
+// The result files the fake server answers with, written once per run and handed to every
+// client measured, so that all of them read the same bytes: the hover, and a 1 MiB completion.
+const std::string& HoverFile();
+const std::string& CompletionFile();
+
 }  // namespace bench

@@ -11,6 +11,7 @@
 
 #include "bare_splitter.h"
 #include "bench_replies.h"
+#include "bench_requests.h"
 #include "fake_server.h"
 #include "transport/pipe_io.h"
 #include "vexil/host/language_server.h"
@@ -20,33 +21,12 @@
 namespace {
 
 constexpr int kRepetitions = 10;
-constexpr std::size_t kCompletionBytes = 1u << 20;
-
-const std::string& HoverFile() {
-  static const std::string path = bench::TemporaryFile("hover.json", bench::HoverResult());
-  return path;
-}
-
-const std::string& CompletionFile() {
-  static const std::string path = bench::TemporaryFile("completion.json", bench::CompletionResult(kCompletionBytes));
-  return path;
-}
-
-// What the host asks: a position in a document.
-template <typename Params>
-Params AtPosition() {
-  Params params;
-  params.textDocument.uri = "file:///home/user/project/src/shapes.cpp";
-  params.position.line = 12;
-  params.position.character = 12;
-  return params;
-}
 
 template <typename Result, typename Params>
 void ThroughServer(benchmark::State& state, const char* method, const std::string& resultFile) {
   std::unique_ptr<vexil::xServer> server = bench::StartFakeServer("result-file=" + resultFile, 5000);
   if (!server) return state.SkipWithError("the fake server did not start");
-  Params params = AtPosition<Params>();
+  Params params = bench::AtPosition<Params>();
   for (auto _ : state) {
     LSP::RequestMessage request(method, &params);
     Result result;
@@ -64,7 +44,7 @@ void Bare(benchmark::State& state, const char* method, const std::string& result
   Poco::Pipe in;
   Poco::Pipe out;
   Poco::ProcessHandle server = Poco::Process::launch(VEXIL_FAKE_SERVER, {"result-file=" + resultFile}, &in, &out, nullptr);
-  Params params = AtPosition<Params>();
+  Params params = bench::AtPosition<Params>();
   LSP::RequestMessage request(method, &params);
   const std::string body = request.ToJSON();
   const std::string framed = "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
@@ -78,11 +58,11 @@ void Bare(benchmark::State& state, const char* method, const std::string& result
 }
 
 void RoundTrip_hover_vexil(benchmark::State& state) {
-  ThroughServer<LSP::Hover, LSP::TextDocumentPositionParams>(state, "textDocument/hover", HoverFile());
+  ThroughServer<LSP::Hover, LSP::TextDocumentPositionParams>(state, "textDocument/hover", bench::HoverFile());
 }
 
 void RoundTrip_hover_floor(benchmark::State& state) {
-  Bare<LSP::TextDocumentPositionParams>(state, "textDocument/hover", HoverFile());
+  Bare<LSP::TextDocumentPositionParams>(state, "textDocument/hover", bench::HoverFile());
 }
 
 // The host's view: a registered connection at trace level 0, initialized, asked through its
@@ -102,25 +82,25 @@ void ThroughConnection(benchmark::State& state, const char* name, const std::str
 }
 
 void RoundTrip_hover_connection(benchmark::State& state) {
-  auto params = AtPosition<LSP::TextDocumentPositionParams>();
-  ThroughConnection(state, "bench-hover", HoverFile(), [&](xLanguageServer& server) {
+  auto params = bench::AtPosition<LSP::TextDocumentPositionParams>();
+  ThroughConnection(state, "bench-hover", bench::HoverFile(), [&](xLanguageServer& server) {
     benchmark::DoNotOptimize(server.TextDocument_Hover(&params).contents.value.data());
   });
 }
 
 void RoundTrip_completion_connection(benchmark::State& state) {
-  auto params = AtPosition<LSP::CompletionParams>();
-  ThroughConnection(state, "bench-completion", CompletionFile(), [&](xLanguageServer& server) {
+  auto params = bench::AtPosition<LSP::CompletionParams>();
+  ThroughConnection(state, "bench-completion", bench::CompletionFile(), [&](xLanguageServer& server) {
     if (server.TextDocument_Completion(&params).items.empty()) state.SkipWithError("no completion");
   });
 }
 
 void RoundTrip_completion_vexil(benchmark::State& state) {
-  ThroughServer<LSP::CompletionList, LSP::CompletionParams>(state, "textDocument/completion", CompletionFile());
+  ThroughServer<LSP::CompletionList, LSP::CompletionParams>(state, "textDocument/completion", bench::CompletionFile());
 }
 
 void RoundTrip_completion_floor(benchmark::State& state) {
-  Bare<LSP::CompletionParams>(state, "textDocument/completion", CompletionFile());
+  Bare<LSP::CompletionParams>(state, "textDocument/completion", bench::CompletionFile());
 }
 
 void Figure(benchmark::internal::Benchmark* benchmark) {

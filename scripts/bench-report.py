@@ -38,6 +38,17 @@ WATCHER = [
      "ms"),
 ]
 
+# The JavaScript client (bench/js) against vexil's connection and the bare floor, all three
+# asking the same fake server answering from the same result files: (figure, request,
+# measured side, reference side, target), the sides named as in SIDES.
+JAVASCRIPT = [
+    ("1 MiB completion, vexil / JS", "completion", "vexil", "js", ("<=", 0.5)),
+    ("1 MiB completion, JS / floor", "completion", "js", "floor", None),
+    ("hover, vexil / floor", "hover", "vexil", "floor", ("<=", 1.2)),
+    ("hover, vexil / JS", "hover", "vexil", "js", None),
+]
+SIDES = {"vexil": "RoundTrip_%s_connection", "js": "RoundTrip_%s_js", "floor": "RoundTrip_%s_floor"}
+
 # (figure, benchmark, counter, limit or None, unit)
 MEMORY = [
     ("flood while idle: peak growth", "Memory_abusive_server", "peak_growth_MiB", 128, "MiB"),
@@ -122,6 +133,40 @@ def memory_rows(runs):
     return rows
 
 
+def javascript_client(benchmarks, times):
+    """What the JavaScript client ran on; why it was skipped, when some figure of it is missing;
+    and why some of its runs failed, when its figures were measured all the same."""
+    client, failures = None, {}
+    names = {SIDES["js"] % request for _, request, _, _, _ in JAVASCRIPT}
+    for entry in benchmarks:
+        name = base_name(entry.get("run_name", entry["name"]))
+        if name not in names:
+            continue
+        if entry.get("error_occurred"):
+            failures.setdefault(name, entry.get("error_message") or "the JavaScript client failed")
+        client = client or entry.get("label")
+    skipped = next((failure for name, failure in failures.items() if name not in times), None)
+    failed = next((failure for name, failure in failures.items() if name in times), None)
+    return client, skipped, failed
+
+
+def javascript_rows(times, skipped):
+    """The comparison's rows; those that need a figure of the client it was skipped for are left out."""
+    rows = []
+    for figure, request, measured, reference, target in JAVASCRIPT:
+        sides = {side: times.get(name % request) for side, name in SIDES.items()}
+        if skipped and "js" in (measured, reference) and sides["js"] is None:
+            continue
+        if sides[measured] is None or sides[reference] is None:
+            rows.append({"figure": figure, "missing": True})
+            continue
+        ratio = sides[measured] / sides[reference]
+        rows.append({"figure": figure, "vexil_s": sides["vexil"], "js_s": sides["js"], "floor_s": sides["floor"],
+                     "ratio": ratio, "target": "%s %.1f" % target if target else None,
+                     "met": meets(ratio, target) if target else None})
+    return rows
+
+
 def verdict(met):
     return "-" if met is None else ("met" if met else "MISSED")
 
@@ -130,6 +175,29 @@ def show_time(row):
     if row["kind"] == "rate":
         return "%9.3f ms" % (row["measured_s"] * 1e3), "%9.3f ms" % (row["floor_s"] * 1e3)
     return "%9.1f us" % (row["measured_s"] * 1e6), "%9.1f us" % (row["floor_s"] * 1e6)
+
+
+def microseconds(seconds):
+    return "-" if seconds is None else "%.1f us" % (seconds * 1e6)
+
+
+def print_javascript(client, skipped, failed, rows):
+    print("\nJavaScript client (%s, JSON.parse), on the same fake server and result files"
+          % (client or "vscode-jsonrpc"))
+    if skipped:
+        print("JavaScript client comparison skipped: %s" % skipped)
+    if failed:
+        print("JavaScript client failed in some runs, left out of its medians: %s" % failed)
+    header = ("figure (median)", "vexil", "JS client", "floor", "ratio", "target", "")
+    print("%-34s %12s %12s %12s %7s %9s %7s" % header)
+    for row in rows:
+        if row.get("missing"):
+            print("%-34s %s" % (row["figure"], "not measured"))
+            continue
+        print("%-34s %12s %12s %12s %7.2f %9s %7s" % (row["figure"], microseconds(row["vexil_s"]),
+                                                      microseconds(row["js_s"]), microseconds(row["floor_s"]),
+                                                      row["ratio"], row["target"] or "-", verdict(row["met"])))
+    print("(vexil: through the connection; floor: the bare round trip, framed by hand and never parsed)")
 
 
 def print_table(ratios, watcher, memory):
@@ -170,12 +238,18 @@ def merged(paths):
 
 def main(path, inputs):
     results = merged(inputs)
-    ratios = ratio_rows(medians(results["benchmarks"]))
+    times = medians(results["benchmarks"])
+    ratios = ratio_rows(times)
     runs = counters(results["benchmarks"])
     watcher = watcher_rows(runs)
     memory = memory_rows(runs)
+    client, skipped, failed = javascript_client(results["benchmarks"], times)
+    javascript = javascript_rows(times, skipped)
     print_table(ratios, watcher, memory)
-    results["figures"] = {"ratios": ratios, "watcher": watcher, "memory": memory}
+    print_javascript(client, skipped, failed, javascript)
+    results["figures"] = {"ratios": ratios, "watcher": watcher, "memory": memory,
+                          "javascript": {"client": client, "skipped": skipped, "failed": failed,
+                                         "rows": javascript}}
     with open(path, "w") as handle:
         json.dump(results, handle, indent=2)
 
