@@ -11,7 +11,6 @@
 #include <chrono>
 #include <fstream>
 #include <map>
-#include <regex>
 #include <sstream>
 #include <string>
 #include <thread>
@@ -164,30 +163,11 @@ P Document(const Project& project, const std::string& file) {
   return params;
 }
 
-// The start lines of the ranges in `json` (a result as JSON text), in order.
-inline std::vector<int> StartLines(const std::string& json) {
-  static const std::regex start(R"("start":\{[^}]*"line":(\d+))");
-  std::vector<int> lines;
-  for (auto match = std::sregex_iterator(json.begin(), json.end(), start); match != std::sregex_iterator(); ++match) {
-    lines.push_back(std::stoi((*match)[1]));
-  }
-  return lines;
-}
-
 // How many of `locations` lie in each file.
 inline std::map<std::string, int> PerFile(const std::vector<LSP::Location>& locations) {
   std::map<std::string, int> count;
   for (const LSP::Location& location : locations) ++count[UriToFile(location.uri.c_str())];
   return count;
-}
-
-// The start lines of the highlights the server gives at `at`, in its order.
-inline std::vector<int> HighlightLines(xLanguageServer& server, LSP::TextDocumentPositionParams at) {
-  std::vector<int> lines;
-  for (const LSP::DocumentHighlight& highlight : server.TextDocument_DocumentHighlight(&at)) {
-    lines.push_back(highlight.range.start.line);
-  }
-  return lines;
 }
 
 inline bool EndsWith(const std::string& text, const std::string& end) {

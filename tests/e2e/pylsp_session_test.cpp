@@ -31,13 +31,10 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   EXPECT_EQ(PerFile(server->TextDocument_References(&call)),
             (std::map<std::string, int>{{Path(project, "geometry.py"), 3}, {Path(project, "main.py"), 2}}));
 
-  // Beyond the typed calls: what pylsp announced, and a request the interface has no call for.
+  // What pylsp announced (its highlights, and a request of any method, are the command-line
+  // test's).
   EXPECT_TRUE(server->ServerCapabilities().documentHighlightProvider);
   EXPECT_EQ(server->ServerCapabilities().documentSync.change, 2);
-  std::string highlights = server->Request("textDocument/documentHighlight", LSP::ToJsonText(call).c_str());
-  EXPECT_EQ(StartLines(highlights), (std::vector<int>{LineOf(project, "main.py", "import"), call.position.line}))
-      << highlights;
-  EXPECT_EQ(HighlightLines(*server, call), StartLines(highlights));
   auto folding = Document<LSP::FoldingRangeParams>(project, "geometry.py");
   std::vector<LSP::FoldingRange> folds = server->TextDocument_FoldingRange(&folding);
   EXPECT_TRUE(std::any_of(folds.begin(), folds.end(), [&](const LSP::FoldingRange& fold) {
