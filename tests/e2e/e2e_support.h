@@ -99,14 +99,14 @@ inline void ExpectHas(const std::string& text, std::initializer_list<std::string
   for (const std::string& piece : pieces) EXPECT_NE(text.find(piece), std::string::npos) << piece << "\n--- in:\n" << text;
 }
 
-// Opens `file` of `project` with `text`, by default what the file holds.
-inline void Open(xLanguageServer& server, const Project& project, const std::string& file, const std::string* text = nullptr) {
+// Opens `file` of `project` with what the file holds.
+inline void Open(xLanguageServer& server, const Project& project, const std::string& file) {
   static const xLanguages languages;
   LSP::DidOpenTextDocumentParams params;
   params.textDocument.uri = Uri(project, file);
   params.textDocument.languageId = languages.LanguageId(file.substr(file.rfind('.') + 1).c_str());
   params.textDocument.version = 1;
-  params.textDocument.text = text ? *text : ReadFile(Path(project, file));
+  params.textDocument.text = ReadFile(Path(project, file));
   server.TextDocument_DidOpen(&params);
 }
 
