@@ -1,6 +1,6 @@
 // The change monitor on real directories, as every backend behaves: file and directory
-// names created, removed and renamed as one read's batch, overflow, refused roots, and
-// destruction while changes flow.
+// names created, removed and renamed as one read's batch, overflow, and destruction while
+// changes flow. Refused roots are the workspace watcher test's, with their trace lines.
 #include "watch/change_monitor.h"
 
 #include <gtest/gtest.h>
@@ -63,16 +63,6 @@ TEST_F(ChangeMonitorTest, OverflowSilencesOnlyThatWatchAndSaysSo) {
   EXPECT_EQ(probe.EventsFor(1), before);
   EXPECT_EQ(probe.WatchErrors(), std::vector<std::int64_t>{1});
   EXPECT_TRUE(probe.ErrorTexts().empty());
-}
-
-TEST_F(ChangeMonitorTest, RefusesARootThatIsAFileOrMissing) {
-  Touch(root / "plain.txt");
-  EXPECT_FALSE(monitor.AddWatch(root / "plain.txt", 1));
-  EXPECT_FALSE(monitor.AddWatch(root / "missing", 2));
-  EXPECT_EQ(probe.ErrorTexts(),
-            (std::vector<std::string>{"Path provided is not a directory: " + (root / "plain.txt") + "\n",
-                                      "Cannot create directory handle: 2\n"}));
-  EXPECT_TRUE(probe.WatchErrors().empty());
 }
 
 TEST(ChangeMonitor, DestroyWhileEventsFlowReturnsAndNoCallbackFollows) {
