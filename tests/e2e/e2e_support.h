@@ -131,22 +131,6 @@ bool Await(Condition condition, int seconds = 60) {
   return true;
 }
 
-// The diagnostics stored for `uri` once there are some (or, unless `any`, none), or the last seen.
-inline std::vector<LSP::Diagnostic> Diagnostics(xLanguageServer& server, const std::string& uri, bool any) {
-  std::vector<LSP::Diagnostic> stored;
-  Await([&] { return (stored = server.TextDocument_Diagnostics(uri.c_str())).empty() != any; });
-  return stored;
-}
-
-// The server publishes one error for `uri`, at `line` and with `message` in its text.
-inline void ExpectOneError(xLanguageServer& server, const std::string& uri, int line, const std::string& message) {
-  std::vector<LSP::Diagnostic> stored = Diagnostics(server, uri, true);
-  ASSERT_EQ(stored.size(), 1u) << uri;
-  EXPECT_EQ(stored[0].range.start.line, line) << uri;
-  EXPECT_EQ(stored[0].severity, 1) << uri;
-  ExpectHas(stored[0].message, {message});
-}
-
 template <typename P = LSP::TextDocumentPositionParams>
 P At(const Project& project, const std::string& file, const LSP::Position& position) {
   P params;
