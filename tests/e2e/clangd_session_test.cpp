@@ -116,8 +116,12 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
 
   // One more use, changed and saved: the answers are about the new text. (A misspelt call's
   // error, its quick fix and the list emptied once fixed are the command-line test's.)
-  const std::string text = ReadFile(Path(project, "main.cpp"));
-  Change(*server, Uri(project, "main.cpp"), 2, text + "int twice() { return shapes::Clamp(2, 0, 9); }\n");
+  LSP::DidChangeTextDocumentParams edited;
+  edited.textDocument = LSP::VersionedTextDocumentIdentifier(Uri(project, "main.cpp"), 2);
+  edited.contentChanges.emplace_back();
+  edited.contentChanges.back().text =
+      ReadFile(Path(project, "main.cpp")) + "int twice() { return shapes::Clamp(2, 0, 9); }\n";
+  server->TextDocument_DidChange(&edited);
   auto save = Document<LSP::DidSaveTextDocumentParams>(project, "main.cpp");
   server->TextDocument_DidSave(&save);
   EXPECT_TRUE(Await([&] { return server->TextDocument_References(&at).size() == 6; }));

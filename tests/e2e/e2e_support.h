@@ -110,15 +110,6 @@ inline void Open(xLanguageServer& server, const Project& project, const std::str
   server.TextDocument_DidOpen(&params);
 }
 
-// Replaces the whole text of an open document.
-inline void Change(xLanguageServer& server, const std::string& uri, int version, const std::string& text) {
-  LSP::DidChangeTextDocumentParams change;
-  change.textDocument = LSP::VersionedTextDocumentIdentifier(uri, version);
-  change.contentChanges.emplace_back();
-  change.contentChanges.back().text = text;
-  server.TextDocument_DidChange(&change);
-}
-
 // Polls `condition` until it holds or `seconds` pass (real servers on a loaded machine are
 // slow); says whether it held.
 template <typename Condition>
