@@ -29,17 +29,17 @@ TEST_F(ChangeMonitorTest, ChangesOfOneReadAreOneBatchAndEachRenameABatchOfItsOwn
   for (int i = 0; i < 10; ++i) fs::rename(root / ("f" + std::to_string(i)), root / ("g" + std::to_string(9 - i)));
   gate.Release();
   const std::vector<Change> together = {{"a.txt", kAdded}, {"a.txt", kRemoved}, {DirectoryName("sub"), kAdded}};
-  ASSERT_TRUE(probe.WaitForAll(7, together));
+  ASSERT_TRUE(probe.WaitFor(7, together));
   EXPECT_TRUE(probe.SawInOneBatch(7, together));
   for (int i = 0; i < 10; ++i) {
     const std::string from = "f" + std::to_string(i), to = "g" + std::to_string(9 - i);
-    ASSERT_TRUE(probe.WaitFor(7, {to, kNew}));
+    ASSERT_TRUE(probe.WaitFor(7, {{to, kNew}}));
     EXPECT_TRUE(probe.SawBatch(7, {{from, kOld}, {to, kNew}})) << from;
   }
 
   // Names below the root are relative to it, with the platform's separator.
   Touch(root / "sub/inner.txt");
-  EXPECT_TRUE(probe.WaitFor(7, {DirectoryName("sub") + "inner.txt", kAdded}));
+  EXPECT_TRUE(probe.WaitFor(7, {{DirectoryName("sub") + "inner.txt", kAdded}}));
   EXPECT_EQ(monitor.ErrorText(), "");
   EXPECT_TRUE(probe.ErrorTexts().empty());
   EXPECT_TRUE(probe.WatchErrors().empty());
