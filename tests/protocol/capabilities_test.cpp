@@ -1,5 +1,6 @@
 // The client capability tree: value lists that are left out only when emptied, and opt-in
-// additions merged over it in place. The whole default tree is the initialize test's golden text.
+// additions merged over it in place. The whole default tree is in the initialize request's
+// golden text.
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
