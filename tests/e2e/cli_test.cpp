@@ -68,7 +68,8 @@ TEST(CommandLine, LspPrintsEachAnswerInItsPlaceForPeople) {
        "\n  10:1-16:2: int main() { ...\nsemantic-tokens shapes.h\n",
        "\n  28:5 function [declaration, globalScope]: Clamp\n",
        "call-hierarchy shapes.cpp:17:5\n  function Clamp  shapes.cpp:17:5\n    called from:\n"
-       "      method Scale  shapes.cpp:13:12  (2 calls)\n      function main  main.cpp:15:18\n"});
+       "      method Scale  shapes.cpp:13:12  (2 calls)\n",
+       "\n      function main  main.cpp:15:18\n"});
   // Files are found below --root, whatever the current directory.
   Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22 --folding geometry.py --highlight main.py:12:7");
   EXPECT_EQ(python.status, 0) << python.err;
