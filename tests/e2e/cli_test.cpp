@@ -56,16 +56,20 @@ TEST(CommandLine, LspPrintsEachAnswerInItsPlaceForPeople) {
                      R"(--selection-range main.cpp:15:18 --semantic-tokens shapes.h --call-hierarchy shapes.cpp:17:5)");
   EXPECT_EQ(run.status, 0) << run.err;
   EXPECT_EQ(run.out.rfind("capabilities\n", 0), 0u) << run.out;
-  e2e::ExpectHas(run.out, {"\n  documentHighlightProvider\n", "\n  textDocumentSync: incremental changes, open and close, save\n",
-                      "request textDocument/documentHighlight\n  [{", R"("start":{"character":17,"line":14}})",
-                      "definition main.cpp:15:18\n  shapes.h:28:5: int Clamp(int value, int low, int high);\n",
-                      "\n  Scale(int factor)  : void\n",
-                      "highlight main.cpp:11:22\n  main.cpp:11:21: text: shapes::Rectangle rectangle(3, 4);\n  main.cpp:12:10: text: ",
-                      "prepare-rename main.cpp:15:18\n  15:18-15:23: Clamp\n",
-                      "selection-range main.cpp:15:18\n  15:10-15:23: shapes::Clamp\n",
-                      "\n  28:5 function [declaration, globalScope]: Clamp\n",
-                      "call-hierarchy shapes.cpp:17:5\n  function Clamp  shapes.cpp:17:5\n    called from:\n"
-                      "      method Scale  shapes.cpp:13:12  (2 calls)\n"});
+  e2e::ExpectHas(
+      run.out,
+      {"\n  documentHighlightProvider\n", "\n  textDocumentSync: incremental changes, open and close, save\n",
+       "request textDocument/documentHighlight\n  [{", R"("start":{"character":17,"line":14}})",
+       "definition main.cpp:15:18\n  shapes.h:28:5: int Clamp(int value, int low, int high);\n",
+       "\n  Area() const  : int\n", "\n  Perimeter() const  : int\n", "\n  Scale(int factor)  : void\n",
+       "highlight main.cpp:11:22\n  main.cpp:11:21: text: shapes::Rectangle rectangle(3, 4);\n  main.cpp:12:10: text: ",
+       "prepare-rename main.cpp:15:18\n  15:18-15:23: Clamp\n",
+       "selection-range main.cpp:15:18\n  15:10-15:23: shapes::Clamp\n",
+       "\n  10:1-16:2: int main() { ...\nsemantic-tokens shapes.h\n",
+       "\n  28:5 function [declaration, globalScope]: Clamp\n",
+       "call-hierarchy shapes.cpp:17:5\n  function Clamp  shapes.cpp:17:5\n    called from:\n"
+       "      method Scale  shapes.cpp:13:12  (2 calls)\n",
+       "\n      function main  main.cpp:15:18\n"});
   // Files are found below --root, whatever the current directory.
   Result python = Vexil("lsp --root=../python -- pylsp --hover=main.py:2:22 --folding geometry.py --highlight main.py:12:7");
   EXPECT_EQ(python.status, 0) << python.err;

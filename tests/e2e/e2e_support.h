@@ -11,7 +11,6 @@
 #include <chrono>
 #include <fstream>
 #include <map>
-#include <regex>
 #include <sstream>
 #include <string>
 #include <thread>
@@ -100,24 +99,15 @@ inline void ExpectHas(const std::string& text, std::initializer_list<std::string
   for (const std::string& piece : pieces) EXPECT_NE(text.find(piece), std::string::npos) << piece << "\n--- in:\n" << text;
 }
 
-// Opens `file` of `project` with `text`, by default what the file holds.
-inline void Open(xLanguageServer& server, const Project& project, const std::string& file, const std::string* text = nullptr) {
+// Opens `file` of `project` with what the file holds.
+inline void Open(xLanguageServer& server, const Project& project, const std::string& file) {
   static const xLanguages languages;
   LSP::DidOpenTextDocumentParams params;
   params.textDocument.uri = Uri(project, file);
   params.textDocument.languageId = languages.LanguageId(file.substr(file.rfind('.') + 1).c_str());
   params.textDocument.version = 1;
-  params.textDocument.text = text ? *text : ReadFile(Path(project, file));
+  params.textDocument.text = ReadFile(Path(project, file));
   server.TextDocument_DidOpen(&params);
-}
-
-// Replaces the whole text of an open document.
-inline void Change(xLanguageServer& server, const std::string& uri, int version, const std::string& text) {
-  LSP::DidChangeTextDocumentParams change;
-  change.textDocument = LSP::VersionedTextDocumentIdentifier(uri, version);
-  change.contentChanges.emplace_back();
-  change.contentChanges.back().text = text;
-  server.TextDocument_DidChange(&change);
 }
 
 // Polls `condition` until it holds or `seconds` pass (real servers on a loaded machine are
@@ -130,22 +120,6 @@ bool Await(Condition condition, int seconds = 60) {
     std::this_thread::sleep_for(std::chrono::milliseconds(20));
   }
   return true;
-}
-
-// The diagnostics stored for `uri` once there are some (or, unless `any`, none), or the last seen.
-inline std::vector<LSP::Diagnostic> Diagnostics(xLanguageServer& server, const std::string& uri, bool any) {
-  std::vector<LSP::Diagnostic> stored;
-  Await([&] { return (stored = server.TextDocument_Diagnostics(uri.c_str())).empty() != any; });
-  return stored;
-}
-
-// The server publishes one error for `uri`, at `line` and with `message` in its text.
-inline void ExpectOneError(xLanguageServer& server, const std::string& uri, int line, const std::string& message) {
-  std::vector<LSP::Diagnostic> stored = Diagnostics(server, uri, true);
-  ASSERT_EQ(stored.size(), 1u) << uri;
-  EXPECT_EQ(stored[0].range.start.line, line) << uri;
-  EXPECT_EQ(stored[0].severity, 1) << uri;
-  ExpectHas(stored[0].message, {message});
 }
 
 template <typename P = LSP::TextDocumentPositionParams>
@@ -164,30 +138,11 @@ P Document(const Project& project, const std::string& file) {
   return params;
 }
 
-// The start lines of the ranges in `json` (a result as JSON text), in order.
-inline std::vector<int> StartLines(const std::string& json) {
-  static const std::regex start(R"("start":\{[^}]*"line":(\d+))");
-  std::vector<int> lines;
-  for (auto match = std::sregex_iterator(json.begin(), json.end(), start); match != std::sregex_iterator(); ++match) {
-    lines.push_back(std::stoi((*match)[1]));
-  }
-  return lines;
-}
-
 // How many of `locations` lie in each file.
 inline std::map<std::string, int> PerFile(const std::vector<LSP::Location>& locations) {
   std::map<std::string, int> count;
   for (const LSP::Location& location : locations) ++count[UriToFile(location.uri.c_str())];
   return count;
-}
-
-// The start lines of the highlights the server gives at `at`, in its order.
-inline std::vector<int> HighlightLines(xLanguageServer& server, LSP::TextDocumentPositionParams at) {
-  std::vector<int> lines;
-  for (const LSP::DocumentHighlight& highlight : server.TextDocument_DocumentHighlight(&at)) {
-    lines.push_back(highlight.range.start.line);
-  }
-  return lines;
 }
 
 inline bool EndsWith(const std::string& text, const std::string& end) {

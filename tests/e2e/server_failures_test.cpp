@@ -46,7 +46,8 @@ TEST(ServerFailures, ServersAnswerForTheirOwnProjectsThroughAMissingCommandARest
     ASSERT_TRUE(pylsp->Start(InitRecord(python)));
     Open(*pylsp, python, "main.py");
     ExpectHas(HoverText(*clangd, cpp, "main.cpp", "shapes::Clamp(", 8), {"int Clamp(int value, int low, int high)"});
-    ExpectHas(HoverText(*pylsp, python, "main.py", "print(clamp(", 6), {"clamp(value, low, high)"});
+    ExpectHas(HoverText(*pylsp, python, "main.py", "print(clamp(", 6),
+              {"clamp(value, low, high)", "Limit value to the range from low to high."});
     EXPECT_TRUE(pylsp->Shutdown());
     EXPECT_TRUE(Exits(*pylsp));
     EXPECT_EQ(Vexil_Have("both-pylsp"), nullptr);

@@ -22,15 +22,15 @@ TEST_F(ChangeMonitorTest, RenamedDirectoriesStayWatchedAndARenameAcrossThemIsOne
   ASSERT_TRUE(Watch(7));
 
   fs::rename(root / "sub/from/f", root / "to/g");
-  ASSERT_TRUE(probe.WaitForAll(7, {{"sub/from/f", kOld}, {"to/g", kNew}}));
+  ASSERT_TRUE(probe.WaitFor(7, {{"sub/from/f", kOld}, {"to/g", kNew}}));
   EXPECT_TRUE(probe.SawBatch(7, {{"sub/from/f", kOld}, {"to/g", kNew}}));
   // A renamed directory keeps being watched under its new name.
   fs::rename(root / "sub", root / "moved");
-  EXPECT_TRUE(probe.WaitForAll(7, {{"sub/", kOld}, {"moved/", kNew}}));
+  EXPECT_TRUE(probe.WaitFor(7, {{"sub/", kOld}, {"moved/", kNew}}));
   Touch(root / "moved/inner.txt");
-  EXPECT_TRUE(probe.WaitFor(7, {"moved/inner.txt", kAdded}));
+  EXPECT_TRUE(probe.WaitFor(7, {{"moved/inner.txt", kAdded}}));
   fs::remove_all(root / "moved");
-  EXPECT_TRUE(probe.WaitForAll(7, {{"moved/inner.txt", kRemoved}, {"moved/from/", kRemoved}, {"moved/", kRemoved}}));
+  EXPECT_TRUE(probe.WaitFor(7, {{"moved/inner.txt", kRemoved}, {"moved/from/", kRemoved}, {"moved/", kRemoved}}));
   EXPECT_TRUE(probe.ErrorTexts().empty());
 }
 
@@ -87,11 +87,11 @@ TEST(ChangeMonitor, DirectoriesPublishedInABurstAreAllWatched) {
     for (int i = 0; i < 30; ++i) published.push_back(publish(root, std::to_string(i)));
     // Whenever the monitor got to them, each is watched under its final name.
     Touch(root / (existing + "later"));
-    EXPECT_TRUE(probe.WaitFor(1, {existing + "later", kAdded})) << pattern;
+    EXPECT_TRUE(probe.WaitFor(1, {{existing + "later", kAdded}})) << pattern;
     for (const Published& one : published) Touch(root / (one.directory + "later"));
     for (const Published& one : published) {
-      EXPECT_TRUE(probe.WaitForAll(1, one.expected)) << pattern << ": " << one.directory;
-      EXPECT_TRUE(probe.WaitFor(1, {one.directory + "later", kAdded})) << pattern << ": " << one.directory;
+      EXPECT_TRUE(probe.WaitFor(1, one.expected)) << pattern << ": " << one.directory;
+      EXPECT_TRUE(probe.WaitFor(1, {{one.directory + "later", kAdded}})) << pattern << ": " << one.directory;
     }
     EXPECT_TRUE(probe.ErrorTexts().empty()) << pattern;
   }
@@ -113,13 +113,13 @@ TEST_F(ChangeMonitorTest, ContentChangesAndTheRootOnlyForWatchesThatAsk) {
   std::ofstream(root / "tmp/saved.txt") << "new";
   fs::rename(root / "tmp/saved.txt", root / "saved.txt");
   Touch(root / "sub/deeper.txt");
-  EXPECT_TRUE(probe.WaitForAll(1, {{"written.txt", kAdded}, {"written.txt", kModified}, {"saved.txt", kModified}}));
-  EXPECT_TRUE(probe.WaitForAll(2, {{"sub/deeper.txt", kAdded}, {"tmp/saved.txt", kOld}, {"saved.txt", kNew}}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"written.txt", kAdded}, {"written.txt", kModified}, {"saved.txt", kModified}}));
+  EXPECT_TRUE(probe.WaitFor(2, {{"sub/deeper.txt", kAdded}, {"tmp/saved.txt", kOld}, {"saved.txt", kNew}}));
   Fence(probe, fence, 3, "fence");
-  EXPECT_FALSE(probe.Saw(1, {"sub/deeper.txt", kAdded}));
-  EXPECT_FALSE(probe.Saw(1, {"tmp/saved.txt", kModified}));
-  EXPECT_FALSE(probe.Saw(2, {"written.txt", kModified}));
-  EXPECT_FALSE(probe.Saw(2, {"saved.txt", kModified}));
+  EXPECT_FALSE(probe.SawInOneBatch(1, {{"sub/deeper.txt", kAdded}}));
+  EXPECT_FALSE(probe.SawInOneBatch(1, {{"tmp/saved.txt", kModified}}));
+  EXPECT_FALSE(probe.SawInOneBatch(2, {{"written.txt", kModified}}));
+  EXPECT_FALSE(probe.SawInOneBatch(2, {{"saved.txt", kModified}}));
 }
 
 TEST_F(ChangeMonitorTest, MovesIntoAndOutOfTheTreeAreAdditionsAndRemovals) {
@@ -132,21 +132,20 @@ TEST_F(ChangeMonitorTest, MovesIntoAndOutOfTheTreeAreAdditionsAndRemovals) {
 
   fs::rename(outside / "loose.txt", root / "loose.txt");
   fs::rename(outside / "incoming", root / "incoming");
-  EXPECT_TRUE(probe.WaitForAll(1, {{"loose.txt", kAdded},
-                                   {"incoming/", kAdded},
-                                   {"incoming/deep/", kAdded},
-                                   {"incoming/deep/old.txt", kAdded}}));
+  EXPECT_TRUE(probe.WaitFor(
+      1,
+      {{"loose.txt", kAdded}, {"incoming/", kAdded}, {"incoming/deep/", kAdded}, {"incoming/deep/old.txt", kAdded}}));
   Touch(root / "incoming/deep/new.txt");
-  EXPECT_TRUE(probe.WaitFor(1, {"incoming/deep/new.txt", kAdded}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"incoming/deep/new.txt", kAdded}}));
 
   fs::rename(root / "incoming", outside / "gone");
   fs::rename(root / "loose.txt", outside / "loose.txt");
-  EXPECT_TRUE(probe.WaitForAll(1, {{"incoming/", kRemoved}, {"loose.txt", kRemoved}}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"incoming/", kRemoved}, {"loose.txt", kRemoved}}));
 
   // What moved out is no longer watched.
   Touch(outside / "gone/deep/after.txt");
   Fence(probe, fence, 2, "fence");
-  EXPECT_FALSE(probe.Saw(1, {"incoming/deep/after.txt", kAdded}));
+  EXPECT_FALSE(probe.SawInOneBatch(1, {{"incoming/deep/after.txt", kAdded}}));
 }
 
 TEST_F(ChangeMonitorTest, RootThatDisappearsEndsItsWatchOnly) {
@@ -158,13 +157,13 @@ TEST_F(ChangeMonitorTest, RootThatDisappearsEndsItsWatchOnly) {
 
   fs::remove_all(first);
   ASSERT_TRUE(probe.WaitForWatchError(1));
-  EXPECT_TRUE(probe.Saw(1, {"sub/", kRemoved}));
+  EXPECT_TRUE(probe.SawInOneBatch(1, {{"sub/", kRemoved}}));
 
   // A new directory under the old name is not the watched one.
   fs::create_directories(first);
   Touch(first + "/again");
   Fence(probe, fence, 2, "fence");
-  EXPECT_FALSE(probe.Saw(1, {"again", kAdded}));
+  EXPECT_FALSE(probe.SawInOneBatch(1, {{"again", kAdded}}));
   EXPECT_EQ(probe.WatchErrors(), std::vector<std::int64_t>{1});
 
   // Moving a root away ends its watch the same way.
@@ -193,12 +192,12 @@ TEST_F(ChangeMonitorTest, OverlappingRootsShareDirectoriesAndRemovalKeepsTheOthe
   ASSERT_TRUE(monitor.AddWatch(fence.Path().string(), 3));
 
   Touch(root / "sub/deeper/f");
-  EXPECT_TRUE(probe.WaitFor(1, {"sub/deeper/f", kAdded}));
-  EXPECT_TRUE(probe.WaitFor(2, {"deeper/f", kAdded}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"sub/deeper/f", kAdded}}));
+  EXPECT_TRUE(probe.WaitFor(2, {{"deeper/f", kAdded}}));
 
   fs::rename(root / "sub/deeper/f", root / "sub/g");
-  EXPECT_TRUE(probe.WaitForAll(1, {{"sub/deeper/f", kOld}, {"sub/g", kNew}}));
-  EXPECT_TRUE(probe.WaitForAll(2, {{"deeper/f", kOld}, {"g", kNew}}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"sub/deeper/f", kOld}, {"sub/g", kNew}}));
+  EXPECT_TRUE(probe.WaitFor(2, {{"deeper/f", kOld}, {"g", kNew}}));
 
   // Into the inner root from the outer one: a rename for one, an arrival for the other.
   // The worker, woken by the new file, is held while it moves: both halves of the move
@@ -206,17 +205,17 @@ TEST_F(ChangeMonitorTest, OverlappingRootsShareDirectoriesAndRemovalKeepsTheOthe
   ASSERT_NO_FATAL_FAILURE(gate.HoldOn(root / "top"));
   fs::rename(root / "top", root / "sub/top");
   gate.Release();
-  EXPECT_TRUE(probe.WaitForAll(1, {{"top", kOld}, {"sub/top", kNew}}));
-  EXPECT_TRUE(probe.WaitFor(2, {"top", kAdded}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"top", kOld}, {"sub/top", kNew}}));
+  EXPECT_TRUE(probe.WaitFor(2, {{"top", kAdded}}));
 
   fs::create_directories(root / "sub/fresh/x");
-  EXPECT_TRUE(probe.WaitForAll(1, {{"sub/fresh/", kAdded}, {"sub/fresh/x/", kAdded}}));
-  EXPECT_TRUE(probe.WaitForAll(2, {{"fresh/", kAdded}, {"fresh/x/", kAdded}}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"sub/fresh/", kAdded}, {"sub/fresh/x/", kAdded}}));
+  EXPECT_TRUE(probe.WaitFor(2, {{"fresh/", kAdded}, {"fresh/x/", kAdded}}));
 
   monitor.RemoveWatch(2);
   const std::size_t before = probe.EventsFor(2);
   Touch(root / "sub/fresh/x/h");
-  EXPECT_TRUE(probe.WaitFor(1, {"sub/fresh/x/h", kAdded}));
+  EXPECT_TRUE(probe.WaitFor(1, {{"sub/fresh/x/h", kAdded}}));
   Fence(probe, fence, 3, "fence");
   EXPECT_EQ(probe.EventsFor(2), before);
 }

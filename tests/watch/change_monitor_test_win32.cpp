@@ -25,13 +25,13 @@ TEST_F(ChangeMonitorTest, DirectoriesThatStillExistEndInABackslash) {
   ASSERT_TRUE(monitor.AddWatch(root.Path().string() + "\\", 2));
 
   fs::rename(root / "old", root / "new");
-  ASSERT_TRUE(probe.WaitFor(2, {"new\\", kNew}));
+  ASSERT_TRUE(probe.WaitFor(2, {{"new\\", kNew}}));
   fs::create_directories(root / "sub\\deeper");
-  ASSERT_TRUE(probe.WaitFor(2, {"sub\\deeper\\", kAdded}));
+  ASSERT_TRUE(probe.WaitFor(2, {{"sub\\deeper\\", kAdded}}));
   fs::remove(root / "sub\\deeper");
   if (HasExtendedRead()) return;  // the record itself says what the entry was
-  EXPECT_TRUE(probe.WaitFor(2, {"sub\\deeper", kRemoved}));
-  EXPECT_TRUE(probe.Saw(2, {"old", kOld}));
+  EXPECT_TRUE(probe.WaitFor(2, {{"sub\\deeper", kRemoved}}));
+  EXPECT_TRUE(probe.SawInOneBatch(2, {{"old", kOld}}));
 }
 
 }  // namespace

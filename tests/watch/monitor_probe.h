@@ -41,10 +41,8 @@ class Probe {
             [this](const std::string& text) { shared_.Update([&] { errorTexts_.push_back(text); }); }};
   }
 
-  bool WaitFor(std::int64_t id, const Change& change) {
-    return shared_.WaitUntil([&] { return SawLocked(id, change); });
-  }
-  bool WaitForAll(std::int64_t id, const std::vector<Change>& changes) {
+  // Until every one of `changes` arrived for `id`, in whichever batches.
+  bool WaitFor(std::int64_t id, const std::vector<Change>& changes) {
     return shared_.WaitUntil([&] {
       return std::all_of(changes.begin(), changes.end(), [&](const Change& change) { return SawLocked(id, change); });
     });
@@ -56,10 +54,7 @@ class Probe {
   bool WaitUntilSettled(std::int64_t id, std::size_t count) {
     return shared_.WaitUntil([&] { return FailedLocked(id) || NamesLocked(id).size() >= count; });
   }
-  bool Saw(std::int64_t id, const Change& change) {
-    return shared_.Read([&] { return SawLocked(id, change); });
-  }
-  // Did one batch carry all of `changes`?
+  // Did one batch carry all of `changes` (or, for one change, any batch)?
   bool SawInOneBatch(std::int64_t id, const std::vector<Change>& changes) {
     return shared_.Read([&] {
       return std::any_of(batches_.begin(), batches_.end(), [&](const auto& entry) {
@@ -169,7 +164,7 @@ std::size_t OverflowingBurst();
 // watches were going to report has been reported too.
 inline void Fence(Probe& probe, const TempDir& fenceRoot, std::int64_t fenceId, const std::string& name) {
   Touch(fenceRoot / name);
-  ASSERT_TRUE(probe.WaitFor(fenceId, {name, kAdded})) << name;
+  ASSERT_TRUE(probe.WaitFor(fenceId, {{name, kAdded}})) << name;
 }
 
 }  // namespace watchtest
