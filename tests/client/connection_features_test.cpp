@@ -1,5 +1,6 @@
-// The seventeen calls against the fake server: each method on the wire, empty results for
-// null, error and dead-server replies, the references context, and symbols without a URI.
+// The calls against the fake server: each method on the wire, empty results for null, error
+// and dead-server replies, the references context, symbols without a URI, and diagnostics
+// published and pulled (the slots hosts call them through: connection_slots_test).
 #include <gtest/gtest.h>
 
 #include <chrono>
@@ -145,13 +146,15 @@ TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
 }
 
 // Servers match quick fixes to the diagnostics they published, and resolve completion items
-// by their "data": both go back as the server sent them. A pull the server answers with
-// "unchanged" gives the published list.
+// by their "data": both go back as the server sent them. A pull asks only a server that
+// provides diagnostics, whose "unchanged" gives the published list, as does one that does
+// not; a publication without errors empties the list.
 TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
-  for (bool resolves : {true, false}) {
-    SCOPED_TRACE(resolves ? "resolve provider" : "no resolve provider");
-    const std::string capabilities = R"({"diagnosticProvider":{},"completionProvider":{"resolveProvider":)" +
-                                     std::string(resolves ? "true" : "false") + "}}";
+  for (bool provides : {true, false}) {
+    SCOPED_TRACE(provides ? "diagnostic and resolve providers" : "neither provider");
+    const std::string capabilities = std::string(provides ? R"({"diagnosticProvider":{},)" : "{") +
+                                     R"("completionProvider":{"resolveProvider":)" + (provides ? "true" : "false") +
+                                     "}}";
     xLanguageServer* server = Started(
         {"diagnose", "result=initialize:{\"capabilities\": " + capabilities + "}",
          R"(result=textDocument/diagnostic:{"kind": "unchanged","resultId":"r1"})",
@@ -164,7 +167,9 @@ TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
     LSP::TextDocumentIdentifier document;
     document.uri = kUri;
     EXPECT_EQ(server->TextDocument_PullDiagnostics(&document).size(), 2u);
-    EXPECT_NE(SentBody("textDocument/diagnostic"), "");
+    EXPECT_EQ(SentBody("textDocument/diagnostic") != "", provides);
+    EXPECT_TRUE(server->TextDocument_Diagnostics(nullptr).empty());
+    EXPECT_TRUE(server->TextDocument_PullDiagnostics(nullptr).empty());
 
     LSP::CodeActionParams actions;
     actions.textDocument.uri = kUri;
@@ -186,9 +191,12 @@ TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
     std::vector<LSP::CompletionItem> items = server->TextDocument_Completion(&completion).items;
     ASSERT_EQ(items.size(), 1u);
     EXPECT_EQ(server->CompletionItem_Resolve(&items[0]).detail, "int clamp(int)");
-    EXPECT_NE(SentBody("completionItem/resolve").find(resolves ? R"("params":{"label":"clamp","data":{"id":7}}})"
-                                                               : R"("params":{"label":"clamp"}})"),
+    EXPECT_NE(SentBody("completionItem/resolve")
+                  .find(provides ? R"("params":{"label":"clamp","data":{"id":7}}})" : R"("params":{"label":"clamp"}})"),
               std::string::npos);
+    auto fixed = Changed(kUri, "ok\n");
+    server->TextDocument_DidChange(&fixed);
+    EXPECT_TRUE(transport_test::WaitFor([&] { return server->TextDocument_Diagnostics(kUri).empty(); }));
     Dispose(kName);
   }
   // Host-given JSON text that is not JSON is refused before anything is sent.
@@ -220,6 +228,32 @@ TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {
   EXPECT_EQ(symbols[0].location.range.start.line, 16);
 }
 
+// A full report pulled is stored, and its id goes back with the next pull.
+TEST_F(ConnectionFeatures, PullingStoresAFullReportAndSendsItsIdBack) {
+  xLanguageServer* server = Started(
+      {R"(result=initialize:{"capabilities": {"diagnosticProvider":{"interFileDependencies":false,"workspaceDiagnostics":false}}})",
+       R"(result=textDocument/diagnostic:{"kind": "full","resultId":"r7","items":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":3}},"severity":2,"code":12,"source":"json","message":"Trailing comma"}]})"});
+  LSP::TextDocumentIdentifier document;
+  document.uri = kUri;
+  int before = server->DiagnosticsVersion();
+
+  auto pulled = server->TextDocument_PullDiagnostics(&document);
+  ASSERT_EQ(pulled.size(), 1u);
+  EXPECT_EQ(pulled[0].message, "Trailing comma");
+  EXPECT_EQ(pulled[0].range.start.line, 4);
+  EXPECT_EQ(pulled[0].code, 12);
+  EXPECT_EQ(pulled[0].codeText, "12");
+  EXPECT_NE(SentBody("textDocument/diagnostic")
+                .find(R"("method":"textDocument/diagnostic","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})"),
+            std::string::npos);
+  EXPECT_NE(server->DiagnosticsVersion(), before);
+  EXPECT_EQ(server->TextDocument_Diagnostics(kUri).size(), 1u);
+
+  TraceLog::Clear();
+  server->TextDocument_PullDiagnostics(&document);
+  EXPECT_NE(SentBody("textDocument/diagnostic").find(R"("previousResultId":"r7")"), std::string::npos);
+}
+
 // Requests and notifications of any method, with params as JSON text, and every way one
 // fails; typed requests after them, refused and to a dead server.
 TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailureThenTypedFailures) {
@@ -231,7 +265,6 @@ TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailureThenTypedFailur
     const char* error;     // ErrorMessage() afterwards
     bool notify = false;
   };
-  const std::string refused = "Invalid JSON for fake/echo: ";
   const Row rows[] = {
       {"fake/echo", R"( {"a": [1, "x"], "b":{}} )",
        R"({"method":"fake/echo","answers":[],"received":["{\"jsonrpc\":\"2.0\",\"method\":\"initialized\",\"params\":{}}"]})",
