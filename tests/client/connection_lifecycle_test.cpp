@@ -43,67 +43,54 @@ class ConnectionLifecycle : public ::testing::Test {
     init.workspaceFolders.emplace_back("file:///work/root%20dir", "root dir");
     return init;
   }
+
+  // The next request is answered at once: no earlier wait is left to make it suffer.
+  static void ExpectAnswered(xLanguageServer* server) {
+    LSP::TextDocumentPositionParams params;
+    server->TextDocument_Hover(&params);
+    EXPECT_FALSE(server->HaveErrors());
+    EXPECT_FALSE(TraceLog::Contains("Timed out"));
+  }
 };
 
-TEST_F(ConnectionLifecycle, StartInitializesOnceAndAnnouncesIt) {
-  // The server asks for the folders while it initializes: it gets those of initialize.
-  xLanguageServer* server = Connection({"ask=workspace/workspaceFolders"}, 2000, LSP::TraceLevel::Verbose);
-  ASSERT_TRUE(server->Start(Init()));
-  EXPECT_TRUE(TraceLog::Contains(R"({"jsonrpc":"2.0","id":0,"result":[{"uri":"file:///work/root%20dir","name":"root dir"}]})"));
-  Texts verbose = TraceLog::Texts("Verbose");
-  auto processLine = std::find(verbose.begin(), verbose.end(), "Process Id: 42\n");
-  ASSERT_NE(processLine, verbose.end());
-  EXPECT_EQ(*(processLine + 1), " Root Path: /work/root dir\n");
-  EXPECT_EQ(*(processLine + 2), "   Options: {\"initializationOptions\":{\"style\":\"tabs\"}}\n");
-
-  Texts bodies = SentBodies();
-  ASSERT_EQ(bodies.size(), 3u);  // with the answer to the server's request, in either order
-  const std::string& initialize = bodies[0];
-  EXPECT_NE(initialize.find(R"("method":"initialize","params":{"processId":42,"rootUri":"file:///work/root%20dir",)"
-                            R"("initializationOptions":{"style":"tabs"},"capabilities":)"),
-            std::string::npos)
-      << initialize;
-  EXPECT_NE(initialize.find(R"("trace":"verbose","workspaceFolders":[{"uri":"file:///work/root%20dir","name":"root dir"}]}})"),
-            std::string::npos)
-      << initialize;
-  EXPECT_EQ(SentBody("initialized"), R"({"jsonrpc":"2.0","method":"initialized","params":{}})");
-
-  // Initialized already: neither a second Start nor Initialize writes anything.
-  TraceLog::Clear();
-  EXPECT_TRUE(server->Start(Init()));
-  EXPECT_TRUE(server->Initialize(Init()));
-  EXPECT_TRUE(TraceLog::Lines().empty());
-}
-
 // What each opt-in changes of the initialize request: nothing, unless it enables client
-// capabilities. The request is otherwise the model's, byte for byte, at the messages level.
+// capabilities. The request is otherwise the model's, byte for byte; the start-up details
+// are traced at the verbose level only; a server that asks for the folders while it
+// initializes gets those of initialize; once initialized, neither Start nor Initialize
+// writes anything.
 TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
   struct Row {
     std::vector<const char*> features;
     std::vector<std::pair<std::string, std::string>> changes;  // on the expected text
+    LSP::TraceLevel level = LSP::TraceLevel::Messages;
   };
   const std::string treeEnd = R"("diagnostic":{"dynamicRegistration":false}})";
   const std::string features = vexil_test::ReadDataFile("feature_capabilities.json");
   const Row rows[] = {
       {{}, {}},
+      {{}, {{R"("trace":"messages")", R"("trace":"verbose")"}}, LSP::TraceLevel::Verbose},
       {{"messages", "unknown"}, {}},
       {{"progress"}, {{treeEnd + "}", treeEnd + R"(,"window":{"workDoneProgress":true}})"}}},
       {{"configuration", "configuration"}, {{R"("configuration":false)", R"("configuration":true)"}}},
       {{"features"},
-       {{R"("applyEdit":false,"workspaceEdit":{"documentChanges":false)", R"("applyEdit":true,"workspaceEdit":{"documentChanges":true)"},
+       {{R"("applyEdit":false,"workspaceEdit":{"documentChanges":false)",
+         R"("applyEdit":true,"workspaceEdit":{"documentChanges":true)"},
         {R"("willSave":false)", R"("willSave":true)"},
         {R"("codeAction":{"dynamicRegistration":false})",
-         R"("codeAction":{"dynamicRegistration":false,)" + features.substr(features.find(R"("codeActionLiteralSupport")"),
-                                                                           features.find(R"(,"rename")") - features.find(R"("codeActionLiteralSupport")"))},
-        {R"("rename":{"dynamicRegistration":false})", R"("rename":{"dynamicRegistration":false,"prepareSupport":true})"},
-        {treeEnd + "}", treeEnd.substr(0, treeEnd.size() - 1) + features.substr(features.find(R"(,"semanticTokens")"))}}},
+         R"("codeAction":{"dynamicRegistration":false,)" +
+             features.substr(features.find(R"("codeActionLiteralSupport")"),
+                             features.find(R"(,"rename")") - features.find(R"("codeActionLiteralSupport")"))},
+        {R"("rename":{"dynamicRegistration":false})",
+         R"("rename":{"dynamicRegistration":false,"prepareSupport":true})"},
+        {treeEnd + "}",
+         treeEnd.substr(0, treeEnd.size() - 1) + features.substr(features.find(R"(,"semanticTokens")"))}}},
       {{"positionEncoding"}, {{treeEnd + "}", treeEnd + R"(,"general":{"positionEncodings":["utf-8","utf-16"]}})"}}},
       {{"watchedFiles"},
        {{R"("didChangeWatchedFiles":{"dynamicRegistration":false})",
          R"("didChangeWatchedFiles":{"dynamicRegistration":true,"relativePatternSupport":true})"}}},
   };
   for (const Row& row : rows) {
-    xLanguageServer* server = Connection();
+    xLanguageServer* server = Connection({"ask=workspace/workspaceFolders"}, 2000, row.level);
     for (const char* feature : row.features) EXPECT_EQ(server->Enable(feature), std::string(feature) != "unknown");
     xServerInitialise init;
     init.processId = 4242;
@@ -113,13 +100,29 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
     EXPECT_FALSE(server->Initialize(init)) << "nothing is sent to a stopped server";
     EXPECT_TRUE(TraceLog::Lines().empty());
     ASSERT_TRUE(server->Start(init));
-    EXPECT_FALSE(TraceLog::Contains("Process Id")) << "start-up details are verbose only";
+    const bool verbose = row.level == LSP::TraceLevel::Verbose;
+    ASSERT_EQ(TraceLog::Contains("Process Id"), verbose) << "start-up details are verbose only";
+    const Texts details = TraceLog::Texts("Verbose");
+    const auto processLine = std::find(details.begin(), details.end(), "Process Id: 4242\n");
+    if (verbose) {
+      ASSERT_NE(processLine, details.end());
+      EXPECT_EQ(*(processLine + 1), " Root Path: /home/dev/project\n");
+      EXPECT_EQ(*(processLine + 2), "   Options: " + init.options + "\n");
+    }
+    EXPECT_TRUE(TraceLog::Contains(
+        R"({"jsonrpc":"2.0","id":0,"result":[{"uri":"file:///home/dev/project","name":"project"}]})"));
+    EXPECT_EQ(SentBodies().size(), 3u);  // with the answer to the server's request, in either order
+    EXPECT_EQ(SentBody("initialized"), R"({"jsonrpc":"2.0","method":"initialized","params":{}})");
     std::string expected = vexil_test::ReadDataFile("initialize_request.json");
     // Request ids count up through the process.
     std::string sent = std::regex_replace(SentBody("initialize"), std::regex(R"(^(\{"jsonrpc":"2.0","id":)\d+)"), "$011");
     expected.replace(expected.find("file:///home/dev/project"), 24, FileToUri(init.rootPath.c_str()));
     for (const auto& [from, to] : row.changes) expected.replace(expected.find(from), from.size(), to);
     EXPECT_EQ(sent, expected) << row.features.size();
+    TraceLog::Clear();
+    EXPECT_TRUE(server->Start(init));
+    EXPECT_TRUE(server->Initialize(init));
+    EXPECT_TRUE(TraceLog::Lines().empty());
     Dispose(kName);
     TraceLog::Clear();
   }
@@ -245,12 +248,16 @@ TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAns
   }
 }
 
-// Registration and unregistration of watched files through the server's own requests (the
-// batches: watched_files_test); what the fake server received is in every reply to "fake/echo".
+// Registration and unregistration of watched files through the server's own requests: the
+// kinds a watcher asks for, patterns relative to a folder, and a new session that starts
+// without them (the batches: watched_files_test). What the fake server received is in every
+// reply to "fake/echo".
 TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem) {
   vexil_test::TempDirectory temporary;
   const std::filesystem::path root = std::filesystem::absolute(temporary.Path());
   const auto file = [&](const std::string& name) { return (root / name).make_preferred().string(); };
+  std::filesystem::create_directory(file("sub"));
+  std::ofstream(file("old.py")).put('x');
   xLanguageServer* server = Connection();
   ASSERT_TRUE(server->Enable("watchedFiles"));
   xServerInitialise init;
@@ -259,9 +266,9 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
   const auto ask = [&](const char* method, const std::string& params) {
     return server->Request("fake/echo", (R"({"ask":[{"method":")" + std::string(method) + R"(","params":)" + params + "}]}").c_str());
   };
-  const auto registration = [](const char* id, const char* glob) {
+  const auto registration = [](const char* id, const std::string& watcher) {
     return R"({"registrations":[{"id":")" + std::string(id) + R"(","method":"workspace/didChangeWatchedFiles",)" +
-           R"("registerOptions":{"watchers":[{"globPattern":")" + glob + R"("}]}}]})";
+           R"("registerOptions":{"watchers":[)" + watcher + "]}}]}";
   };
   const auto received = [&](const std::string& name) {
     return server->Request("fake/echo", "{}").find(FileToUri(file(name).c_str()) + "\\\",") != std::string::npos;
@@ -269,19 +276,29 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
   // Nothing registered yet: every change under the folder is told.
   std::ofstream(file("early.txt")).put('x');
   EXPECT_TRUE(transport_test::WaitFor([&] { return received("early.txt"); }, 30s));
-  EXPECT_NE(ask("client/registerCapability", registration("py", "**/*.py")).find(R"("id":0,"result":null)"), std::string::npos);
-  std::ofstream(file("a.py")).put('x');
+  // Python files created or deleted only: a change of one and other files are not told.
+  const std::string python = registration("py", R"({"globPattern":"**/*.py","kind":5})");
+  EXPECT_NE(ask("client/registerCapability", python).find(R"("id":0,"result":null)"), std::string::npos);
+  std::ofstream(file("old.py"), std::ios::app).put('x');
   std::ofstream(file("a.txt")).put('x');
+  std::ofstream(file("a.py")).put('x');
   EXPECT_TRUE(transport_test::WaitFor([&] { return received("a.py"); }, 30s));
   EXPECT_FALSE(received("a.txt"));
+  EXPECT_FALSE(received("old.py"));
 
+  // Unregistered, then text files of "sub" only, by a pattern relative to it.
   const char* dropped = R"({"unregisterations":[{"id":"py","method":"workspace/didChangeWatchedFiles"}]})";
   EXPECT_NE(ask("client/unregisterCapability", dropped).find(R"("result":null)"), std::string::npos);
-  EXPECT_NE(ask("client/registerCapability", registration("txt", "**/*.txt")).find(R"("result":null)"), std::string::npos);
+  const std::string relative =
+      R"({"globPattern":{"baseUri":")" + FileToUri(file("sub").c_str()) + R"(","pattern":"*.txt"}})";
+  EXPECT_NE(ask("client/registerCapability", registration("txt", relative)).find(R"("result":null)"),
+            std::string::npos);
   std::ofstream(file("b.py")).put('x');
   std::ofstream(file("b.txt")).put('x');
-  EXPECT_TRUE(transport_test::WaitFor([&] { return received("b.txt"); }, 30s));
+  std::ofstream(file("sub/b.txt")).put('x');
+  EXPECT_TRUE(transport_test::WaitFor([&] { return received("sub/b.txt"); }, 30s));
   EXPECT_FALSE(received("b.py"));
+  EXPECT_FALSE(received("b.txt"));
   EXPECT_NE(ask("client/registerCapability", "{}").find(R"("error":{"code":-32602,)"), std::string::npos);
 
   // Shut down and initialized again: the registrations of the earlier session are gone.
@@ -291,20 +308,24 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
   EXPECT_TRUE(transport_test::WaitFor([&] { return received("c.py"); }, 30s));
 }
 
-// How the initialize reply comes, against a 200 ms host time-out: a late reply is waited
-// for within the handshake's own limit, one that never comes still lets the handshake go
-// on (the protocol cannot cancel initialize), and an error reply fails it.
-TEST_F(ConnectionLifecycle, InitializeRepliesLateNeverOrRefused) {
+// How the handshake's replies come, against a 200 ms host time-out: a late initialize reply
+// is waited for within the handshake's own limit, one that never comes still lets the
+// handshake go on (the protocol cannot cancel initialize), and an error reply fails it. A
+// server that refuses shutdown stays initialized; one that ignores exit keeps its
+// connection, usable as before.
+TEST_F(ConnectionLifecycle, HandshakeRepliesLateNeverOrRefused) {
   struct Row {
     const char* name;
     const char* directive;
     bool started;
     int timeouts;
     const char* error;
+    bool ending = false;  // refuses shutdown and ignores exit
   } rows[] = {
       {"late", "late=initialize:2000", true, 0, ""},
       {"never", "late=initialize:100000", true, 1, ""},
       {"refused", "error=initialize", false, 0, "refused initialize"},
+      {"no ending", "error=shutdown;ignore-exit", true, 0, "", true},
   };
   for (const Row& row : rows) {
     SCOPED_TRACE(row.name);
@@ -317,12 +338,16 @@ TEST_F(ConnectionLifecycle, InitializeRepliesLateNeverOrRefused) {
       EXPECT_TRUE(server->HaveErrors());
       EXPECT_STREQ(server->ErrorMessage(), row.error);
     }
-    if (row.timeouts == 0 && row.started) {  // the next request must not suffer for the wait
-      LSP::TextDocumentPositionParams params;
-      server->TextDocument_Hover(&params);
-      EXPECT_FALSE(server->HaveErrors());
-      EXPECT_FALSE(TraceLog::Contains("Timed out"));
+    if (row.ending) {
+      EXPECT_FALSE(server->Shutdown());
+      TraceLog::Clear();
+      EXPECT_TRUE(server->Initialize(Init()));
+      EXPECT_TRUE(SentBodies().empty());
+      EXPECT_FALSE(server->Exit());
+      EXPECT_EQ(Vexil_Have(kName), server);
+      EXPECT_NE(SentBody("exit"), "");
     }
+    if (row.timeouts == 0 && row.started) ExpectAnswered(server);
     Dispose(kName);
     TraceLog::Clear();
   }
@@ -356,33 +381,11 @@ TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyARelaunchWorksAndExitEmpties
   ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
   EXPECT_TRUE(server->Start(Init()));
   EXPECT_NE(server->Id(), process);
-  LSP::TextDocumentPositionParams params;
-  server->TextDocument_Hover(&params);
-  EXPECT_FALSE(server->HaveErrors());
-  EXPECT_FALSE(TraceLog::Contains("Timed out"));
+  ExpectAnswered(server);
 
   EXPECT_TRUE(server->Shutdown());
   EXPECT_TRUE(server->Exit());
   EXPECT_EQ(Vexil_Have(kName), nullptr);
-}
-
-// A server that refuses shutdown stays initialized; one that ignores exit keeps its
-// connection, usable as before.
-TEST_F(ConnectionLifecycle, RefusedShutdownAndIgnoredExitKeepTheConnection) {
-  xLanguageServer* server = Connection({"error=shutdown", "ignore-exit"});
-  ASSERT_TRUE(server->Start(Init()));
-  EXPECT_FALSE(server->Shutdown());
-  TraceLog::Clear();
-  EXPECT_TRUE(server->Initialize(Init()));
-  EXPECT_TRUE(SentBodies().empty());
-
-  EXPECT_FALSE(server->Exit());
-  EXPECT_EQ(Vexil_Have(kName), server);
-  EXPECT_NE(SentBody("exit"), "");
-  LSP::TextDocumentPositionParams params;
-  server->TextDocument_Hover(&params);
-  EXPECT_FALSE(server->HaveErrors());
-  EXPECT_FALSE(TraceLog::Contains("Timed out"));
 }
 
 }  // namespace
