@@ -35,15 +35,6 @@ class ConnectionLifecycle : public ::testing::Test {
     return Fake(kName, std::move(directives), timeout, level);
   }
 
-  static xServerInitialise Init() {
-    xServerInitialise init;
-    init.processId = 42;
-    init.rootPath = "/work/root dir";
-    init.options = R"({"initializationOptions":{"style":"tabs"}})";
-    init.workspaceFolders.emplace_back("file:///work/root%20dir", "root dir");
-    return init;
-  }
-
   // The next request is answered at once: no earlier wait is left to make it suffer.
   static void ExpectAnswered(xLanguageServer* server) {
     LSP::TextDocumentPositionParams params;
@@ -147,7 +138,7 @@ TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
   for (const Row& row : rows) {
     xLanguageServer* server = Connection({"result=initialize:{\"capabilities\":" + row.capabilities + "}"});
     EXPECT_STREQ(server->ServerCapabilitiesJson(), "");
-    ASSERT_TRUE(server->Start(Init()));
+    ASSERT_TRUE(server->Start(xServerInitialise()));
     LSP::ServerCapabilities read = server->ServerCapabilities();
     EXPECT_TRUE(read.hoverProvider) << row.capabilities;
     EXPECT_EQ(read.documentSync.change, row.change) << row.capabilities;
@@ -230,7 +221,7 @@ TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAns
     handed.server = Connection(row.directives);
     handed.server->SetMessageHandler(&Handed::Handler, &handed);
     for (const char* feature : row.features) EXPECT_TRUE(handed.server->Enable(feature));
-    ASSERT_TRUE(handed.server->Start(Init()));
+    ASSERT_TRUE(handed.server->Start(xServerInitialise()));
     std::string returned = row.action(handed.server);
     EXPECT_NE(returned.find(row.answer), std::string::npos) << returned;
     EXPECT_TRUE(handed.shared.WaitUntil([&] { return handed.lines.size() >= row.handed.size(); }));
@@ -330,7 +321,7 @@ TEST_F(ConnectionLifecycle, HandshakeRepliesLateNeverOrRefused) {
   for (const Row& row : rows) {
     SCOPED_TRACE(row.name);
     xLanguageServer* server = Connection({row.directive}, 200);
-    EXPECT_EQ(server->Start(Init()), row.started);
+    EXPECT_EQ(server->Start(xServerInitialise()), row.started);
     EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), row.timeouts);
     EXPECT_EQ(SentBody("initialized") != "", row.started);
     EXPECT_EQ(SentBody("$/cancelRequest"), "");
@@ -341,7 +332,7 @@ TEST_F(ConnectionLifecycle, HandshakeRepliesLateNeverOrRefused) {
     if (row.ending) {
       EXPECT_FALSE(server->Shutdown());
       TraceLog::Clear();
-      EXPECT_TRUE(server->Initialize(Init()));
+      EXPECT_TRUE(server->Initialize(xServerInitialise()));
       EXPECT_TRUE(SentBodies().empty());
       EXPECT_FALSE(server->Exit());
       EXPECT_EQ(Vexil_Have(kName), server);
@@ -363,7 +354,7 @@ TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyARelaunchWorksAndExitEmpties
 
   // A 20 s host time-out: waiting for anything but the shutdown reply would last that long.
   xLanguageServer* server = Connection({}, 20000);
-  ASSERT_TRUE(server->Start(Init()));
+  ASSERT_TRUE(server->Start(xServerInitialise()));
   auto before = std::chrono::steady_clock::now();
   EXPECT_TRUE(server->Shutdown());
   EXPECT_LT(std::chrono::steady_clock::now() - before, 2s);
@@ -372,14 +363,14 @@ TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyARelaunchWorksAndExitEmpties
   // Shut down: a new Start skips the launch and initializes again.
   int process = server->Id();
   TraceLog::Clear();
-  EXPECT_TRUE(server->Start(Init()));
+  EXPECT_TRUE(server->Start(xServerInitialise()));
   EXPECT_EQ(server->Id(), process);
   EXPECT_NE(SentBody("initialize"), "");
 
   // Killed: a new Start launches it again, with pipes of its own, on the same connection.
   vexil_test::KillProcess(process);
   ASSERT_TRUE(transport_test::WaitFor([&] { return !server->IsRunning(); }));
-  EXPECT_TRUE(server->Start(Init()));
+  EXPECT_TRUE(server->Start(xServerInitialise()));
   EXPECT_NE(server->Id(), process);
   ExpectAnswered(server);
 
