@@ -8,14 +8,16 @@
 #include <cstring>
 #include <functional>
 #include <iterator>
-#include <thread>
 #include <string>
+#include <thread>
 
+#include "../protocol/reply_helpers.h"
 #include "connection_test_support.h"
 
 namespace {
 
 using namespace connection_test;
+using vexil_test::Fields;
 
 constexpr char kName[] = "features";
 constexpr char kUri[] = "file:///work/a.cpp";
@@ -208,9 +210,8 @@ TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {
   params.textDocument.uri = kUri;
   std::vector<LSP::SymbolInformation> symbols = server->TextDocument_DocumentSymbol(&params);
   ASSERT_EQ(symbols.size(), 1u);
-  EXPECT_EQ(symbols[0].name, "Clamp");
-  EXPECT_EQ(symbols[0].location.uri, kUri);
-  EXPECT_EQ(symbols[0].location.range.start.line, 16);
+  EXPECT_EQ(Fields(symbols[0].name, symbols[0].location.uri, symbols[0].location.range),
+            "Clamp|file:///work/a.cpp|16:0-20:1");
 }
 
 // A full report pulled is stored, and its id goes back with the next pull.
@@ -224,10 +225,8 @@ TEST_F(ConnectionFeatures, PullingStoresAFullReportAndSendsItsIdBack) {
 
   auto pulled = server->TextDocument_PullDiagnostics(&document);
   ASSERT_EQ(pulled.size(), 1u);
-  EXPECT_EQ(pulled[0].message, "Trailing comma");
-  EXPECT_EQ(pulled[0].range.start.line, 4);
-  EXPECT_EQ(pulled[0].code, 12);
-  EXPECT_EQ(pulled[0].codeText, "12");
+  EXPECT_EQ(Fields(pulled[0].message, pulled[0].range, pulled[0].severity, pulled[0].code, pulled[0].codeText),
+            "Trailing comma|4:1-4:3|2|12|12");
   EXPECT_NE(SentBody("textDocument/diagnostic")
                 .find(R"("method":"textDocument/diagnostic","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})"),
             std::string::npos);
