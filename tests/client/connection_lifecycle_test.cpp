@@ -242,7 +242,6 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
   vexil_test::TempDirectory temporary;
   const std::filesystem::path root = std::filesystem::absolute(temporary.Path());
   const auto file = [&](const std::string& name) { return (root / name).make_preferred().string(); };
-  std::filesystem::create_directory(file("sub"));
   std::ofstream(file("old.py")).put('x');
   xLanguageServer* server = Connection();
   ASSERT_TRUE(server->Enable("watchedFiles"));
@@ -260,6 +259,7 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
     return server->Request("fake/echo", "{}").find(FileToUri(file(name).c_str()) + "\\\",") != std::string::npos;
   };
   // Nothing registered yet: every change under the folder is told.
+  std::filesystem::create_directory(file("sub"));
   std::ofstream(file("early.txt")).put('x');
   EXPECT_TRUE(transport_test::WaitFor([&] { return received("early.txt"); }, 30s));
   // Python files created or deleted only: a change of one and other files are not told.
