@@ -1,5 +1,6 @@
-// The seventeen calls against the fake server: each method on the wire, empty results for
-// null, error and dead-server replies, the references context, and symbols without a URI.
+// The calls against the fake server: each method on the wire, empty results for null, error
+// and dead-server replies, the references context, symbols without a URI, and diagnostics
+// published and pulled (the slots hosts call them through: connection_slots_test).
 #include <gtest/gtest.h>
 
 #include <chrono>
@@ -7,14 +8,16 @@
 #include <cstring>
 #include <functional>
 #include <iterator>
-#include <thread>
 #include <string>
+#include <thread>
 
+#include "../protocol/reply_helpers.h"
 #include "connection_test_support.h"
 
 namespace {
 
 using namespace connection_test;
+using vexil_test::Fields;
 
 constexpr char kName[] = "features";
 constexpr char kUri[] = "file:///work/a.cpp";
@@ -35,9 +38,10 @@ class ConnectionFeatures : public ::testing::Test {
   }
 };
 
-// Every request answered with null: each comes back empty, under its own method, in the
-// order of the rows.
-TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
+// Every request answered with null comes back empty; every call goes out under its own
+// method, in the order of the rows, notifications without waiting for a reply (their
+// params as written: feature_params_test).
+TEST_F(ConnectionFeatures, EveryCallGoesOutUnderItsMethodAndNullRepliesGiveEmptyResults) {
   xLanguageServer* server = nullptr;  // started below, with the rows' methods scripted
   auto position = At<LSP::TextDocumentPositionParams>(3, 4);
   auto completion = At<LSP::CompletionParams>(3, 4);
@@ -56,6 +60,13 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   LSP::InlayHintParams hints;
   LSP::CompletionItem item;
   LSP::CallHierarchyItem function;
+  auto open = Opened(kUri, "int x;\n");
+  auto change = Changed(kUri, "int y;\n");
+  LSP::DidSaveTextDocumentParams save;
+  LSP::DidCloseTextDocumentParams close;
+  LSP::DidChangeConfigurationParams settings;
+  LSP::DidChangeWorkspaceFoldersParams folders;
+  LSP::WillSaveTextDocumentParams willSave;
   const std::pair<const char*, std::function<bool()>> rows[] = {
       {"textDocument/completion", [&] { return server->TextDocument_Completion(&completion).items.empty(); }},
       {"textDocument/declaration", [&] { return server->TextDocument_Declaration(&position).empty(); }},
@@ -84,6 +95,14 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
        [&] { return server->TextDocument_PrepareCallHierarchy(&position).empty(); }},
       {"callHierarchy/incomingCalls", [&] { return server->CallHierarchy_IncomingCalls(&function).empty(); }},
       {"callHierarchy/outgoingCalls", [&] { return server->CallHierarchy_OutgoingCalls(&function).empty(); }},
+      {"textDocument/didOpen", [&] { return server->TextDocument_DidOpen(&open), true; }},
+      {"textDocument/didChange", [&] { return server->TextDocument_DidChange(&change), true; }},
+      {"textDocument/didSave", [&] { return server->TextDocument_DidSave(&save), true; }},
+      {"textDocument/didClose", [&] { return server->TextDocument_DidClose(&close), true; }},
+      {"workspace/didChangeConfiguration", [&] { return server->Workspace_DidChangeConfiguration(&settings), true; }},
+      {"workspace/didChangeWorkspaceFolders",
+       [&] { return server->Workspace_DidChangeWorkspaceFolders(&folders), true; }},
+      {"textDocument/willSave", [&] { return server->TextDocument_WillSave(&willSave), true; }},
   };
   std::string nulls;
   for (const auto& row : rows) nulls += std::string("result=") + row.first + ":null;";
@@ -99,6 +118,7 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
   ASSERT_EQ(sent.size(), std::size(rows));
   for (std::size_t at = 0; at < sent.size(); ++at) EXPECT_EQ(sent[at], rows[at].first);
   EXPECT_FALSE(TraceLog::Contains("Timed out"));
+  EXPECT_TRUE(TraceLog::Texts("Error").empty());
 
   // Plain references include the declaration; reference params go as given.
   const std::string params = R"("params":{"textDocument":{"uri":"file:///work/a.cpp"},"position":{"line":3,"character":4},)";
@@ -112,46 +132,16 @@ TEST_F(ConnectionFeatures, NullRepliesGiveEmptyResultsForEveryRequest) {
             std::string::npos);
 }
 
-TEST_F(ConnectionFeatures, NotificationsGoOutUnderTheirMethodsWithoutWaiting) {
-  xLanguageServer* server = Started();
-  auto open = Opened(kUri, "int x;\n");
-  auto change = Changed(kUri, "int y;\n");
-  LSP::DidSaveTextDocumentParams save;
-  save.textDocument.uri = kUri;
-  LSP::DidCloseTextDocumentParams close;
-  close.textDocument.uri = kUri;
-  server->TextDocument_DidOpen(&open);
-  server->TextDocument_DidChange(&change);
-  server->TextDocument_DidSave(&save);
-  server->TextDocument_DidClose(&close);
-  LSP::DidChangeConfigurationParams settings;
-  settings.settings = R"({"pylsp": {"plugins":{}}})";
-  LSP::DidChangeWorkspaceFoldersParams folders;
-  folders.event.added.emplace_back("file:///work/b", "b");
-  LSP::WillSaveTextDocumentParams willSave;
-  willSave.textDocument.uri = kUri;
-  server->Workspace_DidChangeConfiguration(&settings);
-  server->Workspace_DidChangeWorkspaceFolders(&folders);
-  server->TextDocument_WillSave(&willSave);
-  EXPECT_EQ(SentBodies(), (std::vector<std::string>{
-      R"({"jsonrpc":"2.0","method":"textDocument/didOpen","params":{"textDocument":{"uri":"file:///work/a.cpp","languageId":"cpp","version":1,"text":"int x;\n"}}})",
-      R"({"jsonrpc":"2.0","method":"textDocument/didChange","params":{"textDocument":{"uri":"file:///work/a.cpp","version":2},"contentChanges":[{"text":"int y;\n"}]}})",
-      R"({"jsonrpc":"2.0","method":"textDocument/didSave","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})",
-      R"({"jsonrpc":"2.0","method":"textDocument/didClose","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})",
-      R"({"jsonrpc":"2.0","method":"workspace/didChangeConfiguration","params":{"settings":{"pylsp":{"plugins":{}}}}})",
-      R"({"jsonrpc":"2.0","method":"workspace/didChangeWorkspaceFolders","params":{"event":{"added":[{"uri":"file:///work/b","name":"b"}],"removed":[]}}})",
-      R"({"jsonrpc":"2.0","method":"textDocument/willSave","params":{"textDocument":{"uri":"file:///work/a.cpp"},"reason":1}})"}));
-  EXPECT_TRUE(TraceLog::Texts("Error").empty());
-}
-
 // Servers match quick fixes to the diagnostics they published, and resolve completion items
-// by their "data": both go back as the server sent them. A pull the server answers with
-// "unchanged" gives the published list.
+// by their "data": both go back as the server sent them. A pull asks only a server that
+// provides diagnostics, whose "unchanged" gives the published list, as does one that does
+// not; a publication without errors empties the list.
 TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
-  for (bool resolves : {true, false}) {
-    SCOPED_TRACE(resolves ? "resolve provider" : "no resolve provider");
-    const std::string capabilities = R"({"diagnosticProvider":{},"completionProvider":{"resolveProvider":)" +
-                                     std::string(resolves ? "true" : "false") + "}}";
+  for (bool provides : {true, false}) {
+    SCOPED_TRACE(provides ? "diagnostic and resolve providers" : "neither provider");
+    const std::string capabilities = std::string(provides ? R"({"diagnosticProvider":{},)" : "{") +
+                                     R"("completionProvider":{"resolveProvider":)" + (provides ? "true" : "false") +
+                                     "}}";
     xLanguageServer* server = Started(
         {"diagnose", "result=initialize:{\"capabilities\": " + capabilities + "}",
          R"(result=textDocument/diagnostic:{"kind": "unchanged","resultId":"r1"})",
@@ -164,7 +154,9 @@ TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
     LSP::TextDocumentIdentifier document;
     document.uri = kUri;
     EXPECT_EQ(server->TextDocument_PullDiagnostics(&document).size(), 2u);
-    EXPECT_NE(SentBody("textDocument/diagnostic"), "");
+    EXPECT_EQ(SentBody("textDocument/diagnostic") != "", provides);
+    EXPECT_TRUE(server->TextDocument_Diagnostics(nullptr).empty());
+    EXPECT_TRUE(server->TextDocument_PullDiagnostics(nullptr).empty());
 
     LSP::CodeActionParams actions;
     actions.textDocument.uri = kUri;
@@ -186,9 +178,12 @@ TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
     std::vector<LSP::CompletionItem> items = server->TextDocument_Completion(&completion).items;
     ASSERT_EQ(items.size(), 1u);
     EXPECT_EQ(server->CompletionItem_Resolve(&items[0]).detail, "int clamp(int)");
-    EXPECT_NE(SentBody("completionItem/resolve").find(resolves ? R"("params":{"label":"clamp","data":{"id":7}}})"
-                                                               : R"("params":{"label":"clamp"}})"),
+    EXPECT_NE(SentBody("completionItem/resolve")
+                  .find(provides ? R"("params":{"label":"clamp","data":{"id":7}}})" : R"("params":{"label":"clamp"}})"),
               std::string::npos);
+    auto fixed = Changed(kUri, "ok\n");
+    server->TextDocument_DidChange(&fixed);
+    EXPECT_TRUE(transport_test::WaitFor([&] { return server->TextDocument_Diagnostics(kUri).empty(); }));
     Dispose(kName);
   }
   // Host-given JSON text that is not JSON is refused before anything is sent.
@@ -215,9 +210,32 @@ TEST_F(ConnectionFeatures, HierarchicalSymbolsBelongToTheRequestedDocument) {
   params.textDocument.uri = kUri;
   std::vector<LSP::SymbolInformation> symbols = server->TextDocument_DocumentSymbol(&params);
   ASSERT_EQ(symbols.size(), 1u);
-  EXPECT_EQ(symbols[0].name, "Clamp");
-  EXPECT_EQ(symbols[0].location.uri, kUri);
-  EXPECT_EQ(symbols[0].location.range.start.line, 16);
+  EXPECT_EQ(Fields(symbols[0].name, symbols[0].location.uri, symbols[0].location.range),
+            "Clamp|file:///work/a.cpp|16:0-20:1");
+}
+
+// A full report pulled is stored, and its id goes back with the next pull.
+TEST_F(ConnectionFeatures, PullingStoresAFullReportAndSendsItsIdBack) {
+  xLanguageServer* server = Started(
+      {R"(result=initialize:{"capabilities": {"diagnosticProvider":{"interFileDependencies":false,"workspaceDiagnostics":false}}})",
+       R"(result=textDocument/diagnostic:{"kind": "full","resultId":"r7","items":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":3}},"severity":2,"code":12,"source":"json","message":"Trailing comma"}]})"});
+  LSP::TextDocumentIdentifier document;
+  document.uri = kUri;
+  int before = server->DiagnosticsVersion();
+
+  auto pulled = server->TextDocument_PullDiagnostics(&document);
+  ASSERT_EQ(pulled.size(), 1u);
+  EXPECT_EQ(Fields(pulled[0].message, pulled[0].range, pulled[0].severity, pulled[0].code, pulled[0].codeText),
+            "Trailing comma|4:1-4:3|2|12|12");
+  EXPECT_NE(SentBody("textDocument/diagnostic")
+                .find(R"("method":"textDocument/diagnostic","params":{"textDocument":{"uri":"file:///work/a.cpp"}}})"),
+            std::string::npos);
+  EXPECT_NE(server->DiagnosticsVersion(), before);
+  EXPECT_EQ(server->TextDocument_Diagnostics(kUri).size(), 1u);
+
+  TraceLog::Clear();
+  server->TextDocument_PullDiagnostics(&document);
+  EXPECT_NE(SentBody("textDocument/diagnostic").find(R"("previousResultId":"r7")"), std::string::npos);
 }
 
 // Requests and notifications of any method, with params as JSON text, and every way one
@@ -231,7 +249,6 @@ TEST_F(ConnectionFeatures, AnyMethodWithJsonParamsAndEveryFailureThenTypedFailur
     const char* error;     // ErrorMessage() afterwards
     bool notify = false;
   };
-  const std::string refused = "Invalid JSON for fake/echo: ";
   const Row rows[] = {
       {"fake/echo", R"( {"a": [1, "x"], "b":{}} )",
        R"({"method":"fake/echo","answers":[],"received":["{\"jsonrpc\":\"2.0\",\"method\":\"initialized\",\"params\":{}}"]})",

@@ -2,41 +2,31 @@
 // through the shared library alone.
 #include <gtest/gtest.h>
 
-#include <chrono>
-#include <condition_variable>
 #include <fstream>
 #include <memory>
-#include <mutex>
 #include <string>
 
-#include "vexil_test/support.h"
+#include "../watch/watch_fixture.h"
 #include "vexil/task/watcher_task.h"
 #include "vexil/watch/watcher.h"
 #include "vexil/watch/watcher_ex.h"
 
 namespace {
 
-std::mutex mutex;
-std::condition_variable changed;
+watchtest::Shared heard;  // over what the library's threads report below
 std::string lastName;
 int traceLines = 0;
 
 void OnChange(xWatcherProjectEx*, xChangeEvent* event) {
-  {
-    std::lock_guard<std::mutex> lock(mutex);
-    lastName = event->name;
-  }
-  changed.notify_all();
+  heard.Update([&] { lastName = event->name; });
 }
 
 void OnTrace(TraceType, const char*, const char*) {
-  std::lock_guard<std::mutex> lock(mutex);
-  ++traceLines;
+  heard.Update([] { ++traceLines; });
 }
 
 int TraceLines() {
-  std::lock_guard<std::mutex> lock(mutex);
-  return traceLines;
+  return heard.Read([] { return traceLines; });
 }
 
 }  // namespace
@@ -53,8 +43,7 @@ TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
         xWatcher_WorkspaceEx(OnChange, OnTrace, LSP::TraceLevel::Verbose));
     watcher->Start("project", root.c_str(), nullptr);
     std::ofstream(root + "/created.txt").put('x');
-    std::unique_lock<std::mutex> lock(mutex);
-    EXPECT_TRUE(changed.wait_for(lock, std::chrono::seconds(30), [] { return lastName == "created.txt"; }));
+    EXPECT_TRUE(heard.WaitUntil([] { return lastName == "created.txt"; }));
   }
   std::unique_ptr<xWatcherWorkspace> tree(xWatcher_Workspace(OnChange, OnTrace, LSP::TraceLevel::Verbose));
   const int before = TraceLines();
