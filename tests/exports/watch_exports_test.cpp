@@ -10,16 +10,18 @@
 #include <string>
 
 #include "vexil_test/support.h"
+#include "vexil_test/trace_log.h"
 #include "vexil/task/watcher_task.h"
 #include "vexil/watch/watcher.h"
 #include "vexil/watch/watcher_ex.h"
 
 namespace {
 
+using vexil_test::TraceLog;
+
 std::mutex mutex;
 std::condition_variable changed;
 std::string lastName;
-int traceLines = 0;
 
 void OnChange(xWatcherProjectEx*, xChangeEvent* event) {
   {
@@ -27,16 +29,6 @@ void OnChange(xWatcherProjectEx*, xChangeEvent* event) {
     lastName = event->name;
   }
   changed.notify_all();
-}
-
-void OnTrace(TraceType, const char*, const char*) {
-  std::lock_guard<std::mutex> lock(mutex);
-  ++traceLines;
-}
-
-int TraceLines() {
-  std::lock_guard<std::mutex> lock(mutex);
-  return traceLines;
 }
 
 }  // namespace
@@ -50,21 +42,21 @@ TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
   const std::string root = directory.Path().string();
   {
     std::unique_ptr<xWatcherWorkspaceEx> watcher(
-        xWatcher_WorkspaceEx(OnChange, OnTrace, LSP::TraceLevel::Verbose));
+        xWatcher_WorkspaceEx(OnChange, &TraceLog::Callback, LSP::TraceLevel::Verbose));
     watcher->Start("project", root.c_str(), nullptr);
     std::ofstream(root + "/created.txt").put('x');
     std::unique_lock<std::mutex> lock(mutex);
     EXPECT_TRUE(changed.wait_for(lock, std::chrono::seconds(30), [] { return lastName == "created.txt"; }));
   }
-  std::unique_ptr<xWatcherWorkspace> tree(xWatcher_Workspace(OnChange, OnTrace, LSP::TraceLevel::Verbose));
-  const int before = TraceLines();
+  std::unique_ptr<xWatcherWorkspace> tree(xWatcher_Workspace(OnChange, &TraceLog::Callback, LSP::TraceLevel::Verbose));
+  const std::size_t before = TraceLog::Lines().size();
   tree->Start("project", root.c_str(), nullptr);
-  EXPECT_GT(TraceLines(), before);
+  EXPECT_GT(TraceLog::Lines().size(), before);
 }
 
 TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   xWatcherOptions options;
-  options.trace = OnTrace;
+  options.trace = &TraceLog::Callback;
   options.level = LSP::TraceLevel::Verbose;
   options.arguments = "echo $FN";
   options.flag = true;
@@ -72,7 +64,7 @@ TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   EXPECT_EQ(copy.arguments, "echo $FN");
 
   const vexil_test::TempDirectory directory;
-  const int before = TraceLines();
+  const std::size_t before = TraceLog::Lines().size();
   xWatcherTask* task = xWatcher_Task("exported", copy, {directory.Path().string()});
   ASSERT_NE(task, nullptr);
   EXPECT_EQ(xWatcher_Have("exported"), task);
@@ -82,5 +74,5 @@ TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   task->Stop();
   task->Release();
   EXPECT_EQ(xWatcher_Have("exported"), nullptr);
-  EXPECT_GT(TraceLines(), before);
+  EXPECT_GT(TraceLog::Lines().size(), before);
 }

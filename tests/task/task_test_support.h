@@ -64,12 +64,10 @@ inline bool WaitForText(const std::string& title, const std::string& piece,
 // Appends to `path` until `piece` is traced under `title`: a directory watcher that has
 // only just started may miss a first write.
 inline bool ModifyUntilTraced(const std::string& path, const std::string& title, const std::string& piece) {
-  const auto end = std::chrono::steady_clock::now() + kDeadline;
-  while (std::chrono::steady_clock::now() < end) {
+  return vexil_test::WaitFor([&] {
     std::ofstream(path, std::ios::app) << "changed\n";
-    if (WaitForText(title, piece, std::chrono::milliseconds(500))) return true;
-  }
-  return false;
+    return WaitForText(title, piece, std::chrono::milliseconds(500));
+  });
 }
 
 // Gone means ended and collected: a zombie still counts as existing.

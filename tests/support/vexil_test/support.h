@@ -1,10 +1,13 @@
 // Portable helpers for tests: a temporary directory removed with its contents, control
-// over processes a test started (the library itself never kills a child), polling, framing.
+// over processes a test started (the library itself never kills a child), polling, reading
+// a file, framing.
 #pragma once
 
 #include <chrono>
 #include <filesystem>
+#include <fstream>
 #include <functional>
+#include <iterator>
 #include <string>
 #include <thread>
 
@@ -44,6 +47,12 @@ inline bool WaitFor(const std::function<bool()>& condition,
     std::this_thread::sleep_for(std::chrono::milliseconds(5));
   }
   return true;
+}
+
+// The bytes of the file at `path`; empty when it cannot be read.
+inline std::string ReadFile(const std::filesystem::path& path) {
+  std::ifstream file(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(file), {});
 }
 
 // `body` as a server frames it on the wire.
