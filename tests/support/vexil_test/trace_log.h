@@ -1,8 +1,10 @@
 // A record of every line the library traces, behind a plain callback any test may pass: the
-// lines of servers, watchers and tasks, read back whole, by title, counted or searched.
+// lines of servers, watchers and tasks, read back whole, by title, counted, searched or awaited.
 #pragma once
 
 #include <algorithm>
+#include <chrono>
+#include <condition_variable>
 #include <mutex>
 #include <string>
 #include <vector>
@@ -12,16 +14,24 @@
 namespace vexil_test {
 
 struct TraceLine {
+  TraceType type;
   std::string title;
   std::string text;
+
+  bool operator==(const TraceLine& other) const {
+    return type == other.type && title == other.title && text == other.text;
+  }
 };
 
 // Every line the library traces goes here; reader threads trace too, hence the lock.
 class TraceLog {
  public:
-  static void Callback(TraceType, const char* title, const char* text) {
+  // Notifies under the lock: a waiter that returns may end the process, and a tracing
+  // thread must not touch the log after it could have.
+  static void Callback(TraceType type, const char* title, const char* text) {
     std::lock_guard<std::mutex> lock(mutex_);
-    lines_.push_back({title, text});
+    lines_.push_back({type, title, text});
+    traced_.notify_all();
   }
   static void Clear() {
     std::lock_guard<std::mutex> lock(mutex_);
@@ -48,9 +58,23 @@ class TraceLog {
     return std::any_of(texts.begin(), texts.end(),
                        [&](const std::string& text) { return text.find(piece) != std::string::npos; });
   }
+  // Waits until a traced line matches. Only the lines added since the last look are
+  // searched: a command's output of 200,000 lines wakes the waiter at every line, and
+  // searching all of them each time is quadratic.
+  template <typename Match>
+  static bool WaitUntilTraced(Match match, std::chrono::milliseconds limit = std::chrono::seconds(30)) {
+    std::size_t searched = 0;
+    std::unique_lock<std::mutex> lock(mutex_);
+    return traced_.wait_for(lock, limit, [&] {
+      const auto from = lines_.begin() + static_cast<std::ptrdiff_t>(std::min(searched, lines_.size()));
+      searched = lines_.size();
+      return std::find_if(from, lines_.end(), match) != lines_.end();
+    });
+  }
 
  private:
   static inline std::mutex mutex_;
+  static inline std::condition_variable traced_;
   static inline std::vector<TraceLine> lines_;
 };
 
