@@ -4,12 +4,11 @@
 
 #include <algorithm>
 #include <chrono>
-#include <condition_variable>
-#include <mutex>
 #include <string>
 #include <vector>
 
 #include "vexil/host/trace.h"
+#include "vexil_test/support.h"
 
 namespace vexil_test {
 
@@ -23,23 +22,17 @@ struct TraceLine {
   }
 };
 
-// Every line the library traces goes here; reader threads trace too, hence the lock.
+// Every line the library traces goes here; reader threads trace too, hence the guard.
 class TraceLog {
  public:
-  // Notifies under the lock: a waiter that returns may end the process, and a tracing
-  // thread must not touch the log after it could have.
   static void Callback(TraceType type, const char* title, const char* text) {
-    std::lock_guard<std::mutex> lock(mutex_);
-    lines_.push_back({type, title, text});
-    traced_.notify_all();
+    shared_.Update([&] { lines_.push_back({type, title, text}); });
   }
   static void Clear() {
-    std::lock_guard<std::mutex> lock(mutex_);
-    lines_.clear();
+    shared_.Update([] { lines_.clear(); });
   }
   static std::vector<TraceLine> Lines() {
-    std::lock_guard<std::mutex> lock(mutex_);
-    return lines_;
+    return shared_.Read([] { return lines_; });
   }
   // The texts in order, optionally only those under `title`.
   static std::vector<std::string> Texts(const std::string& title = "") {
@@ -64,17 +57,17 @@ class TraceLog {
   template <typename Match>
   static bool WaitUntilTraced(Match match, std::chrono::milliseconds limit = std::chrono::seconds(30)) {
     std::size_t searched = 0;
-    std::unique_lock<std::mutex> lock(mutex_);
-    return traced_.wait_for(lock, limit, [&] {
-      const auto from = lines_.begin() + static_cast<std::ptrdiff_t>(std::min(searched, lines_.size()));
-      searched = lines_.size();
-      return std::find_if(from, lines_.end(), match) != lines_.end();
-    });
+    return shared_.WaitUntil(
+        [&] {
+          const auto from = lines_.begin() + static_cast<std::ptrdiff_t>(std::min(searched, lines_.size()));
+          searched = lines_.size();
+          return std::find_if(from, lines_.end(), match) != lines_.end();
+        },
+        limit);
   }
 
  private:
-  static inline std::mutex mutex_;
-  static inline std::condition_variable traced_;
+  static inline Shared shared_;
   static inline std::vector<TraceLine> lines_;
 };
 
