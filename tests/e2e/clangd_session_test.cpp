@@ -33,7 +33,7 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
   // clangd builds and indexes opened files in the background; until then renames see one
   // file. All five uses of Clamp found means ready.
   auto at = At(project, "main.cpp", clampCall);
-  ASSERT_TRUE(Await([&] { return server->TextDocument_References(&at).size() >= 5; }));
+  ASSERT_TRUE(vexil_test::WaitFor([&] { return server->TextDocument_References(&at).size() >= 5; }, kPatience));
 
   // Each call that finds one place: the file and the text of its line.
   auto variable = At(project, "main.cpp", Find(project, "main.cpp", "Report(rectangle)", 7));
@@ -120,11 +120,11 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
   edited.textDocument = LSP::VersionedTextDocumentIdentifier(Uri(project, "main.cpp"), 2);
   edited.contentChanges.emplace_back();
   edited.contentChanges.back().text =
-      ReadFile(Path(project, "main.cpp")) + "int twice() { return shapes::Clamp(2, 0, 9); }\n";
+      vexil_test::ReadFile(Path(project, "main.cpp")) + "int twice() { return shapes::Clamp(2, 0, 9); }\n";
   server->TextDocument_DidChange(&edited);
   auto save = Document<LSP::DidSaveTextDocumentParams>(project, "main.cpp");
   server->TextDocument_DidSave(&save);
-  EXPECT_TRUE(Await([&] { return server->TextDocument_References(&at).size() == 6; }));
+  EXPECT_TRUE(vexil_test::WaitFor([&] { return server->TextDocument_References(&at).size() == 6; }, kPatience));
   auto close = Document<LSP::DidCloseTextDocumentParams>(project, "main.cpp");
   server->TextDocument_DidClose(&close);
   EXPECT_FALSE(server->HaveErrors());
@@ -162,7 +162,7 @@ TEST(ClangdProgress, BackgroundIndexingReachesTheMessageHandler) {
   progress.server->SetMessageHandler(&Progress::Handler, &progress);
   ASSERT_TRUE(progress.server->Start(InitRecord(project)));
   Open(*progress.server, project, "b.cpp");
-  EXPECT_TRUE(Await([&] { return progress.ended.load(); }));
+  EXPECT_TRUE(vexil_test::WaitFor([&] { return progress.ended.load(); }, kPatience));
   EXPECT_TRUE(Kill(*progress.server) && progress.server->Exit());
 }
 

@@ -7,7 +7,6 @@
 #include <chrono>
 #include <cstdio>
 #include <fstream>
-#include <sstream>
 #include <string>
 
 #include "e2e_support.h"
@@ -33,8 +32,8 @@ Result Shell(const std::string& script) {
   int status = std::system(command.c_str());
   run.seconds = std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
   run.status = WIFEXITED(status) ? WEXITSTATUS(status) : -1;
-  run.out = e2e::ReadFile(scratch / "out");
-  run.err = e2e::ReadFile(scratch / "err");
+  run.out = vexil_test::ReadFile(scratch / "out");
+  run.err = vexil_test::ReadFile(scratch / "err");
   return run;
 }
 
@@ -218,7 +217,7 @@ TEST(CommandLine, FailuresAreOneLineWithTheirExitStatus) {
     EXPECT_EQ(std::count(run.err.begin(), run.err.end(), '\n'), 1) << test.arguments << "\n" << run.err;
     EXPECT_LT(run.seconds, 30) << test.arguments;
   }
-  EXPECT_EQ(e2e::ReadFile(fine), "int x = 1;\n");
+  EXPECT_EQ(vexil_test::ReadFile(fine), "int x = 1;\n");
   Result json = Vexil("lsp --json -- vexil-no-such-server --hover main.cpp:1:1");
   EXPECT_EQ(json.out.rfind(R"({"action":"start","failed":true,"error":"vexil-no-such-server did not start: )", 0), 0u)
       << json.out;

@@ -1,41 +1,28 @@
-// Helpers for the end-to-end tests: start records for clangd and pylsp, the example
-// projects' files, positions found by the text at them, and an error-line recorder.
+// Helpers for the end-to-end tests: start records for clangd and pylsp that trace into the
+// shared trace log, the example projects' files and positions found by the text at them.
 #pragma once
 
 #include <gtest/gtest.h>
-#include <signal.h>
 #include <unistd.h>
 
 #include <algorithm>
-#include <atomic>
 #include <chrono>
-#include <fstream>
 #include <map>
-#include <sstream>
 #include <string>
-#include <thread>
 #include <vector>
 
 #include "vexil/client/languages.h"
 #include "vexil/client/uri.h"
 #include "vexil/host/language_server.h"
+#include "vexil_test/support.h"
+#include "vexil_test/trace_log.h"
 
 namespace e2e {
 
 // Real servers on a loaded machine (and under sanitizers) get a generous wait.
 constexpr int kTimeoutMs = 15000;
-
-// Counts the "Error" lines a connection traces; reader threads may report too.
-class ErrorLines {
- public:
-  static void Callback(TraceType type, const char* title, const char* text) {
-    if (std::string(title) == "Error") ++count_;
-  }
-  static int Count() { return count_; }
-
- private:
-  static inline std::atomic<int> count_{0};
-};
+// How long a test waits for what a real server does in the background (indexing, progress).
+constexpr std::chrono::seconds kPatience{60};
 
 struct Project {
   std::string directory;  // absolute
@@ -48,7 +35,7 @@ inline Project Python() { return {VEXIL_EXAMPLES "/python", "pylsp", ""}; }
 
 inline xServerStart StartRecord(const Project& project, const std::string& name) {
   xServerStart start;
-  start.trace = &ErrorLines::Callback;
+  start.trace = &vexil_test::TraceLog::Callback;
   start.level = LSP::TraceLevel::Off;
   start.timeout = kTimeoutMs;
   start.executable = project.executable;
@@ -69,17 +56,10 @@ inline xServerInitialise InitRecord(const Project& project) {
 inline std::string Path(const Project& project, const std::string& file) { return project.directory + "/" + file; }
 inline std::string Uri(const Project& project, const std::string& file) { return FileToUri(Path(project, file).c_str()); }
 
-inline std::string ReadFile(const std::string& path) {
-  std::ifstream in(path, std::ios::binary);
-  std::ostringstream text;
-  text << in.rdbuf();
-  return text.str();
-}
-
 // The position `offset` bytes into the first occurrence of `needle` in `file`.
 inline LSP::Position Find(const Project& project, const std::string& file, const std::string& needle,
                           std::size_t offset = 0) {
-  std::string text = ReadFile(Path(project, file));
+  std::string text = vexil_test::ReadFile(Path(project, file));
   std::size_t at = text.find(needle);
   if (at == std::string::npos) return LSP::Position(-1, -1);
   at += offset;
@@ -106,20 +86,8 @@ inline void Open(xLanguageServer& server, const Project& project, const std::str
   params.textDocument.uri = Uri(project, file);
   params.textDocument.languageId = languages.LanguageId(file.substr(file.rfind('.') + 1).c_str());
   params.textDocument.version = 1;
-  params.textDocument.text = ReadFile(Path(project, file));
+  params.textDocument.text = vexil_test::ReadFile(Path(project, file));
   server.TextDocument_DidOpen(&params);
-}
-
-// Polls `condition` until it holds or `seconds` pass (real servers on a loaded machine are
-// slow); says whether it held.
-template <typename Condition>
-bool Await(Condition condition, int seconds = 60) {
-  auto deadline = std::chrono::steady_clock::now() + std::chrono::seconds(seconds);
-  while (!condition()) {
-    if (std::chrono::steady_clock::now() > deadline) return false;
-    std::this_thread::sleep_for(std::chrono::milliseconds(20));
-  }
-  return true;
 }
 
 template <typename P = LSP::TextDocumentPositionParams>
@@ -151,14 +119,14 @@ inline bool EndsWith(const std::string& text, const std::string& end) {
 
 // Kills a server this test started, by its process id, and waits until it is gone.
 inline bool Kill(xLanguageServer& server) {
-  if (server.Id() > 0) ::kill(server.Id(), SIGKILL);
-  return Await([&] { return !server.IsRunning(); });
+  vexil_test::KillProcess(server.Id());
+  return vexil_test::WaitFor([&] { return !server.IsRunning(); }, kPatience);
 }
 
 // Exit gives a server about a second to end and, when it has not, returns false and leaves
 // the connection usable: on a loaded machine a host (and a test) asks again.
 inline bool Exits(xLanguageServer& server) {
-  return Await([&] { return server.Exit(); }, 30);
+  return vexil_test::WaitFor([&] { return server.Exit(); });
 }
 
 }  // namespace e2e

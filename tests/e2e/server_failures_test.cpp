@@ -29,12 +29,12 @@ TEST(ServerFailures, ServersAnswerForTheirOwnProjectsThroughAMissingCommandARest
 
   Project nowhere = Cpp();
   nowhere.executable = "vexil-no-such-language-server";
-  int errorsBefore = ErrorLines::Count();
+  const std::size_t errorsBefore = vexil_test::TraceLog::Texts("Error").size();
   xLanguageServer* missing = Vexil_Start(StartRecord(nowhere, "missing"));
   EXPECT_FALSE(missing->Start(InitRecord(nowhere)));
   EXPECT_FALSE(missing->IsRunning());
   EXPECT_EQ(missing->Id(), -1);
-  EXPECT_GT(ErrorLines::Count(), errorsBefore);
+  EXPECT_GT(vexil_test::TraceLog::Texts("Error").size(), errorsBefore);
   EXPECT_TRUE(missing->Exit());
   EXPECT_EQ(Vexil_Have("missing"), nullptr);
 

@@ -6,27 +6,21 @@
 #include <memory>
 #include <string>
 
-#include "../watch/watch_fixture.h"
+#include "vexil_test/support.h"
+#include "vexil_test/trace_log.h"
 #include "vexil/task/watcher_task.h"
 #include "vexil/watch/watcher.h"
 #include "vexil/watch/watcher_ex.h"
 
 namespace {
 
-watchtest::Shared heard;  // over what the library's threads report below
+using vexil_test::TraceLog;
+
+vexil_test::Shared heard;  // over what the library's threads report below
 std::string lastName;
-int traceLines = 0;
 
 void OnChange(xWatcherProjectEx*, xChangeEvent* event) {
   heard.Update([&] { lastName = event->name; });
-}
-
-void OnTrace(TraceType, const char*, const char*) {
-  heard.Update([] { ++traceLines; });
-}
-
-int TraceLines() {
-  return heard.Read([] { return traceLines; });
 }
 
 }  // namespace
@@ -40,20 +34,20 @@ TEST(WatchExports, ChangeRecordAndBothWatchersAreReachable) {
   const std::string root = directory.Path().string();
   {
     std::unique_ptr<xWatcherWorkspaceEx> watcher(
-        xWatcher_WorkspaceEx(OnChange, OnTrace, LSP::TraceLevel::Verbose));
+        xWatcher_WorkspaceEx(OnChange, &TraceLog::Callback, LSP::TraceLevel::Verbose));
     watcher->Start("project", root.c_str(), nullptr);
     std::ofstream(root + "/created.txt").put('x');
     EXPECT_TRUE(heard.WaitUntil([] { return lastName == "created.txt"; }));
   }
-  std::unique_ptr<xWatcherWorkspace> tree(xWatcher_Workspace(OnChange, OnTrace, LSP::TraceLevel::Verbose));
-  const int before = TraceLines();
+  std::unique_ptr<xWatcherWorkspace> tree(xWatcher_Workspace(OnChange, &TraceLog::Callback, LSP::TraceLevel::Verbose));
+  const std::size_t before = TraceLog::Lines().size();
   tree->Start("project", root.c_str(), nullptr);
-  EXPECT_GT(TraceLines(), before);
+  EXPECT_GT(TraceLog::Lines().size(), before);
 }
 
 TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   xWatcherOptions options;
-  options.trace = OnTrace;
+  options.trace = &TraceLog::Callback;
   options.level = LSP::TraceLevel::Verbose;
   options.arguments = "echo $FN";
   options.flag = true;
@@ -61,7 +55,7 @@ TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   EXPECT_EQ(copy.arguments, "echo $FN");
 
   const vexil_test::TempDirectory directory;
-  const int before = TraceLines();
+  const std::size_t before = TraceLog::Lines().size();
   xWatcherTask* task = xWatcher_Task("exported", copy, {directory.Path().string()});
   ASSERT_NE(task, nullptr);
   EXPECT_EQ(xWatcher_Have("exported"), task);
@@ -71,5 +65,5 @@ TEST(TaskExports, RecordAndBothTaskExportsAreReachable) {
   task->Stop();
   task->Release();
   EXPECT_EQ(xWatcher_Have("exported"), nullptr);
-  EXPECT_GT(TraceLines(), before);
+  EXPECT_GT(TraceLog::Lines().size(), before);
 }

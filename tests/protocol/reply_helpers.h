@@ -5,7 +5,6 @@
 
 #include <gtest/gtest.h>
 
-#include <fstream>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -15,15 +14,14 @@
 #include "vexil/protocol/feature_results.h"
 #include "vexil/protocol/message.h"
 #include "vexil/protocol/structures.h"
+#include "vexil_test/support.h"
 
 namespace vexil_test {
 
 inline std::string ReadDataFile(const std::string& relative) {
-  std::ifstream file(std::string(VEXIL_TEST_DATA) + "/" + relative, std::ios::binary);
-  EXPECT_TRUE(file) << relative;
-  std::ostringstream text;
-  text << file.rdbuf();
-  return text.str();
+  const std::string text = ReadFile(std::string(VEXIL_TEST_DATA) + "/" + relative);
+  EXPECT_FALSE(text.empty()) << relative;
+  return text;
 }
 
 // Reads a whole reply into `result`; returns the response for its id and error.

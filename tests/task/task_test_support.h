@@ -1,4 +1,4 @@
-// Helpers for the task tests: options that trace into the shared recording, waits for trace
+// Helpers for the task tests: options that trace into the trace log, waits for trace
 // lines and for processes to be gone, and the fixture of the watcher-command tests.
 #pragma once
 
@@ -20,16 +20,16 @@ namespace tasktest {
 
 using vexil::xFileTags;
 using vexil::xWatcherEvent;
+using vexil_test::TraceLine;
+using vexil_test::TraceLog;
 using watchtest::Error;
 using watchtest::kDeadline;
-using watchtest::Recorded;
-using watchtest::TraceLine;
 using watchtest::Verbose;
 using watchtest::WaitForTrace;
 
 inline xWatcherOptions Options(const std::string& arguments, int timeout = 10000, bool useCommand = true) {
   xWatcherOptions options;
-  options.trace = &watchtest::RecordTrace;
+  options.trace = &TraceLog::Callback;
   options.level = LSP::TraceLevel::Verbose;
   options.timeout = timeout;
   options.useCommand = useCommand;
@@ -50,26 +50,24 @@ inline TraceLine Notice(const std::string& title, const std::string& text) {
 inline TraceLine Message(const std::string& text) { return {TraceType::Line, "Message", text}; }
 
 inline bool Traced(const TraceLine& wanted) {
-  return Recorded().shared.Read(
-      [&] { return std::find(Recorded().traces.begin(), Recorded().traces.end(), wanted) != Recorded().traces.end(); });
+  const std::vector<TraceLine> lines = TraceLog::Lines();
+  return std::find(lines.begin(), lines.end(), wanted) != lines.end();
 }
 
 // A text traced under `title` that contains `piece`.
 inline bool WaitForText(const std::string& title, const std::string& piece,
                         std::chrono::milliseconds deadline = kDeadline) {
-  return watchtest::WaitForTraceWhere(
+  return TraceLog::WaitUntilTraced(
       [&](const TraceLine& line) { return line.title == title && line.text.find(piece) != std::string::npos; }, deadline);
 }
 
 // Appends to `path` until `piece` is traced under `title`: a directory watcher that has
 // only just started may miss a first write.
 inline bool ModifyUntilTraced(const std::string& path, const std::string& title, const std::string& piece) {
-  const auto end = std::chrono::steady_clock::now() + kDeadline;
-  while (std::chrono::steady_clock::now() < end) {
+  return vexil_test::WaitFor([&] {
     std::ofstream(path, std::ios::app) << "changed\n";
-    if (WaitForText(title, piece, std::chrono::milliseconds(500))) return true;
-  }
-  return false;
+    return WaitForText(title, piece, std::chrono::milliseconds(500));
+  });
 }
 
 // Gone means ended and collected: a zombie still counts as existing.

@@ -30,10 +30,9 @@ TEST_F(WatcherCommand, OutputIsTracedAndTheEndReportedOnceTheCommandEnds) {
   for (const std::string& text : std::vector<std::string>{"Content-Length: 900000000\n", "\n", std::string(4095, 'x'),
                                                           "1\n", "200000\n", "built a.cpp\n", "unended\n"})
     EXPECT_TRUE(Traced(Message(text))) << text.substr(0, 30);
-  EXPECT_EQ(Recorded().shared.Read([] {
-              return std::count_if(Recorded().traces.begin(), Recorded().traces.end(),
-                                   [](const TraceLine& line) { return line.text.find("xx") != std::string::npos; });
-            }),
+  const std::vector<TraceLine> lines = TraceLog::Lines();
+  EXPECT_EQ(std::count_if(lines.begin(), lines.end(),
+                          [](const TraceLine& line) { return line.text.find("xx") != std::string::npos; }),
             1);
   EXPECT_TRUE(event->Command().Completed());
   EXPECT_FALSE(event->Command().HaveErrors());

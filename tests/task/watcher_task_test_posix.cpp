@@ -115,7 +115,7 @@ TEST_F(WatcherTaskTest, ChangedFilesWithWatchedExtensionsRunTheCommandOnceEnable
 std::atomic<xWatcherTask*> releasing{nullptr};
 
 void ReleaseOnNotice(TraceType type, const char* title, const char* text) {
-  watchtest::RecordTrace(type, title, text);
+  TraceLog::Callback(type, title, text);
   if (xWatcherTask* task = releasing.load(); task && type == TraceType::Notice) task->Release();
 }
 
@@ -176,14 +176,11 @@ TEST_F(WatcherTaskTest, ReleaseWhileACommandRunsNeitherWaitsForItNorKillsIt) {
   EXPECT_LT(std::chrono::steady_clock::now() - begin, std::chrono::seconds(10));  // not the child's 30 s
   EXPECT_TRUE(Traced(Error("ERROR: The Watcher Command task is still running.\n")));
   // One save may be reported as several modifications, each starting a child.
-  const std::vector<int> pids = Recorded().shared.Read([] {
-    std::vector<int> found;
-    for (const TraceLine& line : Recorded().traces) {
-      const auto at = line.text.find("pid ");
-      if (line.title == "Message" && at != std::string::npos) found.push_back(std::stoi(line.text.substr(at + 4)));
-    }
-    return found;
-  });
+  std::vector<int> pids;
+  for (const TraceLine& line : TraceLog::Lines()) {
+    const auto at = line.text.find("pid ");
+    if (line.title == "Message" && at != std::string::npos) pids.push_back(std::stoi(line.text.substr(at + 4)));
+  }
   for (const int pid : pids) {
     ASSERT_GT(pid, 0);  // kill(0) would signal the whole test run
     EXPECT_EQ(kill(pid, 0), 0) << "never killed by the library";

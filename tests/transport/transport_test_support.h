@@ -1,12 +1,10 @@
-// Helpers for the transport tests: a trace recorder behind the plain callback, params
-// that script the fake server per request, and start records that launch it.
+// Helpers for the transport tests: params that script the fake server per request, start
+// records that launch it, traced into the shared trace log.
 #pragma once
 
 #include <gtest/gtest.h>
 
-#include <algorithm>
 #include <memory>
-#include <mutex>
 #include <string>
 #include <vector>
 
@@ -15,50 +13,11 @@
 #include "vexil/host/records.h"
 #include "vexil/protocol/message.h"
 #include "vexil_test/support.h"
+#include "vexil_test/trace_log.h"
 
 namespace transport_test {
 
-struct TraceLine {
-  std::string title;
-  std::string text;
-};
-
-// Every line the library traces goes here; reader threads trace too, hence the lock.
-class TraceLog {
- public:
-  static void Callback(TraceType type, const char* title, const char* text) {
-    std::lock_guard<std::mutex> lock(mutex_);
-    lines_.push_back({title, text});
-  }
-  static void Clear() {
-    std::lock_guard<std::mutex> lock(mutex_);
-    lines_.clear();
-  }
-  static std::vector<TraceLine> Lines() {
-    std::lock_guard<std::mutex> lock(mutex_);
-    return lines_;
-  }
-  // The texts in order, optionally only those under `title`.
-  static std::vector<std::string> Texts(const std::string& title = "") {
-    std::vector<std::string> texts;
-    for (const TraceLine& line : Lines()) {
-      if (title.empty() || line.title == title) texts.push_back(line.text);
-    }
-    return texts;
-  }
-  static int Count(const std::string& text) {
-    const std::vector<std::string> texts = Texts();
-    return static_cast<int>(std::count(texts.begin(), texts.end(), text));
-  }
-  static bool Contains(const std::string& piece) {
-    const std::vector<std::string> texts = Texts();
-    return std::any_of(texts.begin(), texts.end(), [&](const std::string& text) { return text.find(piece) != std::string::npos; });
-  }
-
- private:
-  static inline std::mutex mutex_;
-  static inline std::vector<TraceLine> lines_;
-};
+using vexil_test::TraceLog;
 
 inline const std::string kHint =
     "For extra debug information, edit the Document Type and in the Language Server panel set the Trace Level to "

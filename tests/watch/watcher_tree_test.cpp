@@ -31,7 +31,7 @@ class WatcherTreeTest : public ::testing::Test {
 
   // The lines written since the last call.
   std::vector<TraceLine> Taken() {
-    std::vector<TraceLine> all = Traces();
+    std::vector<TraceLine> all = TraceLog::Lines();
     std::vector<TraceLine> fresh(all.begin() + static_cast<std::ptrdiff_t>(seen_), all.end());
     seen_ = all.size();
     return fresh;

@@ -50,15 +50,15 @@ TEST_F(WatcherWorkspaceExTest, NumbersStartsAndTracesFailuresExactly) {
   workspace->Start("one", a.c_str(), nullptr);
   workspace->Start("two", file.c_str(), nullptr);
   workspace->Start("three", b.c_str(), nullptr);
-  EXPECT_EQ(Traces(), (std::vector<TraceLine>{
-                          Verbose("WatcherWorkspace::Start - Project: one  Directory: " + a + "\n"),
-                          Verbose("Watcher started on ID: 1\n"),
-                          Verbose("WatcherWorkspace::Start - Project: two  Directory: " + file + "\n"),
-                          Error("Path provided is not a directory: " + file + "\n"),
-                          Verbose("Failed to start watcher.\n"),
-                          Verbose("WatcherWorkspace::Start - Project: three  Directory: " + b + "\n"),
-                          Verbose("Watcher started on ID: 3\n"),
-                      }));
+  EXPECT_EQ(TraceLog::Lines(), (std::vector<TraceLine>{
+                                   Verbose("WatcherWorkspace::Start - Project: one  Directory: " + a + "\n"),
+                                   Verbose("Watcher started on ID: 1\n"),
+                                   Verbose("WatcherWorkspace::Start - Project: two  Directory: " + file + "\n"),
+                                   Error("Path provided is not a directory: " + file + "\n"),
+                                   Verbose("Failed to start watcher.\n"),
+                                   Verbose("WatcherWorkspace::Start - Project: three  Directory: " + b + "\n"),
+                                   Verbose("Watcher started on ID: 3\n"),
+                               }));
 
   // The failed start used up id 2: the third project's changes carry id 3.
   Touch(second / "x");
@@ -96,7 +96,7 @@ TEST_F(WatcherWorkspaceExTest, DeliversChangesAsEventsWithRenamesPairedAndBelowV
   EXPECT_EQ(std::make_tuple(first.project, first.root, first.userData),
             std::make_tuple(std::string("proj"), root.Path().string(), static_cast<const void*>(&userData)));
   EXPECT_EQ(Events().size(), steps.size());
-  EXPECT_EQ(Traces(), (std::vector<TraceLine>{Error("Cannot create directory handle: 2\n")}));
+  EXPECT_EQ(TraceLog::Lines(), (std::vector<TraceLine>{Error("Cannot create directory handle: 2\n")}));
 }
 
 // What the change callback below acts on: the callbacks are plain functions.
@@ -147,12 +147,12 @@ TEST_F(WatcherWorkspaceExTest, StopKeepsWatchingAndDestructionEndsCallbacks) {
   });
   ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 20; }));
   ASSERT_TRUE(ReturnsWithin(kDeadline, [&] { workspace.reset(); })) << "destruction hung";
-  const std::size_t events = Events().size(), traces = Traces().size();
+  const std::size_t events = Events().size(), traces = TraceLog::Lines().size();
   for (int i = 0; i < 200; ++i) Touch(root / "after");
   stop = true;
   writer.join();
   EXPECT_EQ(Events().size(), events);
-  EXPECT_EQ(Traces().size(), traces);
+  EXPECT_EQ(TraceLog::Lines().size(), traces);
 }
 
 }  // namespace

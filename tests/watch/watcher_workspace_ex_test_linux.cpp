@@ -21,7 +21,7 @@ TEST(WatcherWorkspaceExLinux, ARootThatDisappearsIsReportedBelowVerbose) {
   workspace->Start("kept", root.c_str(), nullptr);
   fs::remove_all(root);
   ASSERT_TRUE(WaitForTrace(Error("Watcher: 1 no longer operating.\n")));
-  EXPECT_EQ(Traces(), (std::vector<TraceLine>{Error("Watcher: 1 no longer operating.\n")}));
+  EXPECT_EQ(TraceLog::Lines(), (std::vector<TraceLine>{Error("Watcher: 1 no longer operating.\n")}));
 }
 
 }  // namespace

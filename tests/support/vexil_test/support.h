@@ -1,10 +1,15 @@
 // Portable helpers for tests: a temporary directory removed with its contents, control
-// over processes a test started (the library itself never kills a child), polling, framing.
+// over processes a test started (the library itself never kills a child), polling, waiting
+// on what callbacks collect, reading a file, framing.
 #pragma once
 
 #include <chrono>
+#include <condition_variable>
 #include <filesystem>
+#include <fstream>
 #include <functional>
+#include <iterator>
+#include <mutex>
 #include <string>
 #include <thread>
 
@@ -45,6 +50,42 @@ inline bool WaitFor(const std::function<bool()>& condition,
   }
   return true;
 }
+
+// The bytes of the file at `path`; empty when it cannot be read.
+inline std::string ReadFile(const std::filesystem::path& path) {
+  std::ifstream file(path, std::ios::binary);
+  return std::string(std::istreambuf_iterator<char>(file), {});
+}
+
+// Guards whatever a test collects from callbacks and lets the test thread wait on it.
+class Shared {
+ public:
+  // Notifies under the lock: a waiter that returns may end the process, and a callback
+  // thread must not touch this object after it could have.
+  template <typename Change>
+  void Update(Change change) {
+    std::lock_guard<std::mutex> lock(mutex_);
+    change();
+    changed_.notify_all();
+  }
+
+  // True when `condition` held before the deadline.
+  bool WaitUntil(const std::function<bool()>& condition,
+                 std::chrono::milliseconds deadline = std::chrono::seconds(30)) {
+    std::unique_lock<std::mutex> lock(mutex_);
+    return changed_.wait_for(lock, deadline, condition);
+  }
+
+  template <typename Reader>
+  auto Read(Reader read) {
+    std::lock_guard<std::mutex> lock(mutex_);
+    return read();
+  }
+
+ private:
+  std::mutex mutex_;
+  std::condition_variable changed_;
+};
 
 // `body` as a server frames it on the wire.
 inline std::string Frame(const std::string& body) {
