@@ -1,7 +1,6 @@
-// Helpers of the text helper tests: edits, document edits of a file, and a file's bytes.
+// Helpers of the text helper tests: edits, and document edits of a file.
 #pragma once
 
-#include <fstream>
 #include <string>
 #include <vector>
 
@@ -23,11 +22,6 @@ inline LSP::TextDocumentEdit DocumentEdit(const std::string& path, std::vector<L
   document.textDocument.uri = path.find("://") != std::string::npos ? path : FileToUri(path.c_str());
   document.edits = std::move(edits);
   return document;
-}
-
-inline std::string Content(const std::string& path) {
-  std::ifstream file(path, std::ios::binary);
-  return std::string(std::istreambuf_iterator<char>(file), {});
 }
 
 }  // namespace vexil_test

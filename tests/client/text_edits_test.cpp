@@ -11,7 +11,7 @@
 namespace {
 
 using LSP::PositionEncoding;
-using vexil_test::Content;
+using vexil_test::ReadFile;
 using vexil_test::DocumentEdit;
 using vexil_test::Edit;
 
@@ -110,8 +110,8 @@ TEST(ApplyWorkspaceEdit, EditsEveryFileOrLeavesEveryFileAsItWas) {
     std::string error;
     EXPECT_FALSE(LSP::ApplyWorkspaceEdit(edit, error));
     EXPECT_EQ(error.rfind(row.error, 0), 0u) << error;
-    EXPECT_EQ(Content(a), "one\ntwo\n");
-    EXPECT_EQ(Content(b), "x\xF0\x9F\x98\x80y\n");
+    EXPECT_EQ(ReadFile(a), "one\ntwo\n");
+    EXPECT_EQ(ReadFile(b), "x\xF0\x9F\x98\x80y\n");
     EXPECT_EQ(Entries(directory.Path()), 3u) << "a temporary file was left behind";
   }
 
@@ -121,8 +121,8 @@ TEST(ApplyWorkspaceEdit, EditsEveryFileOrLeavesEveryFileAsItWas) {
                           DocumentEdit(directory / "missing.txt", {})};
   std::string error;
   EXPECT_TRUE(LSP::ApplyWorkspaceEdit(edit, error)) << error;
-  EXPECT_EQ(Content(a), "1\ntwo\n");
-  EXPECT_EQ(Content(b), "x\xF0\x9F\x98\x80Y\n");
+  EXPECT_EQ(ReadFile(a), "1\ntwo\n");
+  EXPECT_EQ(ReadFile(b), "x\xF0\x9F\x98\x80Y\n");
   EXPECT_EQ(Entries(directory.Path()), 3u);
 }
 

@@ -13,7 +13,7 @@
 
 namespace {
 
-using vexil_test::Content;
+using vexil_test::ReadFile;
 
 LSP::TextDocumentEdit Replace(const std::string& path, const std::string& text) {
   return vexil_test::DocumentEdit(path, {vexil_test::Edit(0, 0, 9, 0, text)});
@@ -53,7 +53,7 @@ TEST(ApplyWorkspaceEdit, WritesThroughLinksKeepingTheModeAndUndoesNothingHalfWri
   std::string error;
   ASSERT_TRUE(LSP::ApplyWorkspaceEdit(edit, error)) << error;
   EXPECT_TRUE(std::filesystem::is_symlink(link));
-  EXPECT_EQ(Content(target), "new\n");
+  EXPECT_EQ(ReadFile(target), "new\n");
   struct stat status;
   ASSERT_EQ(stat(target.c_str(), &status), 0);
   EXPECT_EQ(status.st_mode & 07777, 0640u);
@@ -66,8 +66,8 @@ TEST(ApplyWorkspaceEdit, WritesThroughLinksKeepingTheModeAndUndoesNothingHalfWri
     EXPECT_FALSE(LSP::ApplyWorkspaceEdit(edit, error));
   }
   EXPECT_EQ(error, "Cannot write " + big + ": File too large");
-  EXPECT_EQ(Content(target), "new\n");
-  EXPECT_EQ(Content(big), "small\n");
+  EXPECT_EQ(ReadFile(target), "new\n");
+  EXPECT_EQ(ReadFile(big), "small\n");
   EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory / "real"), {}), 1);
   EXPECT_EQ(std::distance(std::filesystem::directory_iterator(directory.Path()), {}), 3);
 }

@@ -10,7 +10,7 @@
 
 namespace {
 
-using vexil_test::Content;
+using vexil_test::ReadFile;
 
 LSP::TextDocumentEdit Append(const std::string& path, const std::string& text) {
   return vexil_test::DocumentEdit(path, {vexil_test::Edit(9, 0, 9, 0, text)});
@@ -33,7 +33,7 @@ TEST(ApplyWorkspaceEdit, FilesThatCannotBeReplacedAreRefusedBeforeAnyIsWritten) 
     std::string error;
     EXPECT_FALSE(LSP::ApplyWorkspaceEdit(edit, error));
     EXPECT_EQ(error.rfind("Cannot write ", 0), 0u) << error;
-    EXPECT_EQ(Content(free), "text\n");
+    EXPECT_EQ(ReadFile(free), "text\n");
   }
   CloseHandle(holder);
   SetFileAttributesA(readOnly.c_str(), FILE_ATTRIBUTE_NORMAL);
@@ -42,7 +42,7 @@ TEST(ApplyWorkspaceEdit, FilesThatCannotBeReplacedAreRefusedBeforeAnyIsWritten) 
   edit.documentChanges = {Append(free, "more\n"), Append(held, "more\n")};
   std::string error;
   EXPECT_TRUE(LSP::ApplyWorkspaceEdit(edit, error)) << error;
-  EXPECT_EQ(Content(held), "text\nmore\n");
+  EXPECT_EQ(ReadFile(held), "text\nmore\n");
 }
 
 }  // namespace
