@@ -10,7 +10,9 @@ endif()
 
 option(VEXIL_COVERAGE "Instrument every target for gcov line and branch coverage (gcc)" OFF)
 if(VEXIL_COVERAGE)
-  add_compile_options(--coverage -O0)
+  # Atomic counters: the library's threads run the same code at once, and racing updates
+  # leave counts gcovr cannot read (a branch "taken -2").
+  add_compile_options(--coverage -O0 -fprofile-update=atomic)
   add_link_options(--coverage)
 endif()
 
