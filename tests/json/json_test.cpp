@@ -65,20 +65,26 @@ std::string Written(WriteMembers write) {
 
 }  // namespace
 
+// A byte order mark is skipped byte by byte, and a NUL byte ends the text, with the caret
+// still under the error's place in the whole text.
 TEST(xReader, ParseErrorsShowTextAndCaretUnderTheOffset) {
-  const std::pair<const char*, const char*> rows[] = {
+  using namespace std::string_literals;
+  const std::pair<std::string, std::string> rows[] = {
       {"{\"a\":}", "Invalid value.\n\n\n{\"a\":}\n     ^"},
       {"", "The document is empty.\n\n\n\n^"},
       {"{} {}", "The document root must not be followed by other values.\n\n\n{} {}\n   ^"},
       {"[1,", "Invalid value.\n\n\n[1,\n   ^"},
       {"{\"s\":\"\\x\"}", "Invalid escape character in string.\n\n\n{\"s\":\"\\x\"}\n      ^"},
+      {"\xEF\xBB\xBF{\"a\":}", "Invalid value.\n\n\n\xEF\xBB\xBF{\"a\":}\n        ^"},
+      {"{\"s\":\"a\0b\"}"s, "Missing a closing quotation mark in string.\n\n\n{\"s\":\"a\0b\"}\n       ^"s},
+      {"\xBF\xEF{}"s, "Invalid value.\n\n\n\xBF\xEF{}\n ^"},
   };
   LSP::xReader reader;
   for (const auto& [text, error] : rows) {
     EXPECT_FALSE(reader.Parse(text)) << text;
     EXPECT_EQ(reader.Error(), error) << text;
   }
-  EXPECT_TRUE(reader.Parse("{\"a\":1}"));
+  EXPECT_TRUE(reader.Parse("\xBB{\"a\":1}\0{}"s));
   EXPECT_EQ(reader.Error(), "");
   EXPECT_EQ(reader.Root().Int("a"), 1);
 }
