@@ -36,14 +36,20 @@ void NoteOpenOnly(Session& session, const Outcome& outcome) {
             << "files it has not indexed are not included (open them first with --open)\n";
 }
 
+// The answer to `action` in the form asked for; a failure has no readable answer (its
+// line goes to stderr).
+std::string Rendered(const LspOptions& options, const Action& action, const Outcome& outcome) {
+  std::ostringstream text;
+  if (options.json) PrintJson(text, action, outcome);
+  else if (!outcome.failed) PrintReadable(text, action, outcome);
+  return text.str();
+}
+
 // The file's diagnostics as --diagnostics prints them.
 std::string DiagnosticsText(xLanguageServer& server, const LspOptions& options, const Action& action) {
   Outcome outcome;
   outcome.diagnostics = server.TextDocument_Diagnostics(FileToUri(action.path.c_str()).c_str());
-  std::ostringstream text;
-  if (options.json) PrintJson(text, action, outcome);
-  else PrintReadable(text, action, outcome);
-  return text.str();
+  return Rendered(options, action, outcome);
 }
 
 // --watch: the session stays open while the library tells the server about files changed
@@ -137,11 +143,9 @@ int RunLsp(const Arguments& arguments) {
     Outcome outcome = Perform(session, action);
     if (Interrupted()) break;
     EndProgressLine();  // an answer on the same terminal starts at the margin
-    std::ostringstream text;
-    if (options.json) PrintJson(text, action, outcome);
-    else if (!outcome.failed) PrintReadable(text, action, outcome);
-    std::cout << text.str() << std::flush;
-    if (action.kind == ActionKind::Diagnostics) printed[&action] = text.str();
+    const std::string text = Rendered(options, action, outcome);
+    std::cout << text << std::flush;
+    if (action.kind == ActionKind::Diagnostics) printed[&action] = text;
     if (outcome.failed) {
       status = 1;
       std::cerr << "vexil: " << Describe(action) << ": " << outcome.why << "\n";
