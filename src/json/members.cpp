@@ -8,29 +8,9 @@
 
 #include "json/json_errors.h"
 #include "json/member_values.h"
+#include "json/short_names.h"
 
 namespace LSP {
-namespace {
-
-template <typename Word>
-Word Load(const char* bytes) {
-  Word word;
-  std::memcpy(&word, bytes, sizeof word);
-  return word;
-}
-
-// Member names are short: two overlapping word loads compare 4 to 16 bytes without a call.
-bool SameBytes(const char* a, const char* b, std::uint32_t length) {
-  if (length >= 8 && length <= 16)
-    return Load<std::uint64_t>(a) == Load<std::uint64_t>(b) &&
-           Load<std::uint64_t>(a + length - 8) == Load<std::uint64_t>(b + length - 8);
-  if (length >= 4 && length < 8)
-    return Load<std::uint32_t>(a) == Load<std::uint32_t>(b) &&
-           Load<std::uint32_t>(a + length - 4) == Load<std::uint32_t>(b + length - 4);
-  return std::memcmp(a, b, length) == 0;
-}
-
-}  // namespace
 
 MemberNames::MemberNames(std::initializer_list<const char*> names) {
   if (names.size() > kMost) throw AssertException("names.size() <= kMost");
@@ -57,7 +37,7 @@ Members::Members(const xObject& value, const MemberNames& names) : value_(value)
     const char* text = member->name.GetString();
     for (std::uint8_t slot = names.buckets_[length % MemberNames::kBuckets]; slot != MemberNames::kNone;
          slot = names.next_[slot]) {
-      if (names.lengths_[slot] != length || !SameBytes(names.names_[slot], text, length)) continue;
+      if (names.lengths_[slot] != length || !SameNameBytes(names.names_[slot], text, length)) continue;
       // A later duplicate finds its slot taken: the first one wins, as a search finds it.
       if (!Found(slot)) {
         members_[slot] = &member->value;

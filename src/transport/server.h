@@ -140,8 +140,9 @@ class xServer {
   const char* Join(const std::vector<std::string>& list, const char* separator);
 
  private:
-  // Reply and HaveId that leave the reply's parsed document in `parsed` / `reader`.
-  std::string Reply(int id, std::unique_ptr<LSP::xReader>& parsed);
+  // Reply and HaveId that leave the reply's parsed document in `parsed` / `reader`; a
+  // reply read straight into `response` (when given) leaves no document.
+  std::string Reply(int id, std::unique_ptr<LSP::xReader>& parsed, LSP::ResponseMessage* response);
   bool HaveId(int id, const std::string& text, LSP::xReader& reader);
   bool WriteMessage(LSP::MessageBase& message);
   bool Transmit(const std::string& body, bool reportReaderErrors);

@@ -8,6 +8,7 @@
 #include <stdexcept>
 
 #include "json/json_depth.h"
+#include "protocol/completion_events.h"
 #include "protocol/raw_json.h"
 #include "transport/server.h"
 #include "transport/server_requests.h"
@@ -95,10 +96,10 @@ void xServer::ReportReaderErrors() const {
 
 std::string xServer::Reply(int id) {
   std::unique_ptr<LSP::xReader> parsed;
-  return Reply(id, parsed);
+  return Reply(id, parsed, nullptr);
 }
 
-std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
+std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed, LSP::ResponseMessage* response) {
   lastWaitTicks_ = 0;
   if (!IsRunning()) {
     EndRequest();
@@ -136,6 +137,12 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed) {
       }
       CancelRequest(id);
       return "";
+    }
+    // A completion list is read as it is parsed; the document read judges every other text.
+    if (response && LSP::ReadCompletionReply(text, id, *response)) {
+      EndRequest();
+      tracer_.Message("Reply: %s%s", text.c_str(), LineEnd(text));
+      return text;
     }
     // A fresh reader for each text: a document keeps the memory of every earlier parse.
     auto reader = std::make_unique<LSP::xReader>();
@@ -214,9 +221,10 @@ bool xServer::HaveId(int id, const std::string& text, LSP::xReader& reader) {
 void xServer::Read(int id, LSP::ResponseMessage& response) {
   try {
     if (!IsRunning()) throw std::runtime_error("A server read was requested but the server is not running.");
-    // The reply was parsed once to recognise it; the same document is read here.
+    // The reply was parsed once to recognise it; the same document is read here, unless
+    // it was read into the response already.
     std::unique_ptr<LSP::xReader> reader;
-    std::string text = Reply(id, reader);
+    std::string text = Reply(id, reader, &response);
     if (reader && reader->Error().empty()) response.Read(*reader);
     if (!response.HaveError()) return;
     errorMessage_ = response.ErrorMessage();

@@ -1,5 +1,6 @@
 // A reply text parsed by xReader, judged as a parse of its counted bytes judges it, and
-// read into every result class, as the transport does with a server's answer.
+// read into every result class, as the transport does with a server's answer; and read as
+// a completion reply from the parser's events, which must agree with the document read.
 #include <cstdint>
 #include <string>
 
@@ -18,5 +19,13 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
       (!parsed && reader.Error().rfind(rapidjson::GetParseError_En(counted.GetParseError()), 0) != 0))
     __builtin_trap();
   if (parsed) fuzz::ReadIntoEveryResult(reader);
+  // A completion reply read from the parser's events holds what the document read holds,
+  // or is left to it untouched; the id it awaits is the text's own when it has one.
+  const int id =
+      parsed && reader.Root().IsObject() && reader.Root().Value().HasMember("id") && reader.Root().Value()["id"].IsInt()
+          ? reader.Root().Value()["id"].GetInt()
+          : 1;
+  const std::string both = fuzz::ReadBothWays(text, id);
+  if (both != "taken" && both != "declined") __builtin_trap();
   return 0;
 }

@@ -5,6 +5,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "../fuzz/read_results.h"
 #include "reply_helpers.h"
 #include "vexil/protocol/document_features.h"
 #include "vexil/protocol/feature_results.h"
@@ -159,6 +160,53 @@ TEST(FeatureResults, NestingIsReadToAThousandLevelsAndNoDeeper) {
     if (depth == 1000) EXPECT_EQ(deep.items.at(0).parents.size(), 1000u) << thrown;
     else EXPECT_THAT(thrown, testing::HasSubstr("parent\nFailed to read JSON object: nested deeper than 1000 levels"));
   }
+}
+
+// A completion reply is read from the parser's events when it has the shape servers send;
+// each row says whether that read takes the text, and a taken one must hold what the
+// document read holds, a declined one must leave the list as it was.
+TEST(FeatureResults, CompletionRepliesReadFromEventsAsTheDocumentReadsThem) {
+  const std::string item = R"j({"label":"push_back","labelDetails":{"detail":"(T)","description":"void"},"kind":2,)j"
+                           R"("detail":"void","documentation":{"kind":"markdown","value":"A\u00e9\n"},)"
+                           R"("deprecated":true,"sortText":"1","filterText":"pb","insertText":"push_back",)"
+                           R"("insertTextFormat":2,"score":0.5,"data":{"a":[[{"b":null}]]},"textEdit":{"range":)" +
+                           kRange + R"(,"newText":"push_back"}})";
+  const auto reply = [](const std::string &result) { return R"({"jsonrpc":"2.0","id":7,"result":)" + result + "}"; };
+  const auto items = [&](const std::string &elements) {
+    return reply(R"({"isIncomplete":false,"items":[)" + elements + "]}");
+  };
+  std::string deep;
+  for (int level = 0; level < 300000; ++level) deep += "[";
+  deep += std::string(300000, ']');
+  const std::pair<std::string, const char *> rows[] = {
+      {items(item + R"(,{"label":"x"},null,{"textEdit":null,"labelDetails":{},"documentation":"d"})"), "taken"},
+      {reply("[" + item + "]"), "taken"},
+      {reply("null"), "taken"},
+      {R"({"id":7,"result":{"items":[]},"jsonrpc":null})", "taken"},
+      {items(R"({"label":"x","data":)" + deep + "}"), "taken"},
+      {items(R"({"textEdit":{"range":{"start":{"line":1}}}})"), "taken"},
+      {R"({"jsonrpc":"2.0","result":{"items":[]},"id":7})", "declined"},  // the result before the id
+      {R"({"jsonrpc":"2.0","id":8,"result":{"items":[]}})", "declined"},
+      {R"({"jsonrpc":"2.0","id":"7","result":{"items":[]}})", "declined"},
+      {R"({"jsonrpc":"2.0","id":7,"method":"m","result":{"items":[]}})", "declined"},
+      {R"({"jsonrpc":"2.0","id":7,"result":{"items":[]},"error":{"code":1}})", "declined"},
+      {R"({"jsonrpc":"2.0","id":7,"id":7,"result":{"items":[]}})", "declined"},
+      {items(R"({"label":"x","label":"y"})"), "declined"},
+      {reply(R"({"items":null})"), "declined"},
+      {reply(R"({"items":{}})"), "declined"},
+      {reply(R"("text")"), "declined"},
+      {items(R"({"kind":2.0})"), "declined"},
+      {items(R"({"kind":2147483648})"), "declined"},
+      {items(R"({"kind":-2147483648,"insertTextFormat":2147483647})"), "taken"},
+      {items(R"({"documentation":["a"]})"), "declined"},
+      {items(R"({"textEdit":{"range":{"start":{"line":"1"}}}})"), "declined"},
+      {items(R"({"label":3})"), "declined"},
+      {items("3"), "declined"},
+      {items(item) + " x", "declined"},
+      {items(item).substr(0, 200), "declined"},
+      {"\xEF\xBB\xBF" + items(item), "declined"},
+  };
+  for (const auto &[text, expected] : rows) EXPECT_EQ(fuzz::ReadBothWays(text, 7), expected) << text.substr(0, 300);
 }
 
 TEST(FeatureResults, SemanticTokensDecodeToAbsolutePositionsAndTheLegendsNames) {
