@@ -200,6 +200,7 @@ bool CompletionEvents::Key(const char* text, rapidjson::SizeType length, bool) {
 
 bool CompletionEvents::Take(const Scalar& value) {
   if (skipped_ > 0) return true;
+  if (depth_ == 0) return false;  // a message that is not an object
   Frame& frame = Top();
   if (frame.kind == Kind::Items) {
     // A null element is an item with no members; any other scalar is a type error.

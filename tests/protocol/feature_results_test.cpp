@@ -203,6 +203,8 @@ TEST(FeatureResults, CompletionRepliesReadFromEventsAsTheDocumentReadsThem) {
       {items(R"({"label":3})"), "declined"},
       {items("3"), "declined"},
       {items(item) + " x", "declined"},
+      {"2", "declined"},
+      {"[]", "declined"},
       {items(item).substr(0, 200), "declined"},
       {"\xEF\xBB\xBF" + items(item), "declined"},
   };
