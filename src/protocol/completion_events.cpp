@@ -53,37 +53,59 @@ constexpr Name kEdit[] = {Named("range"), Named("newText")};
 constexpr Name kRange[] = {Named("start"), Named("end")};
 constexpr Name kPosition[] = {Named("line"), Named("character")};
 
+// Each kind's names, in the order of Kind (none for the items array).
+struct Names {
+  const Name* names;
+  std::size_t count;
+};
 template <std::size_t N>
-inline int SlotOf(const Name (&names)[N], const char* text, std::size_t length) {
-  for (std::size_t slot = 0; slot < N; ++slot) {
-    if (names[slot].length == length && SameNameBytes(names[slot].text, text, length)) return static_cast<int>(slot);
+constexpr Names Of(const Name (&names)[N]) {
+  return {names, N};
+}
+constexpr Names kNames[] = {Of(kEnvelope), Of(kList), {nullptr, 0}, Of(kItem),    Of(kLabelDetailsNames),
+                            Of(kMarkup),   Of(kEdit), Of(kRange),   Of(kPosition)};
+constexpr std::size_t kKinds = sizeof kNames / sizeof kNames[0];
+constexpr std::size_t kMostNames = 16;
+static_assert(kKinds == static_cast<std::size_t>(Kind::Position) + 1, "a list of names for each kind");
+static_assert(sizeof kItem / sizeof kItem[0] <= kMostNames, "a slot for each name");
+
+bool IsName(const Name& name, const char* text, std::size_t length) {
+  return name.length == length && SameNameBytes(name.text, text, length);
+}
+
+int SlotIn(Kind kind, const char* text, std::size_t length) {
+  const Names& names = kNames[static_cast<std::size_t>(kind)];
+  for (std::size_t slot = 0; slot < names.count; ++slot) {
+    if (IsName(names.names[slot], text, length)) return static_cast<int>(slot);
   }
   return -1;
 }
 
-int SlotIn(Kind kind, const char* text, std::size_t length) {
-  switch (kind) {
-    case Kind::Envelope:
-      return SlotOf(kEnvelope, text, length);
-    case Kind::List:
-      return SlotOf(kList, text, length);
-    case Kind::Item:
-      return SlotOf(kItem, text, length);
-    case Kind::LabelDetails:
-      return SlotOf(kLabelDetailsNames, text, length);
-    case Kind::Markup:
-      return SlotOf(kMarkup, text, length);
-    case Kind::Edit:
-      return SlotOf(kEdit, text, length);
-    case Kind::Range:
-      return SlotOf(kRange, text, length);
-    case Kind::Position:
-      return SlotOf(kPosition, text, length);
-    case Kind::Items:
-      break;
+// Servers write every item's members in the same order: the member that followed a slot
+// last time is tried first, which finds nearly every name at the first compare.
+class SlotGuess {
+ public:
+  SlotGuess() {
+    for (auto& kind : next_)
+      for (auto& slot : kind) slot = kNone;
   }
-  return -1;
-}
+  // The slot of the name after `previous`: a slot, kStart for the first name of an object,
+  // kAfterUnread after a name not read.
+  int Slot(Kind kind, std::uint8_t previous, const char* text, std::size_t length) {
+    const auto k = static_cast<std::size_t>(kind);
+    const std::uint8_t guess = next_[k][previous];
+    if (guess != kNone && IsName(kNames[k].names[guess], text, length)) return guess;
+    const int slot = SlotIn(kind, text, length);
+    next_[k][previous] = slot < 0 ? kNone : static_cast<std::uint8_t>(slot);
+    return slot;
+  }
+  static constexpr std::uint8_t kStart = kMostNames;
+  static constexpr std::uint8_t kAfterUnread = kMostNames + 1;
+  static constexpr std::uint8_t kNone = 0xFF;
+
+ private:
+  std::uint8_t next_[kKinds][kMostNames + 2];
+};
 
 // An item as the document read leaves it when the item has none of its members: reading
 // from null and from an empty object give the same, down to positions of -1.
@@ -110,8 +132,9 @@ constexpr int kUnread = -2;  // a member this reader does not read: its value is
 
 struct Frame {
   Kind kind;
-  JsonObject* target;  // what the object's members are read into (null for the envelope)
-  int slot = kNoSlot;  // the slot of the member whose value comes next
+  JsonObject* target;                         // what the object's members are read into (null for the envelope)
+  int slot = kNoSlot;                         // the slot of the member whose value comes next
+  std::uint8_t previous = SlotGuess::kStart;  // the slot of the last member read
   std::uint32_t seen = 0;
 };
 
@@ -173,6 +196,7 @@ class CompletionEvents : public rapidjson::BaseReaderHandler<rapidjson::UTF8<>, 
   Frame stack_[7];
   std::size_t depth_ = 0;
   std::size_t skipped_ = 0;  // depth inside a value passed over
+  SlotGuess guess_;
   std::string jsonrpc_;
   bool idSeen_ = false;
   bool done_ = false;
@@ -184,11 +208,13 @@ void Assign(std::string& target, const Scalar& value) { target.assign(value.text
 bool CompletionEvents::Key(const char* text, rapidjson::SizeType length, bool) {
   if (skipped_ > 0) return true;
   Frame& frame = Top();
-  const int slot = SlotIn(frame.kind, text, length);
+  const int slot = guess_.Slot(frame.kind, frame.previous, text, length);
   if (slot < 0) {
     frame.slot = kUnread;
+    frame.previous = SlotGuess::kAfterUnread;
     return true;
   }
+  frame.previous = static_cast<std::uint8_t>(slot);
   // A message with a method, or an error, is no reply for this reader; a second member of
   // the same name makes the first one count, which the document read judges.
   if (frame.kind == Kind::Envelope && (slot == kMethod || slot == kError)) return false;
