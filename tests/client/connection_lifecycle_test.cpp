@@ -30,11 +30,6 @@ class ConnectionLifecycle : public ::testing::Test {
   void SetUp() override { TraceLog::Clear(); }
   void TearDown() override { Dispose(kName); }
 
-  static xLanguageServer* Connection(std::vector<std::string> directives = {}, int timeout = 2000,
-                                     LSP::TraceLevel level = LSP::TraceLevel::Messages) {
-    return Fake(kName, std::move(directives), timeout, level);
-  }
-
   // The next request is answered at once: no earlier wait is left to make it suffer.
   static void ExpectAnswered(xLanguageServer* server) {
     LSP::TextDocumentPositionParams params;
@@ -81,7 +76,7 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
          R"("didChangeWatchedFiles":{"dynamicRegistration":true,"relativePatternSupport":true})"}}},
   };
   for (const Row& row : rows) {
-    xLanguageServer* server = Connection({"ask=workspace/workspaceFolders"}, 2000, row.level);
+    xLanguageServer* server = Fake(kName, {"ask=workspace/workspaceFolders"}, 2000, row.level);
     for (const char* feature : row.features) EXPECT_EQ(server->Enable(feature), std::string(feature) != "unknown");
     xServerInitialise init;
     init.processId = 4242;
@@ -133,7 +128,7 @@ TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
       {R"({"textDocumentSync": "full","hoverProvider":true})", "1|0|0|0|0|utf-16|0"},
   };
   for (const auto& [capabilities, digest] : rows) {
-    xLanguageServer* server = Connection({"result=initialize:{\"capabilities\":" + capabilities + "}"});
+    xLanguageServer* server = Fake(kName, {"result=initialize:{\"capabilities\":" + capabilities + "}"});
     EXPECT_STREQ(server->ServerCapabilitiesJson(), "");
     ASSERT_TRUE(server->Start(xServerInitialise()));
     const LSP::ServerCapabilities read = server->ServerCapabilities();
@@ -213,7 +208,7 @@ TEST_F(ConnectionLifecycle, ServerMessagesReachTheHandlerAndRequestsAreAlwaysAns
     SCOPED_TRACE(row.name);
     Handed handed;
     handed.reply = row.reply;
-    handed.server = Connection(row.directives);
+    handed.server = Fake(kName, row.directives);
     handed.server->SetMessageHandler(&Handed::Handler, &handed);
     for (const char* feature : row.features) EXPECT_TRUE(handed.server->Enable(feature));
     ASSERT_TRUE(handed.server->Start(xServerInitialise()));
@@ -243,7 +238,7 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
   const std::filesystem::path root = std::filesystem::absolute(temporary.Path());
   const auto file = [&](const std::string& name) { return (root / name).make_preferred().string(); };
   std::ofstream(file("old.py")).put('x');
-  xLanguageServer* server = Connection();
+  xLanguageServer* server = Fake(kName);
   ASSERT_TRUE(server->Enable("watchedFiles"));
   xServerInitialise init;
   init.rootPath = root.string();
@@ -315,7 +310,7 @@ TEST_F(ConnectionLifecycle, HandshakeRepliesLateNeverOrRefused) {
   };
   for (const Row& row : rows) {
     SCOPED_TRACE(row.name);
-    xLanguageServer* server = Connection({row.directive}, 200);
+    xLanguageServer* server = Fake(kName, {row.directive}, 200);
     EXPECT_EQ(server->Start(xServerInitialise()), row.started);
     EXPECT_EQ(TraceLog::Count("Reply: Timed out waiting for reply......\n"), row.timeouts);
     EXPECT_EQ(SentBody("initialized") != "", row.started);
@@ -341,14 +336,14 @@ TEST_F(ConnectionLifecycle, HandshakeRepliesLateNeverOrRefused) {
 
 TEST_F(ConnectionLifecycle, ShutdownTakesItsOwnReplyARelaunchWorksAndExitEmptiesTheRegistry) {
   // Never started: shut down and exited without a word.
-  xLanguageServer* never = Connection();
+  xLanguageServer* never = Fake(kName);
   EXPECT_TRUE(never->Shutdown());
   EXPECT_TRUE(never->Exit());
   EXPECT_TRUE(SentBodies().empty());
   EXPECT_EQ(Vexil_Have(kName), nullptr);
 
   // A 20 s host time-out: waiting for anything but the shutdown reply would last that long.
-  xLanguageServer* server = Connection({}, 20000);
+  xLanguageServer* server = Fake(kName, {}, 20000);
   ASSERT_TRUE(server->Start(xServerInitialise()));
   auto before = std::chrono::steady_clock::now();
   EXPECT_TRUE(server->Shutdown());
