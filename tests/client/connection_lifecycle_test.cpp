@@ -250,19 +250,21 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
   const auto received = [&](const std::string& name) {
     return server->Request("fake/echo", "{}").find(FileToUri(file(name).c_str()) + "\\\",") != std::string::npos;
   };
+  // Writes to each file in turn, appending to one that exists; once the last is told, which were.
+  const auto told = [&](std::vector<std::string> names) {
+    for (const std::string& name : names) std::ofstream(file(name), std::ios::app).put('x');
+    EXPECT_TRUE(transport_test::WaitFor([&] { return received(names.back()); }, 30s));
+    std::string heard;
+    for (const std::string& name : names) heard += received(name) ? name + ";" : "";
+    return heard;
+  };
   // Nothing registered yet: every change under the folder is told.
   std::filesystem::create_directory(file("sub"));
-  std::ofstream(file("early.txt")).put('x');
-  EXPECT_TRUE(transport_test::WaitFor([&] { return received("early.txt"); }, 30s));
+  EXPECT_EQ(told({"early.txt"}), "early.txt;");
   // Python files created or deleted only: a change of one and other files are not told.
   const std::string python = registration("py", R"({"globPattern":"**/*.py","kind":5})");
   EXPECT_NE(ask("client/registerCapability", python).find(R"("id":0,"result":null)"), std::string::npos);
-  std::ofstream(file("old.py"), std::ios::app).put('x');
-  std::ofstream(file("a.txt")).put('x');
-  std::ofstream(file("a.py")).put('x');
-  EXPECT_TRUE(transport_test::WaitFor([&] { return received("a.py"); }, 30s));
-  EXPECT_FALSE(received("a.txt"));
-  EXPECT_FALSE(received("old.py"));
+  EXPECT_EQ(told({"old.py", "a.txt", "a.py"}), "a.py;");
 
   // Unregistered, then text files of "sub" only, by a pattern relative to it.
   const char* dropped = R"({"unregisterations":[{"id":"py","method":"workspace/didChangeWatchedFiles"}]})";
@@ -271,19 +273,13 @@ TEST_F(ConnectionLifecycle, FilesChangedOnDiskReachTheServerAsItRegistersForThem
       R"({"globPattern":{"baseUri":")" + FileToUri(file("sub").c_str()) + R"(","pattern":"*.txt"}})";
   EXPECT_NE(ask("client/registerCapability", registration("txt", relative)).find(R"("result":null)"),
             std::string::npos);
-  std::ofstream(file("b.py")).put('x');
-  std::ofstream(file("b.txt")).put('x');
-  std::ofstream(file("sub/b.txt")).put('x');
-  EXPECT_TRUE(transport_test::WaitFor([&] { return received("sub/b.txt"); }, 30s));
-  EXPECT_FALSE(received("b.py"));
-  EXPECT_FALSE(received("b.txt"));
+  EXPECT_EQ(told({"b.py", "b.txt", "sub/b.txt"}), "sub/b.txt;");
   EXPECT_NE(ask("client/registerCapability", "{}").find(R"("error":{"code":-32602,)"), std::string::npos);
 
   // Shut down and initialized again: the registrations of the earlier session are gone.
   EXPECT_TRUE(server->Shutdown());
   ASSERT_TRUE(server->Start(init));
-  std::ofstream(file("c.py")).put('x');
-  EXPECT_TRUE(transport_test::WaitFor([&] { return received("c.py"); }, 30s));
+  EXPECT_EQ(told({"c.py"}), "c.py;");
 }
 
 // How the handshake's replies come, against a 200 ms host time-out: a late initialize reply
