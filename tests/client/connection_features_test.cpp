@@ -151,8 +151,7 @@ TEST_F(ConnectionFeatures, DiagnosticsAndItemsGoBackAsTheServerSentThem) {
     auto open = Opened(kUri, "ok\nerror here\nok\nerror again\n");
     server->TextDocument_DidOpen(&open);
     ASSERT_TRUE(transport_test::WaitFor([&] { return server->TextDocument_Diagnostics(kUri).size() == 2; }));
-    LSP::TextDocumentIdentifier document;
-    document.uri = kUri;
+    LSP::TextDocumentIdentifier document(kUri);
     EXPECT_EQ(server->TextDocument_PullDiagnostics(&document).size(), 2u);
     EXPECT_EQ(SentBody("textDocument/diagnostic") != "", provides);
     EXPECT_TRUE(server->TextDocument_Diagnostics(nullptr).empty());
@@ -219,8 +218,7 @@ TEST_F(ConnectionFeatures, PullingStoresAFullReportAndSendsItsIdBack) {
   xLanguageServer* server = Started(
       {R"(result=initialize:{"capabilities": {"diagnosticProvider":{"interFileDependencies":false,"workspaceDiagnostics":false}}})",
        R"(result=textDocument/diagnostic:{"kind": "full","resultId":"r7","items":[{"range":{"start":{"line":4,"character":1},"end":{"line":4,"character":3}},"severity":2,"code":12,"source":"json","message":"Trailing comma"}]})"});
-  LSP::TextDocumentIdentifier document;
-  document.uri = kUri;
+  LSP::TextDocumentIdentifier document(kUri);
   int before = server->DiagnosticsVersion();
 
   auto pulled = server->TextDocument_PullDiagnostics(&document);

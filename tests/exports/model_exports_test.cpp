@@ -6,6 +6,8 @@
 #include <string>
 #include <utility>
 
+#include "../client/edit_helpers.h"
+#include "../protocol/reply_helpers.h"
 #include "vexil/client/languages.h"
 #include "vexil/client/uri.h"
 #include "vexil/client/workspace_edits.h"
@@ -33,22 +35,19 @@ class Locations : public LSP::Result {
 }  // namespace
 
 TEST(ModelExports, RepliesAreReadAndRequestsWritten) {
-  LSP::xReader reader;
-  ASSERT_TRUE(reader.Parse(R"({"jsonrpc":"2.0","id":"5","result":{"uri":"file:///a.c",)"
-                           R"("range":{"start":{"line":1,"character":2},"end":{"line":1,"character":4}}}})"));
+  const std::string reply = R"({"jsonrpc":"2.0","id":"5","result":{"uri":"file:///a.c",)"
+                            R"("range":{"start":{"line":1,"character":2},"end":{"line":1,"character":4}}}})";
   Locations result;
-  LSP::ResponseMessage response(&result);
-  response.Read(reader);
-  EXPECT_EQ(response.id, 5);
+  EXPECT_EQ(vexil_test::ReadReply(reply, result).id, 5);
   EXPECT_EQ(result.location.range.end.character, 4);
 
-  ASSERT_TRUE(reader.Parse(R"({"jsonrpc":"2.0","id":4,"result":{"isIncomplete":true,"items":[{"label":"size","kind":2}]}})"));
   LSP::CompletionList list;
-  LSP::ResponseMessage completion(&list);
-  completion.Read(reader);
+  vexil_test::ReadReply(
+      R"({"jsonrpc":"2.0","id":4,"result":{"isIncomplete":true,"items":[{"label":"size","kind":2}]}})", list);
   ASSERT_EQ(list.items.size(), 1u);
   LSP::CompletionItemResolveParams resolve(list.items[0]);
   EXPECT_EQ(LSP::ToJsonText(resolve), R"({"label":"size","kind":2})");
+  LSP::xReader reader;
   LSP::InitializeResult initialized;
   ASSERT_TRUE(reader.Parse(R"({"result":{"capabilities":{"renameProvider":{}}}})"));
   initialized.Read(reader);
@@ -112,11 +111,8 @@ TEST(ModelExports, LanguageTableUrisTextsAndTraceQueueAreReachable) {
   EXPECT_EQ(UriToFile(FileToUri(path.c_str()).c_str()), path);
 
   std::string text = "a\xF0\x9F\x98\x80" "b";
-  LSP::TextEdit edit;
-  edit.range = LSP::Range(LSP::Position(0, 3), LSP::Position(0, 4));
-  edit.newText = "c";
   std::string error;
-  EXPECT_TRUE(LSP::ApplyTextEdits(text, {edit}, error));
+  EXPECT_TRUE(LSP::ApplyTextEdits(text, {vexil_test::Edit(0, 3, 0, 4, "c")}, error));
   EXPECT_EQ(LSP::PositionToOffset(text, LSP::Position(0, 3)), 5u);
   EXPECT_EQ(text, "a\xF0\x9F\x98\x80" "c");
   EXPECT_TRUE(LSP::ApplyWorkspaceEdit(LSP::WorkspaceEdit(), error));

@@ -8,26 +8,9 @@
 
 #include "host/trace_line.h"
 #include "vexil/host/trace.h"
+#include "vexil_test/trace_log.h"
 
-namespace {
-
-struct Line {
-  TraceType type;
-  std::string title;
-  std::string text;
-};
-
-std::vector<Line> lines;
-
-void Record(TraceType type, const char* title, const char* text) { lines.push_back({type, title, text}); }
-
-void DrainQueue() {
-  xTraceEvent event;
-  while (xTraceEvent::queue().TryPop(event)) {
-  }
-}
-
-}  // namespace
+using vexil_test::TraceLog;
 
 TEST(TraceEvent, DetailFollowsMessageAfterOneLineFeedOnlyWhenNotEmpty) {
   EXPECT_EQ(xTraceEvent(TraceType::Line, "Error", "boom", nullptr).text, "boom");
@@ -36,7 +19,9 @@ TEST(TraceEvent, DetailFollowsMessageAfterOneLineFeedOnlyWhenNotEmpty) {
 }
 
 TEST(TraceQueue, KeepsEveryWritersOrderUnderConcurrentWriters) {
-  DrainQueue();
+  xTraceEvent event;  // what earlier tests left in the queue goes first
+  while (xTraceEvent::queue().TryPop(event)) {
+  }
   constexpr int kWriters = 4;
   constexpr int kLinesEach = 2000;
   std::vector<std::thread> writers;
@@ -49,7 +34,6 @@ TEST(TraceQueue, KeepsEveryWritersOrderUnderConcurrentWriters) {
   // The host drains while the writers are still busy, waiting when the queue runs dry.
   std::vector<int> next(kWriters, 0);
   for (int taken = 0; taken < kWriters * kLinesEach; ++taken) {
-    xTraceEvent event;
     ASSERT_TRUE(xTraceEvent::queue().WaitPop(event, std::chrono::seconds(30)));
     int writer = std::stoi(event.title);
     EXPECT_EQ(std::stoi(event.text), next[writer]) << "writer " << writer << " out of order";
@@ -58,7 +42,6 @@ TEST(TraceQueue, KeepsEveryWritersOrderUnderConcurrentWriters) {
   for (std::thread& writer : writers) writer.join();
   EXPECT_TRUE(xTraceEvent::queue().Empty());
   // Silence times out; the untimed wait wakes for a late writer.
-  xTraceEvent event;
   EXPECT_FALSE(xTraceEvent::queue().WaitPop(event, std::chrono::milliseconds(1)));
   std::thread late([] { xTraceEvent::Write(TraceType::Line, "Message", "late", nullptr); });
   EXPECT_EQ(xTraceEvent::queue().WaitPop().text, "late");
@@ -80,37 +63,38 @@ TEST(Tracer, TitlesFollowTheLevelRules) {
   EXPECT_EQ(TraceToString(static_cast<LSP::TraceLevel>(-1)), "");
   for (const Case& c : cases) {
     EXPECT_EQ(TraceToString(c.level), c.name);
-    lines.clear();
-    vexil::Tracer tracer(Record, c.level);
+    TraceLog::Clear();
+    vexil::Tracer tracer(TraceLog::Callback, c.level);
     tracer.Verbose("v %d\n", 1);
     tracer.Message("m %s\n", "x");
     tracer.Error("e\n\n");
     std::vector<std::string> titles;
-    for (const Line& line : lines) {
+    for (const vexil_test::TraceLine& line : TraceLog::Lines()) {
       titles.push_back(line.title);
       EXPECT_EQ(line.type, TraceType::Line);
     }
     EXPECT_EQ(titles, c.titles) << "level " << static_cast<int>(c.level);
   }
-  lines.clear();
+  TraceLog::Clear();
   vexil::Tracer silent(nullptr, LSP::TraceLevel::Verbose);
   silent.Error("nothing\n");
   silent.Text(TraceType::Notice, "task", "nothing");
   EXPECT_FALSE(silent.Verbose());
-  EXPECT_TRUE(lines.empty());
+  EXPECT_TRUE(TraceLog::Lines().empty());
 }
 
 TEST(Tracer, LinesAreCutToTheBufferButTextPassesWhole) {
-  lines.clear();
+  TraceLog::Clear();
   std::string longText(10000, 'x');
-  vexil::Tracer tracer(Record, LSP::TraceLevel::Off);
+  vexil::Tracer tracer(TraceLog::Callback, LSP::TraceLevel::Off);
   tracer.Error("%s\n", longText.c_str());
   tracer.Text(TraceType::Line, "Message", longText.c_str());
-  vexil::TraceFormatted(Record, TraceType::Line, "Error", 512, "Watcher: %lld no longer operating.\n%s",
+  vexil::TraceFormatted(TraceLog::Callback, TraceType::Line, "Error", 512, "Watcher: %lld no longer operating.\n%s",
                         static_cast<long long>(7), longText.c_str());
-  ASSERT_EQ(lines.size(), 3u);
-  EXPECT_EQ(lines[0].text, std::string(4095, 'x'));
-  EXPECT_EQ(lines[1].text, longText);
-  EXPECT_EQ(lines[2].text.size(), 511u);
-  EXPECT_EQ(lines[2].text.rfind("Watcher: 7 no longer operating.\n", 0), 0u);
+  const std::vector<std::string> texts = TraceLog::Texts();
+  ASSERT_EQ(texts.size(), 3u);
+  EXPECT_EQ(texts[0], std::string(4095, 'x'));
+  EXPECT_EQ(texts[1], longText);
+  EXPECT_EQ(texts[2].size(), 511u);
+  EXPECT_EQ(texts[2].rfind("Watcher: 7 no longer operating.\n", 0), 0u);
 }

@@ -4,6 +4,7 @@
 // raw values.
 #include <gtest/gtest.h>
 
+#include <functional>
 #include <stdexcept>
 #include <string>
 
@@ -44,22 +45,15 @@ std::string Mismatch(const char* expected, const char* found) {
   return std::string("Expecting a '") + expected + "' JSON object but found '" + found + "' JSON object.";
 }
 
-// A model object whose members are written by a callback, for writer tests.
-template <typename WriteMembers>
-class Members : public LSP::JsonObject {
- public:
-  explicit Members(WriteMembers write) : write_(write) {}
-  const char* Name() const override { return "members"; }
-  void Read(const LSP::xObject&) override {}
-  void Write(LSP::xWriter& writer) override { write_(writer); }
-
- private:
-  WriteMembers write_;
-};
-
-template <typename WriteMembers>
-std::string Written(WriteMembers write) {
-  Members<WriteMembers> object(write);
+// The text of a model object whose members `write` writes, for writer tests.
+std::string Written(const std::function<void(LSP::xWriter&)>& write) {
+  struct Members : LSP::JsonObject {
+    explicit Members(const std::function<void(LSP::xWriter&)>& write) : write(write) {}
+    const char* Name() const override { return "members"; }
+    void Read(const LSP::xObject&) override {}
+    void Write(LSP::xWriter& writer) override { write(writer); }
+    const std::function<void(LSP::xWriter&)>& write;
+  } object(write);
   return LSP::ToJsonText(object);
 }
 
