@@ -18,7 +18,6 @@ namespace {
 
 using namespace std::chrono_literals;
 using namespace transport_test;
-using Texts = std::vector<std::string>;
 
 using ServerTraffic = FakeServerTest;
 
