@@ -129,9 +129,7 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
   server->TextDocument_DidClose(&close);
   EXPECT_FALSE(server->HaveErrors());
 
-  EXPECT_TRUE(server->Shutdown());
-  EXPECT_TRUE(Exits(*server));
-  EXPECT_EQ(Vexil_Have("clangd-session"), nullptr);
+  ShutDownAndExit(*server, "clangd-session");
 }
 
 // clangd indexes a project with a compilation database in the background and reports

@@ -61,9 +61,7 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   ExpectHas(renamed, {"def limit(value, low, high):"});
   EXPECT_FALSE(server->HaveErrors());
 
-  EXPECT_TRUE(server->Shutdown());
-  EXPECT_TRUE(Exits(*server));
-  EXPECT_EQ(Vexil_Have("pylsp-session"), nullptr);
+  ShutDownAndExit(*server, "pylsp-session");
 }
 
 }  // namespace

@@ -48,9 +48,7 @@ TEST(ServerFailures, ServersAnswerForTheirOwnProjectsThroughAMissingCommandARest
     ExpectHas(HoverText(*clangd, cpp, "main.cpp", "shapes::Clamp(", 8), {"int Clamp(int value, int low, int high)"});
     ExpectHas(HoverText(*pylsp, python, "main.py", "print(clamp(", 6),
               {"clamp(value, low, high)", "Limit value to the range from low to high."});
-    EXPECT_TRUE(pylsp->Shutdown());
-    EXPECT_TRUE(Exits(*pylsp));
-    EXPECT_EQ(Vexil_Have("both-pylsp"), nullptr);
+    ShutDownAndExit(*pylsp, "both-pylsp");
   }
   EXPECT_EQ(HoverText(*clangd, cpp, "main.cpp", "Report(rectangle)", 0).find("function Report"), 0u);
 
