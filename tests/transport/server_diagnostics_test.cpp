@@ -4,6 +4,7 @@
 
 #include <string>
 
+#include "../protocol/reply_helpers.h"
 #include "transport_test_support.h"
 
 namespace {
@@ -30,12 +31,9 @@ TEST_F(ServerDiagnostics, IdlePublicationsAreStoredNewestPerDocumentAndStillQueu
   EXPECT_EQ(server->Diagnostics().Of(Doc(0)).size(), 1u);  // two publications each, the newest kept
   auto second = server->Diagnostics().Of(Doc(1));
   ASSERT_EQ(second.size(), 1u);
-  EXPECT_EQ(second[0].message, "pass 1");
-  EXPECT_EQ(second[0].range.start.line, 1);
-  EXPECT_EQ(second[0].severity, 2);
-  EXPECT_EQ(second[0].code, -1);
-  EXPECT_EQ(second[0].codeText, "fake1");
-  EXPECT_EQ(second[0].source, "fake");
+  EXPECT_EQ(vexil_test::Fields(second[0].message, second[0].range.start.line, second[0].severity, second[0].code,
+                               second[0].codeText, second[0].source),
+            "pass 1|1|2|-1|fake1|fake");
   EXPECT_TRUE(server->Diagnostics().Of("file:///fake/never.cpp").empty());
 
   // The queue is untouched: the next request still passes over the four publications.
