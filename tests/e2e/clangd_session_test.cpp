@@ -1,6 +1,6 @@
 // A whole clangd session through the shared library: start, the feature calls with the
 // answer the example project calls for (those the command-line test makes of clangd are
-// checked there), answers about changed text, shutdown and exit.
+// checked there), other servers beside it, answers about changed text, and its death.
 #include <gtest/gtest.h>
 
 #include <map>
@@ -22,10 +22,21 @@ std::set<std::string> Names(const std::vector<LSP::SymbolInformation>& symbols) 
   return names;
 }
 
+std::string HoverText(xLanguageServer& server, const Project& project, const std::string& file,
+                      const std::string& needle, std::size_t offset) {
+  auto at = At(project, file, Find(project, file, needle, offset));
+  return server.TextDocument_Hover(&at).contents.value;
+}
+
 // The steps share one session, started once: clangd takes long to index on a loaded machine.
-TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) {
+// Beside it, a server whose command does not exist fails to start and leaves cleanly, and
+// pylsp ends and starts again under its name, each answering for its own project; killed at
+// the end, clangd gives empty results at once.
+TEST(ClangdSession, AnswersEachFeatureBesideOtherServersThenAboutChangedTextUntilKilled) {
   Project project = Cpp();
-  xLanguageServer* server = Vexil_Start(StartRecord(project, "clangd-session"));
+  xServerStart start = StartRecord(project, "clangd-session");
+  start.timeout = 60000;  // a wait for the dead server would be unmistakable
+  xLanguageServer* server = Vexil_Start(start);
   ASSERT_TRUE(server->Start(InitRecord(project)));
   for (const char* file : {"shapes.h", "shapes.cpp", "main.cpp"}) Open(*server, project, file);
   // Clamp as main.cpp calls it.
@@ -114,6 +125,32 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
     EXPECT_STREQ(server->ErrorMessage(), "method not found");
   }
 
+  Project nowhere = Cpp();
+  nowhere.executable = "vexil-no-such-language-server";
+  const std::size_t errorsBefore = vexil_test::TraceLog::Texts("Error").size();
+  xLanguageServer* missing = Vexil_Start(StartRecord(nowhere, "missing"));
+  EXPECT_FALSE(missing->Start(InitRecord(nowhere)));
+  EXPECT_FALSE(missing->IsRunning());
+  EXPECT_EQ(missing->Id(), -1);
+  EXPECT_GT(vexil_test::TraceLog::Texts("Error").size(), errorsBefore);
+  EXPECT_TRUE(missing->Exit());
+  EXPECT_EQ(Vexil_Have("missing"), nullptr);
+  const Project python = Python();
+  for (int life = 0; life < 2; ++life) {
+    SCOPED_TRACE("life " + std::to_string(life));
+    xLanguageServer* pylsp = Vexil_Start(StartRecord(python, "beside-pylsp"));
+    ASSERT_NE(server, pylsp);
+    ASSERT_EQ(Vexil_Have("beside-pylsp"), pylsp);
+    ASSERT_TRUE(pylsp->Start(InitRecord(python)));
+    Open(*pylsp, python, "main.py");
+    ExpectHas(HoverText(*server, project, "main.cpp", "shapes::Clamp(", 8),
+              {"int Clamp(int value, int low, int high)"});
+    ExpectHas(HoverText(*pylsp, python, "main.py", "print(clamp(", 6),
+              {"clamp(value, low, high)", "Limit value to the range from low to high."});
+    ShutDownAndExit(*pylsp, "beside-pylsp");
+  }
+  EXPECT_EQ(HoverText(*server, project, "main.cpp", "Report(rectangle)", 0).find("function Report"), 0u);
+
   // One more use, changed and saved: the answers are about the new text. (A misspelt call's
   // error, its quick fix and the list emptied once fixed are the command-line test's.)
   LSP::DidChangeTextDocumentParams edited;
@@ -129,7 +166,15 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
   server->TextDocument_DidClose(&close);
   EXPECT_FALSE(server->HaveErrors());
 
-  ShutDownAndExit(*server, "clangd-session");
+  ASSERT_TRUE(Kill(*server));
+  auto before = std::chrono::steady_clock::now();
+  EXPECT_EQ(HoverText(*server, project, "main.cpp", "shapes::Clamp(", 8), "");
+  EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(6));
+  EXPECT_TRUE(server->HaveErrors());
+  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
+  EXPECT_TRUE(server->Shutdown());
+  EXPECT_TRUE(server->Exit());
+  EXPECT_EQ(Vexil_Have("clangd-session"), nullptr);
 }
 
 // clangd indexes a project with a compilation database in the background and reports

@@ -18,7 +18,7 @@ TEST(PylspSession, AnswersAboutTheGeometryModule) {
   Open(*server, project, "geometry.py");
   Open(*server, project, "main.py");
 
-  // clamp as main.py calls it (hovered in the test of servers at once).
+  // clamp as main.py calls it (hovered beside the clangd session).
   auto call = At(project, "main.py", Find(project, "main.py", "print(clamp(", 6));
   std::vector<LSP::Location> definition = server->TextDocument_Definition(&call);
   ASSERT_EQ(definition.size(), 1u);
