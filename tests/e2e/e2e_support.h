@@ -123,13 +123,4 @@ inline bool Kill(xLanguageServer& server) {
   return vexil_test::WaitFor([&] { return !server.IsRunning(); }, kPatience);
 }
 
-// Shuts the server down and makes it exit, after which it is no longer known by `name`.
-// Exit gives a server about a second to end and, when it has not, returns false and leaves
-// the connection usable: on a loaded machine a host (and a test) asks again.
-inline void ShutDownAndExit(xLanguageServer& server, const char* name) {
-  EXPECT_TRUE(server.Shutdown());
-  EXPECT_TRUE(vexil_test::WaitFor([&] { return server.Exit(); }));
-  EXPECT_EQ(Vexil_Have(name), nullptr);
-}
-
 }  // namespace e2e
