@@ -23,7 +23,7 @@ bool ReachesVersion(vexil::xServer& server, int version) {
 
 using ServerDiagnostics = FakeServerTest;
 
-TEST_F(ServerDiagnostics, IdlePublicationsAreStoredNewestPerDocumentAndStillQueuedAsIgnoredReplies) {
+TEST_F(ServerDiagnostics, IdlePublicationsAreStoredNewestPerDocumentStillQueuedAndDroppedWhenMalformed) {
   auto server = Started();
   Publish(*server, R"({"documents":2,"count":4})");
   ASSERT_TRUE(ReachesVersion(*server, 4));
@@ -48,6 +48,20 @@ TEST_F(ServerDiagnostics, IdlePublicationsAreStoredNewestPerDocumentAndStillQueu
   ASSERT_TRUE(ReachesVersion(*server, 6));
   EXPECT_TRUE(server->Diagnostics().Of(Doc(0)).empty());
   EXPECT_TRUE(server->Diagnostics().Of(Doc(1)).empty());
+
+  // A malformed publication is dropped without failing the reader.
+  std::string bad = R"({"jsonrpc":"2.0","method":"textDocument/publishDiagnostics","params":{"uri":"file:///b.cpp","diagnostics":{}}})";
+  std::string garbage = "Content-Length: " + std::to_string(bad.size()) + "\\r\\n\\r\\n" + bad;
+  std::string escaped;
+  for (char c : garbage) escaped += c == '"' ? std::string("\\\"") : std::string(1, c);
+
+  EXPECT_TRUE(Ask(*server, "fake/echo", "{\"garbage\":\"" + escaped + "\"}").read);
+  EXPECT_EQ(server->Diagnostics().Version(), 6);
+  EXPECT_EQ(TraceLog::Count("Diagnostics Error: Expecting a array JSON object but found 3 JSON object .\n"), 1);
+
+  TraceLog::Clear();
+  Ask(*server, "fake/echo");
+  EXPECT_FALSE(TraceLog::Contains("Write Error"));
 }
 
 TEST_F(ServerDiagnostics, PastTheLimitTheDocumentsLongestWithoutAPublicationAreDropped) {
@@ -64,22 +78,6 @@ TEST_F(ServerDiagnostics, PastTheLimitTheDocumentsLongestWithoutAPublicationAreD
   Publish(*server, R"({"count":0})");  // the reader's lines are traced by the host's next exchange
   EXPECT_EQ(TraceLog::Count("Diagnostics Dropped: " + Doc(1) + "\n"), 1);
   EXPECT_FALSE(TraceLog::Contains("Diagnostics Dropped: " + Doc(0)));
-}
-
-TEST_F(ServerDiagnostics, AMalformedPublicationIsDroppedWithoutFailingTheReader) {
-  auto server = Started();
-  std::string bad = R"({"jsonrpc":"2.0","method":"textDocument/publishDiagnostics","params":{"uri":"file:///b.cpp","diagnostics":{}}})";
-  std::string garbage = "Content-Length: " + std::to_string(bad.size()) + "\\r\\n\\r\\n" + bad;
-  std::string escaped;
-  for (char c : garbage) escaped += c == '"' ? std::string("\\\"") : std::string(1, c);
-
-  EXPECT_TRUE(Ask(*server, "fake/echo", "{\"garbage\":\"" + escaped + "\"}").read);
-  EXPECT_EQ(server->Diagnostics().Version(), 0);
-  EXPECT_EQ(TraceLog::Count("Diagnostics Error: Expecting a array JSON object but found 3 JSON object .\n"), 1);
-
-  TraceLog::Clear();
-  Ask(*server, "fake/echo");
-  EXPECT_FALSE(TraceLog::Contains("Write Error"));
 }
 
 }  // namespace
