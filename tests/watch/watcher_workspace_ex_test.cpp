@@ -41,7 +41,7 @@ class WatcherWorkspaceExTest : public ::testing::Test {
   }
 };
 
-TEST_F(WatcherWorkspaceExTest, NumbersStartsAndTracesFailuresExactly) {
+TEST_F(WatcherWorkspaceExTest, NumbersStartsTracesFailuresExactlyAndWatchesUntilDestroyed) {
   TempDir first, second;
   Touch(first / "plain.txt");
   auto workspace = Make(LSP::TraceLevel::Verbose);
@@ -65,6 +65,25 @@ TEST_F(WatcherWorkspaceExTest, NumbersStartsAndTracesFailuresExactly) {
   ASSERT_TRUE(WaitForEvent("x"));
   EXPECT_TRUE(WaitForTrace(Verbose("Id: 3  Project: three  Directory: x\n")));
   EXPECT_EQ(Only("x").project, "three");
+
+  // Stopping keeps watching; destruction while changes flow ends all callbacks.
+  workspace->Stop();
+  workspace->Stop("three");
+  Touch(second / "still");
+  ASSERT_TRUE(WaitForEvent("still"));
+
+  std::atomic<bool> stop{false};
+  std::thread writer([&] {
+    for (std::size_t i = 0; !stop; ++i) Touch(second / ("f" + std::to_string(i % 100)));
+  });
+  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 20; }));
+  ASSERT_TRUE(ReturnsWithin(kDeadline, [&] { workspace.reset(); })) << "destruction hung";
+  const std::size_t events = Events().size(), traces = TraceLog::Lines().size();
+  for (int i = 0; i < 200; ++i) Touch(second / "after");
+  stop = true;
+  writer.join();
+  EXPECT_EQ(Events().size(), events);
+  EXPECT_EQ(TraceLog::Lines().size(), traces);
 }
 
 // Below verbose, only error lines are written: none for the events, one for a lost root.
@@ -138,29 +157,6 @@ TEST_F(WatcherWorkspaceExTest, CallbackMayStartProjectsAndDestroyingItsWatcherIs
   Touch(first / "destroy");
   EXPECT_TRUE(WaitForTrace(Error("WatcherWorkspaceEx destroyed from inside its own callback: watching has stopped, "
                                  "without waiting for that callback to return.\n")));
-}
-
-TEST_F(WatcherWorkspaceExTest, StopKeepsWatchingAndDestructionEndsCallbacks) {
-  TempDir root;
-  auto workspace = Make(LSP::TraceLevel::Verbose);
-  workspace->Start("proj", root.Path().string().c_str(), nullptr);
-  workspace->Stop();
-  workspace->Stop("proj");
-  Touch(root / "still");
-  ASSERT_TRUE(WaitForEvent("still"));
-
-  std::atomic<bool> stop{false};
-  std::thread writer([&] {
-    for (std::size_t i = 0; !stop; ++i) Touch(root / ("f" + std::to_string(i % 100)));
-  });
-  ASSERT_TRUE(Recorded().shared.WaitUntil([] { return Recorded().events.size() >= 20; }));
-  ASSERT_TRUE(ReturnsWithin(kDeadline, [&] { workspace.reset(); })) << "destruction hung";
-  const std::size_t events = Events().size(), traces = TraceLog::Lines().size();
-  for (int i = 0; i < 200; ++i) Touch(root / "after");
-  stop = true;
-  writer.join();
-  EXPECT_EQ(Events().size(), events);
-  EXPECT_EQ(TraceLog::Lines().size(), traces);
 }
 
 }  // namespace
