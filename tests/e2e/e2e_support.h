@@ -123,10 +123,4 @@ inline bool Kill(xLanguageServer& server) {
   return vexil_test::WaitFor([&] { return !server.IsRunning(); }, kPatience);
 }
 
-// Exit gives a server about a second to end and, when it has not, returns false and leaves
-// the connection usable: on a loaded machine a host (and a test) asks again.
-inline bool Exits(xLanguageServer& server) {
-  return vexil_test::WaitFor([&] { return server.Exit(); });
-}
-
 }  // namespace e2e

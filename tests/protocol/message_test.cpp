@@ -29,7 +29,7 @@ std::string Reply(const std::string& json) {
                 response.ErrorMessage(), result.json);
 }
 
-TEST(Envelope, RequestsAndNotificationsInWireOrder) {
+TEST(Envelope, RequestsAndNotificationsInWireOrderAndRepliesReadIntoTheCallersResult) {
   LSP::TextDocumentPositionParams params;
   params.textDocument.uri = "file:///a.c";
   params.position = LSP::Position(3, 7);
@@ -41,9 +41,11 @@ TEST(Envelope, RequestsAndNotificationsInWireOrder) {
   const auto id = [](const LSP::RequestMessage& request) { return std::to_string(request.id); };
   CheckRows({
       {"request", hover.ToJSON(),
-       R"({"jsonrpc":"2.0","id":)" + id(hover) + R"(,"method":"textDocument/hover","params":{"textDocument":)"
-       R"({"uri":"file:///a.c"},"position":{"line":3,"character":7}}})"},
-      {"request without params", shutdown.ToJSON(), R"({"jsonrpc":"2.0","id":)" + id(shutdown) + R"(,"method":"shutdown"})"},
+       R"({"jsonrpc":"2.0","id":)" + id(hover) +
+           R"(,"method":"textDocument/hover","params":{"textDocument":)"
+           R"({"uri":"file:///a.c"},"position":{"line":3,"character":7}}})"},
+      {"request without params", shutdown.ToJSON(),
+       R"({"jsonrpc":"2.0","id":)" + id(shutdown) + R"(,"method":"shutdown"})"},
       {"request without method", nameless.ToJSON(), R"({"jsonrpc":"2.0","id":)" + id(nameless) + "}"},
       {"notification", exit.ToJSON(), R"({"jsonrpc":"2.0","method":"exit"})"},
       {"notification with params", cancelRequest.ToJSON(),
@@ -51,7 +53,25 @@ TEST(Envelope, RequestsAndNotificationsInWireOrder) {
       {"bare message", base.ToJSON(), ""},
       // The transport waits for an answer to requests only.
       {"which is a request", Fields(hover.IsRequest(), exit.IsRequest(), base.IsRequest()), "1|0|0"},
+      {"reply with a result", Reply(R"({"jsonrpc":"2.0","id":4,"result":{"text":"hi"}})"),
+       "4|2.0|0|0|0||{\"text\":\"hi\"}"},
+      {"reply: id as text, null result", Reply(R"({"jsonrpc":"2.0","id":"12","result":null})"), "12|2.0|0|0|0||"},
+      {"reply: method not found",
+       Reply(R"({"jsonrpc":"2.0","id":3,"error":{"code":-32601,"message":"Unhandled method x"}})"),
+       "3|2.0|1|1|-32601|Unhandled method x|"},
+      {"reply: error without code", Reply(R"({"jsonrpc":"2.0","id":3,"error":{"message":"boom"}})"),
+       "3|2.0|1|0|-1|boom|"},
+      {"reply: a notification", Reply(R"({"jsonrpc":"2.0","method":"window/logMessage","params":{}})"),
+       "-1|2.0|0|0|0||"},
+      {"reply: id not a number", Reply(R"({"id":"x1"})"), "threw: invalid stoi argument"},
+      {"reply: id null", Reply(R"({"id":null})"), "threw: Expecting a 'int' JSON object but found 'null' JSON object."},
   });
+  // A reply for a caller that bound no result object is read all the same.
+  LSP::xReader reader;
+  LSP::ResponseMessage response(nullptr);
+  ASSERT_TRUE(reader.Parse(R"({"id":1,"result":{"text":"no result object bound"}})"));
+  EXPECT_NO_THROW(response.Read(reader));
+  EXPECT_EQ(response.id, 1);
 }
 
 TEST(Envelope, RequestIdsAreConsecutiveUniqueUnderConcurrencyAndNotForNotifications) {
@@ -75,26 +95,6 @@ TEST(Envelope, RequestIdsAreConsecutiveUniqueUnderConcurrencyAndNotForNotificati
   EXPECT_GE(*all.begin(), 1);
   EXPECT_EQ(all.size(), static_cast<size_t>(kThreads * kEach));
   EXPECT_EQ(*all.rbegin() - *all.begin() + 1, kThreads * kEach);
-}
-
-TEST(Envelope, RepliesAreReadIntoTheCallersResult) {
-  CheckRows({
-      {"result", Reply(R"({"jsonrpc":"2.0","id":4,"result":{"text":"hi"}})"), "4|2.0|0|0|0||{\"text\":\"hi\"}"},
-      {"id as text, null result", Reply(R"({"jsonrpc":"2.0","id":"12","result":null})"), "12|2.0|0|0|0||"},
-      {"method not found",
-       Reply(R"({"jsonrpc":"2.0","id":3,"error":{"code":-32601,"message":"Unhandled method x"}})"),
-       "3|2.0|1|1|-32601|Unhandled method x|"},
-      {"error without code", Reply(R"({"jsonrpc":"2.0","id":3,"error":{"message":"boom"}})"), "3|2.0|1|0|-1|boom|"},
-      {"notification", Reply(R"({"jsonrpc":"2.0","method":"window/logMessage","params":{}})"), "-1|2.0|0|0|0||"},
-      {"id not a number", Reply(R"({"id":"x1"})"), "threw: invalid stoi argument"},
-      {"id null", Reply(R"({"id":null})"), "threw: Expecting a 'int' JSON object but found 'null' JSON object."},
-  });
-  // A reply for a caller that bound no result object is read all the same.
-  LSP::xReader reader;
-  LSP::ResponseMessage response(nullptr);
-  ASSERT_TRUE(reader.Parse(R"({"id":1,"result":{"text":"no result object bound"}})"));
-  EXPECT_NO_THROW(response.Read(reader));
-  EXPECT_EQ(response.id, 1);
 }
 
 }  // namespace

@@ -1,5 +1,6 @@
 // Reading a server's capabilities: lenient boolean providers (an options object counts as
-// provided), option providers that fail on a value of the wrong type, and the odd write key.
+// provided), option providers that fail on a value of the wrong type, and the odd write key
+// of completion options.
 #include <gtest/gtest.h>
 
 #include "reply_helpers.h"
@@ -36,12 +37,15 @@ std::string Options(const LSP::ServerCapabilities& c) {
                 tokens.fullDelta, list(tokens.legend.tokenTypes), list(tokens.legend.tokenModifiers));
 }
 
-TEST(ServerCapabilities, ProvidersAreReadLenientlyAndOptionsStrictly) {
+TEST(ServerCapabilities, ProvidersAreReadLenientlyOptionsStrictlyAndCompletionTriggersWrittenUnderTheirOldKey) {
   const std::string none = "0|0|0|0|0|0|0|0|0|0|0|0|0|0|0|0|0";
   const std::string noOptions = "0|0|0|||0|||0||0|0|0|0||";
   const auto tokens = [](const LSP::ServerCapabilities& c) {
     return Fields(c.hoverProvider, c.semanticTokensProvider.IsProvided());
   };
+  LSP::CompletionOptions triggered, untriggered;
+  triggered.resolveProvider = untriggered.resolveProvider = true;
+  triggered.triggerCharacters = {".", ">"};
   CheckRows({
       // A boolean provider is true for true and for an options object only.
       {"booleans mixed",
@@ -88,16 +92,10 @@ TEST(ServerCapabilities, ProvidersAreReadLenientlyAndOptionsStrictly) {
       {"semantic token types not an array",
        Read(R"({"hoverProvider":true,"semanticTokensProvider":{"legend":{"tokenTypes":"type"},"full":true}})", tokens),
        "1|0"},
+      // Completion options write their triggers under their old key, when there are any.
+      {"completion options written", LSP::ToJsonText(triggered) + LSP::ToJsonText(untriggered),
+       R"({"resolveProvider":true,"triggerCharacter":[".",">"]}{"resolveProvider":true})"},
   });
-}
-
-TEST(ServerCapabilities, CompletionOptionsWriteTheirTriggersUnderTheirOldKeyWhenThereAreAny) {
-  LSP::CompletionOptions options;
-  options.resolveProvider = true;
-  options.triggerCharacters = {".", ">"};
-  EXPECT_EQ(LSP::ToJsonText(options), R"({"resolveProvider":true,"triggerCharacter":[".",">"]})");
-  options.triggerCharacters.clear();
-  EXPECT_EQ(LSP::ToJsonText(options), R"({"resolveProvider":true})");
 }
 
 }  // namespace

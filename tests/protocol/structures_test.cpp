@@ -91,7 +91,7 @@ TEST(Structures, WrittenBackAsServersParseThem) {
   EXPECT_EQ(LSP::ToJsonText(copy), deletion);
 }
 
-TEST(Structures, AbsentMembersReadAsTheirDefaults) {
+TEST(Structures, AbsentMembersReadAsTheirDefaultsAndWorkspaceEditsFromEitherMember) {
   const auto diagnostic = ReadJson<LSP::Diagnostic>(R"({"severity":1,"code":"E1","message":"m"})");
   const auto bare = ReadJson<LSP::Diagnostic>(R"({"message":"m"})");
   const auto item = ReadJson<LSP::TextDocumentItem>(R"({"uri":"u","languageId":"c","text":"t"})");
@@ -105,6 +105,9 @@ TEST(Structures, AbsentMembersReadAsTheirDefaults) {
   markup.Read(reader.Root().Object("s"));
   const std::string plain = Fields(markup.kind, markup.value);
   markup.Read(reader.Root().Object("n"));
+  const std::string edit = R"({"range":)" + kRange + R"(,"newText":"new"})";
+  const std::string map =
+      R"({"changes":{"file:///z.c":[)" + edit + "," + edit + R"(],"file:///a.c":[)" + edit + R"(],"file:///m.c":[]}})";
   CheckRows({
       {"diagnostic", Fields(diagnostic.severity, diagnostic.code, diagnostic.codeText), "1|-1|E1"},
       {"bare diagnostic", Fields(bare.severity, bare.code, bare.codeText), "-1|-1|"},
@@ -113,31 +116,23 @@ TEST(Structures, AbsentMembersReadAsTheirDefaults) {
        "-1"},
       {"position", Fields(ReadJson<LSP::Position>("{}").line, ReadJson<LSP::Position>("{}").character), "-1|-1"},
       // Children that are not objects are skipped.
-      {"nested symbols", Fields(symbol.containerName, Symbols({symbol})), "ns|S|5||" + kNoRange + "{a|12||" + kNoRange +
-                                                                              "{b|13||" + kNoRange + "}}"},
+      {"nested symbols", Fields(symbol.containerName, Symbols({symbol})),
+       "ns|S|5||" + kNoRange + "{a|12||" + kNoRange + "{b|13||" + kNoRange + "}}"},
       {"symbol children not an array", Symbols(ReadJson<LSP::SymbolInformation>(R"({"children":{}})").children), ""},
       {"markup as a plain string", plain, "|plain"},
       {"markup null", Fields(markup.kind, markup.value), "|"},
-  });
-}
-
-// Most servers answer a rename with the "changes" map: one unversioned edit per document,
-// in map order, written back as "documentChanges" as always.
-TEST(Structures, WorkspaceEditsReadFromEitherMember) {
-  const std::string edit = R"({"range":)" + kRange + R"(,"newText":"new"})";
-  const std::string map =
-      R"({"changes":{"file:///z.c":[)" + edit + "," + edit + R"(],"file:///a.c":[)" + edit + R"(],"file:///m.c":[]}})";
-  CheckRows({
+      // Most servers answer a rename with the "changes" map: one unversioned edit per document,
+      // in map order, written back as "documentChanges" as always.
       {"changes map", ReadAs<LSP::WorkspaceEdit>(map, Changes),
        "file:///z.c|-1|1:0-1:4|new;1:0-1:4|new;file:///a.c|-1|1:0-1:4|new;file:///m.c|-1|"},
       {"changes map written back",
        ReadAs<LSP::WorkspaceEdit>(map, [](LSP::WorkspaceEdit e) { return LSP::ToJsonText(e.documentChanges.at(1)); }),
        R"({"textDocument":{"uri":"file:///a.c","version":-1},"edits":[{)" + kFlat + R"(,"newText":"new"}]})"},
       {"document changes win",
-       ReadAs<LSP::WorkspaceEdit>(R"({"changes":{"file:///a.c":[)" + edit +
-                                      R"(]},"documentChanges":[{"textDocument":{"uri":"file:///b.c","version":4},"edits":[)" +
-                                      edit + "]}]}",
-                                  Changes),
+       ReadAs<LSP::WorkspaceEdit>(
+           R"({"changes":{"file:///a.c":[)" + edit +
+               R"(]},"documentChanges":[{"textDocument":{"uri":"file:///b.c","version":4},"edits":[)" + edit + "]}]}",
+           Changes),
        "file:///b.c|4|1:0-1:4|new"},
       {"changes null", ReadAs<LSP::WorkspaceEdit>(R"({"changes":null})", Changes), ""},
       {"neither", ReadAs<LSP::WorkspaceEdit>("{}", Changes), ""},

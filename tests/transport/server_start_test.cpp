@@ -12,7 +12,6 @@ namespace {
 
 using namespace std::chrono_literals;
 using namespace transport_test;
-using Texts = std::vector<std::string>;
 
 // What it wrote is traced first at the messages level; below it, only the failure is.
 TEST_F(ServerStart, ProcessThatExitsAtOnceIsAFailedStartWithItsOutput) {

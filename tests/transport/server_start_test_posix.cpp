@@ -13,7 +13,6 @@
 namespace {
 
 using namespace transport_test;
-using Texts = std::vector<std::string>;
 
 TEST_F(ServerStart, CommandLaunchShowsWhatRunsSkipsEmptyArgumentsAndDefaultsTheTimeout) {
   xServerStart start = FakeStart({"", "ignored-by-sh"}, 0);

@@ -11,7 +11,6 @@
 namespace {
 
 using namespace transport_test;
-using Texts = std::vector<std::string>;
 
 // The build knows the fake by a path with forward slashes (a Unix one under wine), which
 // cmd.exe would read as switches: hand it over in the system's own form.

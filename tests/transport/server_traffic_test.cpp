@@ -5,10 +5,8 @@
 
 #include <algorithm>
 #include <chrono>
-#include <condition_variable>
 #include <filesystem>
 #include <functional>
-#include <mutex>
 #include <string>
 #include <thread>
 
@@ -18,7 +16,6 @@ namespace {
 
 using namespace std::chrono_literals;
 using namespace transport_test;
-using Texts = std::vector<std::string>;
 
 using ServerTraffic = FakeServerTest;
 
@@ -290,18 +287,14 @@ TEST_F(ServerTraffic, MisbehavingServersNeitherHangNorCrashTheHost) {
 class HandedOverLines {
  public:
   static void Callback(TraceType, const char*, const char*) {
-    std::unique_lock<std::mutex> lock(mutex_);
-    taken_.wait(lock, [] { return open_; });
+    taken_.WaitUntil([] { return open_; });
   }
   static void Open(bool open) {
-    std::lock_guard<std::mutex> lock(mutex_);
-    open_ = open;
-    taken_.notify_all();
+    taken_.Update([&] { open_ = open; });
   }
 
  private:
-  static inline std::mutex mutex_;
-  static inline std::condition_variable taken_;
+  static inline vexil_test::Shared taken_;
   static inline bool open_ = true;
 };
 
@@ -327,24 +320,21 @@ TEST_F(ServerTraffic, ACallbackThatWaitsForAnotherThreadHoldsUpNothingElse) {
 
 // Each server request handed to the host is answered once: by the host, or by the timer.
 TEST_F(ServerTraffic, HostAnswersGoOutOnceFromTheHostOrWhenTheirTimeIsUp) {
-  std::mutex mutex;
+  vexil_test::Shared shared;
   Texts sent;
   vexil::HostAnswers answers(200ms);
   answers.Attach([&](std::string body, const std::string& method) {
-    std::lock_guard<std::mutex> lock(mutex);
-    sent.push_back(method + " " + body);
+    shared.Update([&] { sent.push_back(method + " " + body); });
   });
   answers.Expect("1", "a");
   answers.Expect(R"("x")", "b");
   EXPECT_TRUE(answers.Answer("1", "one"));
   EXPECT_FALSE(answers.Answer("1", "again"));
-  EXPECT_TRUE(WaitFor([&] {
-    std::lock_guard<std::mutex> lock(mutex);
-    return sent.size() == 2;
-  }));
+  EXPECT_TRUE(shared.WaitUntil([&] { return sent.size() == 2; }));
   EXPECT_FALSE(answers.Answer(R"("x")", "late"));
-  std::lock_guard<std::mutex> lock(mutex);
-  EXPECT_EQ(sent, (Texts{"a one", R"(b {"jsonrpc":"2.0","id":"x","error":{"code":-32803,"message":"Request not answered"}})"}));
+  EXPECT_EQ(
+      shared.Read([&] { return sent; }),
+      (Texts{"a one", R"(b {"jsonrpc":"2.0","id":"x","error":{"code":-32803,"message":"Request not answered"}})"}));
 }
 
 }  // namespace

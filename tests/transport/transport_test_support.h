@@ -18,6 +18,7 @@
 namespace transport_test {
 
 using vexil_test::TraceLog;
+using Texts = std::vector<std::string>;
 
 inline const std::string kHint =
     "For extra debug information, edit the Document Type and in the Language Server panel set the Trace Level to "

@@ -44,7 +44,8 @@ class Probe {
   // Until every one of `changes` arrived for `id`, in whichever batches.
   bool WaitFor(std::int64_t id, const std::vector<Change>& changes) {
     return shared_.WaitUntil([&] {
-      return std::all_of(changes.begin(), changes.end(), [&](const Change& change) { return SawLocked(id, change); });
+      return std::all_of(changes.begin(), changes.end(),
+                         [&](const Change& change) { return InOneBatchLocked(id, {change}); });
     });
   }
   bool WaitForWatchError(std::int64_t id) {
@@ -56,12 +57,7 @@ class Probe {
   }
   // Did one batch carry all of `changes` (or, for one change, any batch)?
   bool SawInOneBatch(std::int64_t id, const std::vector<Change>& changes) {
-    return shared_.Read([&] {
-      return std::any_of(batches_.begin(), batches_.end(), [&](const auto& entry) {
-        return entry.first == id && std::all_of(changes.begin(), changes.end(),
-                                                [&](const Change& change) { return entry.second.count(change) > 0; });
-      });
-    });
+    return shared_.Read([&] { return InOneBatchLocked(id, changes); });
   }
   // Did one batch carry exactly `expected`?
   bool SawBatch(std::int64_t id, const ChangeBatch& expected) {
@@ -93,10 +89,11 @@ class Probe {
         if (batchId == id) names.insert(change.first);
     return names;
   }
-  bool SawLocked(std::int64_t id, const Change& change) const {
-    for (const auto& [batchId, batch] : batches_)
-      if (batchId == id && batch.count(change)) return true;
-    return false;
+  bool InOneBatchLocked(std::int64_t id, const std::vector<Change>& changes) const {
+    return std::any_of(batches_.begin(), batches_.end(), [&](const auto& entry) {
+      return entry.first == id && std::all_of(changes.begin(), changes.end(),
+                                              [&](const Change& change) { return entry.second.count(change) > 0; });
+    });
   }
 
   Shared shared_;

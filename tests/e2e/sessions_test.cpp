@@ -1,6 +1,7 @@
-// A whole clangd session through the shared library: start, the feature calls with the
+// Whole sessions through the shared library: clangd's start, the feature calls with the
 // answer the example project calls for (those the command-line test makes of clangd are
-// checked there), answers about changed text, shutdown and exit.
+// checked there), pylsp's answers about the Python example and other servers beside it,
+// answers about changed text, and clangd's death.
 #include <gtest/gtest.h>
 
 #include <map>
@@ -22,10 +23,70 @@ std::set<std::string> Names(const std::vector<LSP::SymbolInformation>& symbols) 
   return names;
 }
 
+std::string HoverText(xLanguageServer& server, const Project& project, const std::string& file,
+                      const std::string& needle, std::size_t offset) {
+  auto at = At(project, file, Find(project, file, needle, offset));
+  return server.TextDocument_Hover(&at).contents.value;
+}
+
+// What pylsp answers about the Python example's geometry module, main.py open (its
+// highlights, folds and diagnostics are the command-line test's).
+void ExpectPylspAnswersAboutGeometry(xLanguageServer& server, const Project& project) {
+  Open(server, project, "geometry.py");
+  // clamp as main.py calls it (hovered below).
+  auto call = At(project, "main.py", Find(project, "main.py", "print(clamp(", 6));
+  std::vector<LSP::Location> definition = server.TextDocument_Definition(&call);
+  ASSERT_EQ(definition.size(), 1u);
+  EXPECT_TRUE(EndsWith(definition[0].uri, "/examples/python/geometry.py")) << definition[0].uri;
+  EXPECT_EQ(definition[0].range.start.line, LineOf(project, "geometry.py", "def clamp"));
+
+  // The definition and two calls in geometry.py, the import and one call in main.py.
+  EXPECT_EQ(PerFile(server.TextDocument_References(&call)),
+            (std::map<std::string, int>{{Path(project, "geometry.py"), 3}, {Path(project, "main.py"), 2}}));
+
+  // What pylsp announced (its highlights and folds, and its diagnostics, are the
+  // command-line test's).
+  EXPECT_TRUE(server.ServerCapabilities().documentHighlightProvider);
+  EXPECT_EQ(server.ServerCapabilities().documentSync.change, 2);
+
+  auto member = At<LSP::CompletionParams>(project, "main.py", Find(project, "main.py", "rectangle.scale", 10));
+  std::set<std::string> labels;
+  for (const LSP::CompletionItem& item : server.TextDocument_Completion(&member).items) labels.insert(item.label);
+  for (const char* label : {"area()", "scale(factor)"}) EXPECT_EQ(labels.count(label), 1u) << label;
+
+  auto inCall = At(project, "main.py", Find(project, "main.py", "print(clamp(", 12));
+  LSP::SignatureHelp help = server.TextDocument_Signature(&inCall);
+  ASSERT_EQ(help.signatures.size(), 1u);
+  EXPECT_EQ(help.signatures[0].label, "clamp(value, low, high)");
+
+  auto module = Document<LSP::DocumentSymbolParams>(project, "geometry.py");
+  std::map<std::string, int> symbolLines;
+  for (const LSP::SymbolInformation& symbol : server.TextDocument_DocumentSymbol(&module)) {
+    symbolLines[symbol.name] = symbol.location.range.start.line;
+  }
+  EXPECT_EQ(symbolLines["Rectangle"], LineOf(project, "geometry.py", "class Rectangle"));
+  EXPECT_EQ(symbolLines["clamp"], LineOf(project, "geometry.py", "def clamp"));
+
+  auto rename = At<LSP::RenameParams>(project, "main.py", call.position);
+  rename.newName = "limit";
+  LSP::WorkspaceEdit change = server.TextDocument_Rename(&rename);
+  std::string renamed;  // pylsp replaces the whole text of each file
+  for (const LSP::TextDocumentEdit& document : change.documentChanges)
+    if (EndsWith(document.textDocument.uri, "/geometry.py") && !document.edits.empty()) renamed = document.edits[0].newText;
+  ExpectHas(renamed, {"def limit(value, low, high):"});
+  EXPECT_FALSE(server.HaveErrors());
+}
+
 // The steps share one session, started once: clangd takes long to index on a loaded machine.
-TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) {
+// Beside it, a server whose command does not exist fails to start and leaves cleanly, and
+// pylsp (answering about the geometry module in its first life) ends and starts again under
+// its name, each answering for its own project; killed at the end, clangd gives empty
+// results at once.
+TEST(ClangdSession, AnswersEachFeatureBesideOtherServersThenAboutChangedTextUntilKilled) {
   Project project = Cpp();
-  xLanguageServer* server = Vexil_Start(StartRecord(project, "clangd-session"));
+  xServerStart start = StartRecord(project, "clangd-session");
+  start.timeout = 60000;  // a wait for the dead server would be unmistakable
+  xLanguageServer* server = Vexil_Start(start);
   ASSERT_TRUE(server->Start(InitRecord(project)));
   for (const char* file : {"shapes.h", "shapes.cpp", "main.cpp"}) Open(*server, project, file);
   // Clamp as main.cpp calls it.
@@ -114,6 +175,37 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
     EXPECT_STREQ(server->ErrorMessage(), "method not found");
   }
 
+  Project nowhere = Cpp();
+  nowhere.executable = "vexil-no-such-language-server";
+  const std::size_t errorsBefore = vexil_test::TraceLog::Texts("Error").size();
+  xLanguageServer* missing = Vexil_Start(StartRecord(nowhere, "missing"));
+  EXPECT_FALSE(missing->Start(InitRecord(nowhere)));
+  EXPECT_FALSE(missing->IsRunning());
+  EXPECT_EQ(missing->Id(), -1);
+  EXPECT_GT(vexil_test::TraceLog::Texts("Error").size(), errorsBefore);
+  EXPECT_TRUE(missing->Exit());
+  EXPECT_EQ(Vexil_Have("missing"), nullptr);
+  const Project python = Python();
+  for (int life = 0; life < 2; ++life) {
+    SCOPED_TRACE("life " + std::to_string(life));
+    xLanguageServer* pylsp = Vexil_Start(StartRecord(python, "beside-pylsp"));
+    ASSERT_NE(server, pylsp);
+    ASSERT_EQ(Vexil_Have("beside-pylsp"), pylsp);
+    ASSERT_TRUE(pylsp->Start(InitRecord(python)));
+    Open(*pylsp, python, "main.py");
+    if (life == 0) ExpectPylspAnswersAboutGeometry(*pylsp, python);
+    ExpectHas(HoverText(*server, project, "main.cpp", "shapes::Clamp(", 8),
+              {"int Clamp(int value, int low, int high)"});
+    ExpectHas(HoverText(*pylsp, python, "main.py", "print(clamp(", 6),
+              {"clamp(value, low, high)", "Limit value to the range from low to high."});
+    EXPECT_TRUE(pylsp->Shutdown());
+    // Exit gives a server about a second to end and, when it has not, returns false and
+    // leaves the connection usable: on a loaded machine a host (and a test) asks again.
+    EXPECT_TRUE(vexil_test::WaitFor([&] { return pylsp->Exit(); }));
+    EXPECT_EQ(Vexil_Have("beside-pylsp"), nullptr);
+  }
+  EXPECT_EQ(HoverText(*server, project, "main.cpp", "Report(rectangle)", 0).find("function Report"), 0u);
+
   // One more use, changed and saved: the answers are about the new text. (A misspelt call's
   // error, its quick fix and the list emptied once fixed are the command-line test's.)
   LSP::DidChangeTextDocumentParams edited;
@@ -129,8 +221,14 @@ TEST(ClangdSession, AnswersEachFeatureThenAboutChangedTextUntilShutdownAndExit) 
   server->TextDocument_DidClose(&close);
   EXPECT_FALSE(server->HaveErrors());
 
+  ASSERT_TRUE(Kill(*server));
+  auto before = std::chrono::steady_clock::now();
+  EXPECT_EQ(HoverText(*server, project, "main.cpp", "shapes::Clamp(", 8), "");
+  EXPECT_LT(std::chrono::steady_clock::now() - before, std::chrono::seconds(6));
+  EXPECT_TRUE(server->HaveErrors());
+  EXPECT_STREQ(server->ErrorMessage(), "A server read was requested but the server is not running.");
   EXPECT_TRUE(server->Shutdown());
-  EXPECT_TRUE(Exits(*server));
+  EXPECT_TRUE(server->Exit());
   EXPECT_EQ(Vexil_Have("clangd-session"), nullptr);
 }
 
