@@ -21,10 +21,8 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   if (parsed) fuzz::ReadIntoEveryResult(reader);
   // A completion reply read from the parser's events holds what the document read holds,
   // or is left to it untouched; the id it awaits is the text's own when it has one.
-  const int id =
-      parsed && reader.Root().IsObject() && reader.Root().Value().HasMember("id") && reader.Root().Value()["id"].IsInt()
-          ? reader.Root().Value()["id"].GetInt()
-          : 1;
+  const LSP::JsonValue& root = reader.Root().Value();
+  const int id = parsed && root.IsObject() && root.HasMember("id") && root["id"].IsInt() ? root["id"].GetInt() : 1;
   const std::string both = fuzz::ReadBothWays(text, id);
   if (both != "taken" && both != "declined") __builtin_trap();
   return 0;

@@ -49,11 +49,11 @@ inline void ReadIntoEveryResult(LSP::xReader& reader) {
 }
 
 // Everything a completion reply puts into the response and its list.
-inline std::string Digest(const LSP::ResponseMessage &response, const LSP::CompletionList &list) {
+inline std::string Digest(const LSP::ResponseMessage& response, const LSP::CompletionList& list) {
   std::ostringstream out;
   out << response.id << '|' << response.jsonrpc << '|' << list.isIncomplete;
-  for (const LSP::CompletionItem &i : list.items) {
-    const LSP::Range &r = i.textEdit.range;
+  for (const LSP::CompletionItem& i : list.items) {
+    const LSP::Range& r = i.textEdit.range;
     out << "\n"
         << i.label << '|' << i.labelDetails.detail << '|' << i.labelDetails.description << '|' << i.kind << '|'
         << i.detail << '|' << i.documentation.kind << '|' << i.documentation.value << '|'
@@ -75,7 +75,7 @@ inline LSP::CompletionList EarlierList() {
 }
 
 // What the connection makes of `text` as the reply to `id` through the document.
-inline std::string DocumentRead(const std::string &text, int id) {
+inline std::string DocumentRead(const std::string& text, int id) {
   LSP::CompletionList list = EarlierList();
   LSP::xReader reader;
   if (!reader.Parse(text)) return "parse error";
@@ -86,14 +86,14 @@ inline std::string DocumentRead(const std::string &text, int id) {
     LSP::ResponseMessage response(&list);
     response.Read(reader);
     return Digest(response, list);
-  } catch (const std::exception &e) {
+  } catch (const std::exception& e) {
     return std::string("threw: ") + e.what();
   }
 }
 
 // Reads `text` as the reply to `id` from the parser's events: "taken" when that read took
 // it and holds what the document read holds, "declined" when it left the list as it was.
-inline std::string ReadBothWays(const std::string &text, int id) {
+inline std::string ReadBothWays(const std::string& text, int id) {
   LSP::CompletionList list = EarlierList();
   LSP::ResponseMessage response(&list);
   const std::string before = Digest(response, list);

@@ -175,15 +175,12 @@ TEST(FeatureResults, CompletionRepliesReadFromEventsAsTheDocumentReadsThem) {
   const auto items = [&](const std::string &elements) {
     return reply(R"({"isIncomplete":false,"items":[)" + elements + "]}");
   };
-  std::string deep;
-  for (int level = 0; level < 300000; ++level) deep += "[";
-  deep += std::string(300000, ']');
   const std::pair<std::string, const char *> rows[] = {
       {items(item + R"(,{"label":"x"},null,{"textEdit":null,"labelDetails":{},"documentation":"d"})"), "taken"},
       {reply("[" + item + "]"), "taken"},
       {reply("null"), "taken"},
       {R"({"id":7,"result":{"items":[]},"jsonrpc":null})", "taken"},
-      {items(R"({"label":"x","data":)" + deep + "}"), "taken"},
+      {items(R"({"label":"x","data":)" + std::string(300000, '[') + std::string(300000, ']') + "}"), "taken"},
       {items(R"({"textEdit":{"range":{"start":{"line":1}}}})"), "taken"},
       {R"({"jsonrpc":"2.0","result":{"items":[]},"id":7})", "declined"},  // the result before the id
       {R"({"jsonrpc":"2.0","id":8,"result":{"items":[]}})", "declined"},
