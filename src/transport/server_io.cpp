@@ -138,15 +138,13 @@ std::string xServer::Reply(int id, std::unique_ptr<LSP::xReader>& parsed, LSP::R
       CancelRequest(id);
       return "";
     }
-    // A completion list is read as it is parsed; the document read judges every other text.
-    if (response && LSP::ReadCompletionReply(text, id, *response)) {
-      EndRequest();
-      tracer_.Message("Reply: %s%s", text.c_str(), LineEnd(text));
-      return text;
-    }
-    // A fresh reader for each text: a document keeps the memory of every earlier parse.
-    auto reader = std::make_unique<LSP::xReader>();
-    if (HaveId(id, text, *reader)) {
+    // A completion list is read as it is parsed and leaves no document; the document read
+    // judges every other text, with a fresh reader for each, since a document keeps the
+    // memory of every earlier parse.
+    const bool read = response && LSP::ReadCompletionReply(text, id, *response);
+    std::unique_ptr<LSP::xReader> reader;
+    if (!read) reader = std::make_unique<LSP::xReader>();
+    if (read || HaveId(id, text, *reader)) {
       EndRequest();
       tracer_.Message("Reply: %s%s", text.c_str(), LineEnd(text));
       parsed = std::move(reader);
