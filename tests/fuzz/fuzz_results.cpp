@@ -1,10 +1,12 @@
 // A reply text parsed by xReader, judged as a parse of its counted bytes judges it, and
 // read into every result class, as the transport does with a server's answer; and read as
-// a completion reply from the parser's events, which must agree with the document read.
+// a completion reply from the parser's events, which must agree with the document read; the
+// plain reader must agree with RapidJSON's wherever it takes the text.
 #include <cstdint>
 #include <string>
 
 #include "json/rapidjson.h"
+#include "plain_events.h"
 #include "read_results.h"
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
@@ -25,5 +27,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
   const int id = parsed && root.IsObject() && root.HasMember("id") && root["id"].IsInt() ? root["id"].GetInt() : 1;
   const std::string both = fuzz::ReadBothWays(text, id);
   if (both != "taken" && both != "declined") __builtin_trap();
+  const std::string plain = fuzz::PlainAgrees(text);
+  if (plain != "read" && plain != "declined") __builtin_trap();
   return 0;
 }

@@ -8,6 +8,7 @@
 #include <stdexcept>
 #include <string>
 
+#include "../fuzz/plain_events.h"
 #include "json/members.h"
 #include "json/rapidjson.h"
 #include "vexil/json/json.h"
@@ -81,6 +82,52 @@ TEST(xReader, ParseErrorsShowTextAndCaretUnderTheOffset) {
   EXPECT_TRUE(reader.Parse("\xBB{\"a\":1}\0{}"s));
   EXPECT_EQ(reader.Error(), "");
   EXPECT_EQ(reader.Root().Int("a"), 1);
+}
+
+// The plain reader takes what servers write, with RapidJSON's events, and leaves the rest
+// to it: every text RapidJSON rejects, numbers it may find too big, lone low surrogates
+// (on which its versions differ) and nesting deeper than 32.
+TEST(PlainReader, ReportsRapidJsonsEventsOrDeclines) {
+  using namespace std::string_literals;
+  const std::string deep = std::string(32, '[') + "1" + std::string(32, ']');
+  const std::pair<std::string, const char*> rows[] = {
+      {R"j({"jsonrpc":"2.0","id":7,"result":{"isIncomplete":false,"items":[{"label":" Área()","kind":2,)j"
+       R"("score":0.9368076324462891,"textEdit":{"range":{"start":{"line":12,"character":0}}}}]}})",
+       "read"},
+      {"[0,-0,7,-7,4294967295,4294967296,-2147483648,-2147483649,1.5,-0.25e-3,2E+10,1e99,123456789012345678]", "read"},
+      {R"(["a\"b\\c\/d\b\f\n\r\t", "\u00e9\u20AC\ud83d\ude00", "x\u0000y", ")" "\xff\xfe" R"("])", "read"},
+      {" { \"a\" : [ true , false , null ] , \"b\" : { } , \"c\" : [ ] } \r\n\t", "read"},
+      {"[1]\0junk"s, "read"},
+      {deep, "read"},
+      {"[" + deep + "]", "declined"},
+      {"[1234567890123456789]", "declined"},
+      {"[1e100]", "declined"},
+      {R"(["\udc00"])", "declined"},
+      {R"(["\ud800x"])", "declined"},
+      {R"(["\ud800\u0041"])", "declined"},
+      {R"(["\u12g4"])", "declined"},
+      {R"(["\x"])", "declined"},
+      {"[\"a\0b\"]"s, "declined"},
+      {"[\"a\tb\"]", "declined"},
+      {"[\"abc", "declined"},
+      {"[1,]", "declined"},
+      {R"({"a":1,})", "declined"},
+      {R"({"a" 1})", "declined"},
+      {"{1:2}", "declined"},
+      {"[01]", "declined"},
+      {"[1.]", "declined"},
+      {"[.5]", "declined"},
+      {"[-]", "declined"},
+      {"[1e]", "declined"},
+      {"[tru]", "declined"},
+      {"nul", "declined"},
+      {"[1] x", "declined"},
+      {R"({"a":1}})", "declined"},
+      {"[", "declined"},
+      {"", "declined"},
+      {"  ", "declined"},
+  };
+  for (const auto& [text, expected] : rows) EXPECT_EQ(fuzz::PlainAgrees(text), expected) << text;
 }
 
 // The document's named objects, and a model class read from the document by its name.
