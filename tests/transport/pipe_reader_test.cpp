@@ -106,6 +106,7 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
   const std::vector<std::string> bodies = {
       R"({"jsonrpc":"2.0","method":"window/logMessage","params":{}})",
       R"({"jsonrpc":"2.0","id":0,"method":"workspace/configuration","params":{}})",
+      R"({"params":{"hh":"method\"h"},"method" :"late/method"})",
       R"({"jsonrpc":"2.0","id":3,"result":{"text":"\"method\""}})",
       R"(not json "method")",
   };
@@ -117,13 +118,13 @@ TEST(PipeReader, DispatchSeesOnlyMessagesThatNameAMethodAndEverythingIsQueued) {
   Send(pipe, failures);
   pipe.close(Poco::Pipe::CLOSE_WRITE);
   thread.Join();
-  EXPECT_EQ(std::vector<std::string>(seen.begin(), seen.begin() + 2),
-            (std::vector<std::string>{"window/logMessage", "workspace/configuration"}));
+  EXPECT_EQ(std::vector<std::string>(seen.begin(), seen.begin() + 3),
+            (std::vector<std::string>{"window/logMessage", "workspace/configuration", "late/method"}));
   std::string errors = reader.Errors();
   EXPECT_LE(errors.size(), vexil::xPipeReader::kErrorsLimit);
   EXPECT_GT(errors.size(), vexil::xPipeReader::kErrorsLimit / 2);
   EXPECT_EQ(errors.rfind("Exception: ", 0), 0u);
-  EXPECT_EQ(errors.substr(errors.size() - 6), "e1002\n");
+  EXPECT_EQ(errors.substr(errors.size() - 6), "e1003\n");
 }
 
 TEST(PipeReader, QueuesKeepTheirNewestEntriesWithinTheirLimits) {
