@@ -24,6 +24,7 @@ using vexil_test::TraceLine;
 using vexil_test::TraceLog;
 using watchtest::Error;
 using watchtest::kDeadline;
+using watchtest::ReturnsWithin;
 using watchtest::Verbose;
 using watchtest::WaitForTrace;
 
