@@ -43,19 +43,31 @@ class ConnectionLifecycle : public ::testing::Test {
 // capabilities. The request is otherwise the model's, byte for byte; the start-up details
 // are traced at the verbose level only; a server that asks for the folders while it
 // initializes gets those of initialize; once initialized, neither Start nor Initialize
-// writes anything.
-TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
+// writes anything. The reply's capabilities are handed out as read and as text, in both forms
+// of the synchronisation member.
+TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequestAndItsReplyIsHandedOut) {
   struct Row {
     std::vector<const char*> features;
     std::vector<std::pair<std::string, std::string>> changes;  // on the expected text
+    std::string capabilities = R"({"textDocumentSync": "full","hoverProvider":true})";
+    // The hover provider, the change kind, open/close, save and its text, the position
+    // encoding, and the old synchronisation member, which stays unread.
+    const char* read = "1|0|0|0|0|utf-16|0";
     LSP::TraceLevel level = LSP::TraceLevel::Messages;
   };
   const std::string treeEnd = R"("diagnostic":{"dynamicRegistration":false}})";
   const std::string features = vexil_test::ReadDataFile("feature_capabilities.json");
   const Row rows[] = {
-      {{}, {}},
-      {{}, {{R"("trace":"messages")", R"("trace":"verbose")"}}, LSP::TraceLevel::Verbose},
-      {{"messages", "unknown"}, {}},
+      {{}, {}, R"({"textDocumentSync": 2,"hoverProvider":true,"positionEncoding":"utf-8"})", "1|2|1|1|0|utf-8|0"},
+      {{},
+       {{R"("trace":"messages")", R"("trace":"verbose")"}},
+       R"({"textDocumentSync": {"openClose":true,"change":1,"save":{"includeText":true}},"hoverProvider":true})",
+       "1|1|1|1|1|utf-16|0",
+       LSP::TraceLevel::Verbose},
+      {{"messages", "unknown"},
+       {},
+       R"({"textDocumentSync": {"change":2,"save":false},"hoverProvider":true,"positionEncoding":8})",
+       "1|2|0|0|0|utf-16|0"},
       {{"progress"}, {{treeEnd + "}", treeEnd + R"(,"window":{"workDoneProgress":true}})"}}},
       {{"configuration", "configuration"}, {{R"("configuration":false)", R"("configuration":true)"}}},
       {{"features"},
@@ -76,7 +88,9 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
          R"("didChangeWatchedFiles":{"dynamicRegistration":true,"relativePatternSupport":true})"}}},
   };
   for (const Row& row : rows) {
-    xLanguageServer* server = Fake(kName, {"ask=workspace/workspaceFolders"}, 2000, row.level);
+    xLanguageServer* server =
+        Fake(kName, {"ask=workspace/workspaceFolders", "result=initialize:{\"capabilities\":" + row.capabilities + "}"},
+             2000, row.level);
     for (const char* feature : row.features) EXPECT_EQ(server->Enable(feature), std::string(feature) != "unknown");
     xServerInitialise init;
     init.processId = 4242;
@@ -85,7 +99,16 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
     init.workspaceFolders.emplace_back("file:///home/dev/project", "project");
     EXPECT_FALSE(server->Initialize(init)) << "nothing is sent to a stopped server";
     EXPECT_TRUE(TraceLog::Lines().empty());
+    EXPECT_STREQ(server->ServerCapabilitiesJson(), "");
     ASSERT_TRUE(server->Start(init));
+    const LSP::ServerCapabilities read = server->ServerCapabilities();
+    EXPECT_EQ(vexil_test::Fields(read.hoverProvider, read.documentSync.change, read.documentSync.openClose,
+                                 read.documentSyncSave, read.documentSync.save.includeText, read.positionEncoding,
+                                 read.textDocumentSync.change),
+              row.read);
+    std::string compact = row.capabilities;
+    compact.erase(compact.find(' '), 1);
+    EXPECT_EQ(server->ServerCapabilitiesJson(), compact);
     const bool verbose = row.level == LSP::TraceLevel::Verbose;
     ASSERT_EQ(TraceLog::Contains("Process Id"), verbose) << "start-up details are verbose only";
     const Texts details = TraceLog::Texts("Verbose");
@@ -109,35 +132,6 @@ TEST_F(ConnectionLifecycle, OnlyEnabledFeaturesChangeTheInitializeRequest) {
     EXPECT_TRUE(TraceLog::Texts("Message").empty() && TraceLog::Texts("Verbose").empty());
     Dispose(kName);
     TraceLog::Clear();
-  }
-}
-
-// The capabilities as the server gave them, in both forms of the synchronisation member. Each
-// row's digest: the hover provider, the change kind, open/close, save and its text, the
-// position encoding, and the old synchronisation member, which stays unread.
-TEST_F(ConnectionLifecycle, ServerCapabilitiesAreHandedOutAsReadAndAsText) {
-  const std::pair<std::string, std::string> rows[] = {
-      {R"({"textDocumentSync": 2,"hoverProvider":true,"positionEncoding":"utf-8"})", "1|2|1|1|0|utf-8|0"},
-      {R"({"textDocumentSync": {"openClose":true,"change":1,"save":{"includeText":true}},"hoverProvider":true})",
-       "1|1|1|1|1|utf-16|0"},
-      {R"({"textDocumentSync": {"change":2,"save":false},"hoverProvider":true,"positionEncoding":8})",
-       "1|2|0|0|0|utf-16|0"},
-      {R"({"textDocumentSync": "full","hoverProvider":true})", "1|0|0|0|0|utf-16|0"},
-  };
-  for (const auto& [capabilities, digest] : rows) {
-    xLanguageServer* server = Fake(kName, {"result=initialize:{\"capabilities\":" + capabilities + "}"});
-    EXPECT_STREQ(server->ServerCapabilitiesJson(), "");
-    ASSERT_TRUE(server->Start(xServerInitialise()));
-    const LSP::ServerCapabilities read = server->ServerCapabilities();
-    EXPECT_EQ(vexil_test::Fields(read.hoverProvider, read.documentSync.change, read.documentSync.openClose,
-                                 read.documentSyncSave, read.documentSync.save.includeText, read.positionEncoding,
-                                 read.textDocumentSync.change),
-              digest)
-        << capabilities;
-    std::string compact = capabilities;
-    compact.erase(compact.find(' '), 1);
-    EXPECT_EQ(server->ServerCapabilitiesJson(), compact);
-    Dispose(kName);
   }
 }
 

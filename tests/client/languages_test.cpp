@@ -40,11 +40,9 @@ TEST(Languages, AddedRowsSplitTheirListsAndCopiesOwnThem) {
   auto original = std::make_unique<CustomLanguages>();
   original->AddLanguage("Mine", "mine", ";;m1;;m2;");
   original->AddLanguage("Other C", "other-c", "c;m3");
-  EXPECT_STREQ(original->LanguageId("m1"), "mine");
-  EXPECT_STREQ(original->LanguageId("m2"), "mine");
-  EXPECT_STREQ(original->LanguageId("m3"), "other-c");
-  EXPECT_STREQ(original->LanguageId("c"), "c");
-  EXPECT_STREQ(original->LanguageId(""), "");
+  const std::pair<const char*, const char*> added[] = {
+      {"m1", "mine"}, {"m2", "mine"}, {"m3", "other-c"}, {"c", "c"}, {"", ""}};
+  for (const auto& row : added) EXPECT_STREQ(original->LanguageId(row.first), row.second) << row.first;
 
   xLanguages copied(*original);
   xLanguages assigned;

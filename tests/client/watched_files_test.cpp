@@ -90,9 +90,7 @@ std::string Uri(const std::string& path) { return FileToUri(path.c_str()); }
 
 TEST(WatchedFilesNotifier, SendsBatchesOfWhatTheServerRegistered) {
   TempDir root;
-  Touch(At(root, "written.txt"));
-  Touch(At(root, "old.txt"));
-  Touch(At(root, "gone.txt"));
+  for (const char* name : {"written.txt", "old.txt", "gone.txt"}) Touch(At(root, name));
   const std::string missing = At(root, "missing");
   Heard heard;
   vexil::WatchedFilesNotifier notifier({Folder(root), missing}, heard.Callbacks());

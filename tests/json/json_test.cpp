@@ -9,11 +9,14 @@
 #include <string>
 
 #include "../fuzz/plain_events.h"
+#include "../protocol/reply_helpers.h"
 #include "json/members.h"
 #include "json/rapidjson.h"
 #include "vexil/json/json.h"
 
 namespace {
+
+using vexil_test::Fields;
 
 // Parses `json` and keeps the document alive for the views the test takes.
 struct Parsed {
@@ -155,17 +158,11 @@ TEST(xObject, MissingAndNullMembersYieldTheFixedDefaults) {
   for (const char* json : {R"({})", R"({"v":null})", "null"}) {
     Parsed doc(json);
     LSP::xObject o = doc.Root();
-    EXPECT_EQ(o.Int("v"), -1) << json;
-    EXPECT_EQ(o.Int64("v"), -1) << json;
-    EXPECT_EQ(o.UInt("v"), 0u) << json;
-    EXPECT_EQ(o.UInt64("v"), 0u) << json;
-    EXPECT_EQ(o.Double("v"), 0.0) << json;
-    EXPECT_FALSE(o.Bool("v")) << json;
-    EXPECT_EQ(o.String("v"), "") << json;
-    EXPECT_TRUE(o.Integers("v").empty()) << json;
-    EXPECT_TRUE(o.Strings("v").empty()) << json;
-    EXPECT_TRUE(o.Object("v").IsNull()) << json;
-    EXPECT_EQ(o.Object("v").Object("w").Int("x"), -1) << json;
+    EXPECT_EQ(Fields(o.Int("v"), o.Int64("v"), o.UInt("v"), o.UInt64("v"), o.Double("v"), o.Bool("v"), o.String("v"),
+                     o.Integers("v").size(), o.Strings("v").size(), o.Object("v").IsNull(),
+                     o.Object("v").Object("w").Int("x")),
+              "-1|-1|0|0|0|0||0|0|1|-1")
+        << json;
     EXPECT_EQ(o.HasObject("v"), std::string(json) == R"({"v":null})") << json;  // a null member is there
   }
 }
@@ -178,26 +175,17 @@ TEST(xObject, TypedLookUpsGiveTheMemberOrNameTheMismatch) {
              R"("f":1.0,"a":[],"o":{},"neg":-1,"x":false,"mixed":[1,2.5],"ws":["a",1],"arr":[1],)"
              R"("digits":"42abc","letters":"abc","huge":"99999999999","spaced":" -7"})");
   LSP::xObject o = doc.Root();
-  EXPECT_EQ(o.Int("i"), -3);
-  EXPECT_EQ(o.Int64("big"), 5000000000LL);
-  EXPECT_EQ(o.UInt("u"), 7u);
-  EXPECT_EQ(o.UInt64("big"), 5000000000ULL);
-  EXPECT_EQ(o.Double("d"), 2.5);
-  EXPECT_TRUE(o.Bool("b"));
-  EXPECT_EQ(o.String("s"), "t\xc3\xa9xt");
+  // The members, then views of them.
+  EXPECT_EQ(
+      Fields(o.Int("i"), o.Int64("big"), o.UInt("u"), o.UInt64("big"), o.Double("d"), o.Bool("b"), o.String("s"),
+             o.Object("v").IsArray(), o.Object("i").IsInt(), o.Object("s").GetString(), o.Object("i").GetString()),
+      "-3|5000000000|7|5000000000|2.5|1|t\xc3\xa9xt|1|1|t\xc3\xa9xt|");
   EXPECT_EQ(o.Integers("v"), (std::vector<int>{1, 2, 3}));
   EXPECT_EQ(o.Strings("w"), (std::vector<std::string>{"a", "b"}));
-  EXPECT_TRUE(o.Object("v").IsArray());
-  EXPECT_TRUE(o.Object("i").IsInt());
-  EXPECT_EQ(o.Object("s").GetString(), "t\xc3\xa9xt");
-  EXPECT_EQ(o.Object("i").GetString(), "");
   // AsInt takes a number, or a string that starts with a decimal number.
-  EXPECT_EQ(o.Object("i").AsInt(), -3);
-  EXPECT_EQ(o.Object("digits").AsInt(), 42);
-  EXPECT_EQ(o.Object("spaced").AsInt(), -7);
-  EXPECT_EQ(o.Object("b").AsInt(7), 7);
-  EXPECT_EQ(o.Object("missing").AsInt(7), 7);
-  EXPECT_EQ(o.Object("digits").AsInt(7), 42);
+  EXPECT_EQ(Fields(o.Object("i").AsInt(), o.Object("digits").AsInt(), o.Object("spaced").AsInt(),
+                   o.Object("b").AsInt(7), o.Object("missing").AsInt(7), o.Object("digits").AsInt(7)),
+            "-3|42|-7|7|7|42");
   EXPECT_THROW(o.Object("letters").AsInt(7), std::invalid_argument);
 
   EXPECT_EQ(ErrorText([&] { o.Int("s"); }), Mismatch("int", "string"));
