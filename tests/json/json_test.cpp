@@ -4,6 +4,7 @@
 // raw values.
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <functional>
 #include <stdexcept>
 #include <string>
@@ -131,6 +132,10 @@ TEST(PlainReader, ReportsRapidJsonsEventsOrDeclines) {
       {"  ", "declined"},
   };
   for (const auto& [text, expected] : rows) EXPECT_EQ(fuzz::PlainAgrees(text), expected) << text;
+  // Every reply recorded from clangd and pylsp is in the form it takes.
+  for (const auto& file : std::filesystem::recursive_directory_iterator(std::string(VEXIL_TEST_DATA) + "/replies")) {
+    if (file.is_regular_file()) EXPECT_EQ(fuzz::PlainAgrees(vexil_test::ReadFile(file.path().string())), "read") << file;
+  }
 }
 
 // The document's named objects, and a model class read from the document by its name.
