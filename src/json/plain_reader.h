@@ -25,7 +25,7 @@ struct PlainBytes {
     for (int byte = 0x20; byte < 256; ++byte) plain[byte] = byte != '"' && byte != '\\';
   }
 };
-constexpr PlainBytes kPlainBytes;
+inline constexpr PlainBytes kPlainBytes;
 
 inline bool IsPlain(char byte) { return kPlainBytes.plain[static_cast<unsigned char>(byte)]; }
 inline bool IsDigit(char byte) { return byte >= '0' && byte <= '9'; }
@@ -291,7 +291,9 @@ class Reader {
 
 // Reads the NUL-terminated `text` into `handler` (a RapidJSON handler that takes RawNumber),
 // with the events RapidJSON's reader reports for it, strings included: their bytes are valid
-// until the next event. A text it does not take is Declined with no event promised right.
+// until the next event. Numbers RapidJSON would report as Int64, Uint64 or Double come as their
+// text, which a handler converting it may round otherwise than RapidJSON does. A text it does
+// not take is Declined with no event promised right.
 template <typename Handler>
 PlainRead ReadPlainJson(const char* text, Handler& handler) {
   return plain::Reader<Handler>(text, handler).Read();

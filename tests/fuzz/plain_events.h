@@ -2,6 +2,7 @@
 // same events, stop where a handler refuses one, and take no text RapidJSON rejects.
 #pragma once
 
+#include <algorithm>
 #include <cstdint>
 #include <string>
 
@@ -29,7 +30,7 @@ struct EventLog : rapidjson::BaseReaderHandler<rapidjson::UTF8<>, EventLog> {
   bool Int64(std::int64_t) { return Log("number"); }
   bool Uint64(std::uint64_t) { return Log("number"); }
   bool Double(double) { return Log("number"); }
-  bool RawNumber(const char*, rapidjson::SizeType, bool) { return Log("number"); }
+  bool RawNumber(const char* text, rapidjson::SizeType length, bool);
   bool String(const char* text, rapidjson::SizeType length, bool) { return Text('s', text, length); }
   bool Key(const char* text, rapidjson::SizeType length, bool) { return Text('k', text, length); }
   bool StartObject() { return Log("{"); }
@@ -49,6 +50,13 @@ inline bool GeneralRead(const std::string& text, EventLog& events) {
   return !reader.Parse<rapidjson::kParseIterativeFlag>(stream, events).IsError();
 }
 
+// A raw number is "number" when its text alone is one RapidJSON reports beyond Int and Uint.
+inline bool EventLog::RawNumber(const char* text, rapidjson::SizeType length, bool) {
+  EventLog alone;
+  const std::string number(text, length);
+  return Log(GeneralRead(number, alone) && alone.log == "number " ? "number" : "raw " + number);
+}
+
 // "read" or "declined" when the plain reader agrees with RapidJSON's on `text`; otherwise
 // what it got wrong.
 inline std::string PlainAgrees(const std::string& text) {
@@ -59,12 +67,15 @@ inline std::string PlainAgrees(const std::string& text) {
   if (read == LSP::PlainRead::Declined) return "declined";
   if (read != LSP::PlainRead::Read || !parsed || plain.log != general.log)
     return "read " + plain.log + "\nwhere RapidJSON " + (parsed ? "reads " + general.log : "fails");
-  // A handler that refuses an event halfway stops both readers there.
-  EventLog generalHalf(general.events / 2);
-  EventLog plainHalf(general.events / 2);
-  GeneralRead(text, generalHalf);
-  if (LSP::ReadPlainJson(text.c_str(), plainHalf) != LSP::PlainRead::Stopped || plainHalf.log != generalHalf.log)
-    return "stopped at " + plainHalf.log + "\nwhere RapidJSON stops at " + generalHalf.log;
+  // A handler that refuses an event stops both readers there: any event of a short text, some
+  // sixteen spread over a long one.
+  for (int refuse = 0; refuse < general.events; refuse += std::max(1, general.events / 16)) {
+    EventLog generalPart(refuse);
+    EventLog plainPart(refuse);
+    GeneralRead(text, generalPart);
+    if (LSP::ReadPlainJson(text.c_str(), plainPart) != LSP::PlainRead::Stopped || plainPart.log != generalPart.log)
+      return "stopped at " + plainPart.log + "\nwhere RapidJSON stops at " + generalPart.log;
+  }
   return "read";
 }
 
